@@ -1,0 +1,38 @@
+#pragma once
+
+#include <atomic>
+#include <cstdint>
+
+namespace Kernel
+{
+
+/// Base of every shared object: an intrusive reference count.
+///
+/// Derive virtually, so that an object of several families has one count. The object deletes itself when its last
+/// reference goes, on the thread that lets go of it. Counting is safe on any thread; nothing else is implied.
+class Countable
+{
+public:
+    Countable() = default;
+    /// A copy is a new object with a count of its own.
+    Countable(Countable const &) noexcept {}
+    Countable & operator=(Countable const &) noexcept { return *this; }
+    virtual ~Countable() = default;
+
+    void Retain() const noexcept { m_Count.fetch_add(1, std::memory_order_relaxed); }
+
+    void Release() const noexcept
+    {
+        if (m_Count.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+            delete this;
+        }
+    }
+
+    /// Number of references at this moment: for assertions and tests only, as it may change at once.
+    [[nodiscard]] std::uint32_t ReferenceCount() const noexcept { return m_Count.load(std::memory_order_relaxed); }
+
+private:
+    mutable std::atomic<std::uint32_t> m_Count{0};
+};
+
+}
