@@ -1,0 +1,34 @@
+#pragma once
+
+#include "framework/document/Anchors.h"
+
+#include <map>
+
+namespace Kernel
+{
+class InSerialiser;
+class OutSerialiser;
+}
+
+/// Bookmarks that anchors stand for, known by the anchors' uids: names and order that a book keeps above its chapters.
+///
+/// Shared between threads once it hangs in a document or book: change a clone and put that in its place.
+class PDFBookmarkManager : public virtual Kernel::Countable
+{
+public:
+    PDFBookmarkManager();
+    ~PDFBookmarkManager() override;
+
+    [[nodiscard]] Kernel::Counted<PDFBookmarkManager> Clone() const;
+    /// Holds other bookmarks, or the same under other names. Null differs from a manager that holds any.
+    [[nodiscard]] bool IsLogicallyDifferent(Kernel::Counted<PDFBookmarkManager const> other) const;
+    /// Takes in the bookmarks among the anchors: new ones are added, known ones take the anchor's name. Others stay.
+    void Reconcile(Kernel::Counted<Anchors const> anchors);
+    /// The anchor's data, null if no bookmark has the uid.
+    [[nodiscard]] Kernel::Counted<Story::AnchorData> GetDataFromUid(String const & uid) const;
+    [[nodiscard]] std::size_t GetCount() const { return m_Data.size(); }
+    [[nodiscard]] std::map<String, Kernel::Counted<Story::AnchorData>> const & GetData() const { return m_Data; }
+
+private:
+    std::map<String, Kernel::Counted<Story::AnchorData>> m_Data;
+};
