@@ -4,6 +4,8 @@ find_package(PkgConfig REQUIRED)
 find_package(Threads REQUIRED)
 
 pkg_check_modules(libzip REQUIRED IMPORTED_TARGET libzip)
+pkg_check_modules(xxhash REQUIRED IMPORTED_TARGET libxxhash)
+pkg_check_modules(nettle REQUIRED IMPORTED_TARGET nettle)
 pkg_check_modules(harfbuzz REQUIRED IMPORTED_TARGET harfbuzz harfbuzz-subset)
 pkg_check_modules(icu REQUIRED IMPORTED_TARGET icu-uc icu-i18n)
 pkg_check_modules(freetype REQUIRED IMPORTED_TARGET freetype2)
