@@ -35,5 +35,5 @@ struct ContentHash
 template <>
 struct std::hash<Typeset::ContentHash>
 {
-    std::size_t operator()(Typeset::ContentHash const & hash) const noexcept { return hash.m_High ^ hash.m_Low; }
+    std::size_t operator()(Typeset::ContentHash const & value) const noexcept { return value.m_High ^ value.m_Low; }
 };

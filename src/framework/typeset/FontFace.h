@@ -5,7 +5,7 @@
 #include "framework/typeset/ContentHash.h"
 
 #include <cstdint>
-#include <memory>
+#include <mutex>
 #include <span>
 
 struct hb_blob_t;
@@ -40,6 +40,14 @@ struct FaceMetrics
     int m_BoxTop = 0;
 };
 
+/// Whether a word's shape may depend on the spaces beside it.
+enum class SpaceUse : std::uint8_t
+{
+    None,
+    Positioning, ///< It is kerned.
+    Substitution ///< It is replaced, or decides what is: such text must be shaped with its spaces.
+};
+
 /// Receives a glyph's outline in font units, y up.
 class OutlineSink
 {
@@ -58,7 +66,8 @@ public:
 class FontFace : public Kernel::Countable
 {
 public:
-    /// Weight and width classes as in the OS/2 table (400 regular, 700 bold).
+    /// Reads a font file (OpenType with TrueType or CFF outlines). Null if it is not one. FontLibrary is the way to
+    /// get a face; this one knows nothing of faces that are already loaded.
     [[nodiscard]] static Kernel::Counted<FontFace const> Load(String const & path, unsigned index);
 
     ~FontFace() override;
@@ -78,6 +87,7 @@ public:
     [[nodiscard]] FaceMetrics const & GetMetrics() const noexcept { return m_Metrics; }
     [[nodiscard]] int GetUnitsPerEm() const noexcept { return m_Metrics.m_UnitsPerEm; }
     [[nodiscard]] unsigned GetGlyphCount() const noexcept { return m_GlyphCount; }
+    /// As in the OS/2 table: 400 regular, 700 bold.
     [[nodiscard]] int GetWeight() const noexcept { return m_Weight; }
     [[nodiscard]] bool IsItalic() const noexcept { return m_Italic; }
     [[nodiscard]] bool IsMonospaced() const noexcept { return m_Monospaced; }
@@ -101,9 +111,8 @@ public:
 
     /// The GSUB table has this feature (four-character tag) in any script.
     [[nodiscard]] bool HasFeature(char const * tag) const noexcept;
-    /// Some substitution or positioning lookup takes the space as input, so that a word's shape may depend on the
-    /// spaces beside it.
-    [[nodiscard]] bool SpaceTakesPart() const noexcept { return m_SpaceTakesPart; }
+    /// How the space takes part in the layout tables. Found out at the first call.
+    [[nodiscard]] SpaceUse GetSpaceUse() const;
 
     /// Bytes of the whole file, mapped for the life of the face.
     [[nodiscard]] std::span<std::byte const> GetData() const noexcept;
@@ -116,7 +125,7 @@ private:
     FontFace() = default;
     void ReadTables();
     void ReadMetrics();
-    void FindSpaceUse();
+    [[nodiscard]] SpaceUse FindSpaceUse() const;
 
     String m_Path;
     String m_Family;
@@ -134,7 +143,8 @@ private:
     bool m_Italic = false;
     bool m_Monospaced = false;
     bool m_Cff = false;
-    bool m_SpaceTakesPart = false;
+    mutable std::once_flag m_SpaceOnce;
+    mutable SpaceUse m_SpaceUse = SpaceUse::None; ///< Valid after m_SpaceOnce.
 };
 
 }

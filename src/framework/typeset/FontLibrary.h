@@ -26,8 +26,8 @@ struct FontMatch
 };
 
 /// All faces in use in this process. Singleton; any thread. Making it costs nothing: the catalogue of installed fonts
-/// is read when a family is first looked for by name, from a cache file if the font folders have not changed since.
-/// A process that only loads fonts by file and hash never reads it.
+/// is read from fontconfig (a few milliseconds) when a family is first looked for by name. A process that only loads
+/// fonts by file and hash never reads it.
 ///
 /// A face once loaded stays for the life of the process.
 class FontLibrary
@@ -74,14 +74,13 @@ private:
     FontCatalogue & GetCatalogue();
     Kernel::Counted<FontFace const> LoadLocked(String const & path, unsigned index);
     FontMatch FindLocked(String const & family, int weight, bool italic, double size);
-    FontMatch SubstituteLocked(int weight, bool italic, double size, bool monospaced);
 
     std::mutex m_Lock; ///< Guards all below.
     std::unique_ptr<FontCatalogue> m_Catalogue;
     std::map<FileKey, Kernel::Counted<FontFace const>> m_ByFile;
     std::map<std::pair<ContentHash, unsigned>, Kernel::Counted<FontFace const>> m_ByHash;
     std::map<std::tuple<std::string, int, bool, double>, FontMatch> m_Matches;
-    std::map<std::tuple<char32_t, std::string, bool>, Kernel::Counted<FontFace const>> m_Fallbacks;
+    std::map<std::tuple<char32_t, std::string, bool, int, bool>, Kernel::Counted<FontFace const>> m_Fallbacks;
 };
 
 }
