@@ -1,0 +1,39 @@
+#pragma once
+
+#include "framework/kernel/Counted.h"
+#include "framework/kernel/Schedulable.h"
+
+#include <chrono>
+#include <cstddef>
+#include <functional>
+
+namespace Kernel
+{
+
+/// The pool of threads that all queues and delivery lines of the process share.
+///
+/// Turns begin in the order in which they were asked for. The pool grows when a turn is ready and finds no thread within
+/// a millisecond, without an upper limit: threads block on one another's turns, so that a limit would be a deadlock.
+/// Threads that find nothing to do for a while end. Safe on any thread.
+class Scheduler
+{
+public:
+    /// Gives the object one turn soon. It is retained until then. Asking twice gives two turns.
+    static void GiveTurn(Counted<Schedulable> schedulable);
+
+    /// Runs a function once on a thread of the pool.
+    static void Run(std::function<void()> function);
+
+    /// Gives the object one turn when the steady time of `Clock` has come to `due`. With a clock that stands still
+    /// until it is moved, `PollTimers` tells the scheduler that it was.
+    static void GiveTurnAt(std::chrono::nanoseconds due, Counted<Schedulable> schedulable);
+    /// Looks at the clock again at once.
+    static void PollTimers();
+
+    /// Threads of the pool at this moment, for tests and diagnostics.
+    [[nodiscard]] static std::size_t GetNumberOfThreads();
+
+    class Pool;
+};
+
+}
