@@ -26,7 +26,6 @@ enum Double : int
 {
     Size = 0,            ///< Points.
     Tracking = 1,        ///< Added after each glyph, in thousandths of the size.
-    HorizontalScale = 2, ///< 1 is as designed.
     SizeFactor = 3,      ///< Multiplies the paragraph's size, for code that has to match the text's x-height.
 };
 

@@ -10,14 +10,17 @@ namespace Story
 class Delta : public virtual Kernel::Countable
 {
 public:
-    /// `list` with `fields`: those fields of the list attribute are set in paragraphs that are list items already, and
-    /// with `ListAttFields::All` in every paragraph.
     struct Fields
     {
         AttSet m_GlyphAtts;
         AttSet m_ParagraphAtts;
+        /// Paragraph attributes are set only where the paragraph itself does not set them.
+        bool m_OnlyIfUnset = false;
+        /// Gives the fields that `m_ListFields` names to the list attribute of paragraphs that are list items; with
+        /// `m_AddsList` other paragraphs become items. Null leaves lists alone.
         Kernel::Counted<ListAtt const> m_List;
         ListAttFields m_ListFields{};
+        bool m_AddsList = false;
     };
 
     explicit Delta(Fields fields) : m_Fields(std::move(fields)) {}

@@ -17,7 +17,6 @@ struct GlyphFormat
     String m_Features;
     double m_Size = 10.5;
     double m_Tracking = 0;
-    double m_HorizontalScale = 1;
     int m_Weight = 400;
     GlyphAtt::VerticalPosition m_Position = GlyphAtt::OnBaseline;
     bool m_Italic = false;

@@ -30,7 +30,7 @@ public:
     [[nodiscard]] virtual Kernel::Counted<Glyph> Clone(GlyphCloneContext & context) const = 0;
     /// Number of stories that hang on this element, as the cells of a table; `GetStory` gives them by index.
     [[nodiscard]] virtual std::size_t GetStoryCount() const { return 0; }
-    [[nodiscard]] virtual Kernel::Counted<Story const> GetStory(std::size_t) const { return nullptr; }
+    [[nodiscard]] virtual Kernel::Counted<Story const> GetStory(std::size_t index) const;
 
     /// Writes and reads everything but the class uid.
     virtual void Save(ByteWriter & out) const = 0;

@@ -9,6 +9,9 @@
 namespace Story
 {
 
+class ByteReader;
+class ByteWriter;
+
 /// The topics of a document's index, or of a book's master index, in list order.
 ///
 /// The object keeps its identity for the document's life; its list is a snapshot that is swapped as a whole. So
@@ -92,12 +95,16 @@ public:
     void AccumulateHash(Kernel::HashAccumulator & hash) const override;
     [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
 
+    void SaveBytes(ByteWriter & out) const;
+    [[nodiscard]] bool LoadBytes(ByteReader & in);
+
 private:
     struct LookUp;
 
     void Publish(Topics topics);
-    [[nodiscard]] std::shared_ptr<LookUp const> GetGUIDLookUp() const;
-    [[nodiscard]] std::shared_ptr<LookUp const> GetNameLookUp() const;
+    template <typename TText>
+    std::shared_ptr<LookUp const> GetLookUp(std::shared_ptr<LookUp const> & kept, std::uint64_t version,
+                                            TText const & textOf) const;
 
     mutable std::mutex m_Lock;
     std::shared_ptr<Topics const> m_Topics;

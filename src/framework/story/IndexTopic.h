@@ -3,7 +3,6 @@
 #include "framework/kernel/Counted.h"
 #include "framework/kernel/StringT.h"
 
-#include <atomic>
 #include <cstdint>
 #include <mutex>
 #include <vector>
@@ -62,6 +61,8 @@ public:
 
 private:
     friend class Index;
+
+    void SetCrossReferences(CrossReferences references);
 
     mutable std::mutex m_Lock;
     String m_Name;

@@ -123,6 +123,11 @@ public:
 private:
     friend class StoryBuilder;
 
+    /// Paragraphs and elements agree with the units of the text.
+    [[nodiscard]] bool HoldsTogether() const;
+    /// Without a context the elements themselves are taken over.
+    void AppendRange(Story const & source, std::size_t begin, std::size_t end, GlyphCloneContext * context);
+
     std::u16string m_Text;
     std::vector<GlyphRun> m_Runs;
     std::vector<Paragraph> m_Paragraphs;

@@ -39,8 +39,6 @@ public:
 private:
     struct Pools;
 
-    Kernel::Counted<GlyphAtts const> const & Shared(Kernel::Counted<GlyphAtts const> const & atts);
-    Kernel::Counted<ParagraphAtts const> const & Shared(Kernel::Counted<ParagraphAtts const> const & atts);
     void ExtendRun(Kernel::Counted<GlyphAtts const> const & atts);
 
     Kernel::Counted<Story> m_Story;

@@ -6,10 +6,14 @@
 #include <map>
 #include <memory>
 #include <mutex>
+#include <string>
 #include <vector>
 
 namespace Story
 {
+
+class ByteReader;
+class ByteWriter;
 
 /// A named bundle of attributes. A paragraph style may set attributes of characters and of paragraphs, a character
 /// style only those of characters.
@@ -77,15 +81,20 @@ public:
     void AccumulateHash(Kernel::HashAccumulator & hash) const override;
     [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
 
+    void SaveBytes(ByteWriter & out) const;
+    [[nodiscard]] bool LoadBytes(ByteReader & in);
+
 private:
+    void DropCache();
+
     AttSet m_DefaultGlyphAtts;
     AttSet m_DefaultParagraphAtts;
     std::vector<TextStyle> m_ParagraphStyles;
     std::vector<TextStyle> m_CharacterStyles;
 
     mutable std::mutex m_CacheLock;
-    mutable std::map<String, std::unique_ptr<ResolvedStyle const>, std::less<>> m_ResolvedParagraphs;
-    mutable std::map<String, std::unique_ptr<AttSet const>, std::less<>> m_ResolvedCharacters;
+    mutable std::map<std::string, std::unique_ptr<ResolvedStyle const>, std::less<>> m_ResolvedParagraphs;
+    mutable std::map<std::string, std::unique_ptr<AttSet const>, std::less<>> m_ResolvedCharacters;
 };
 
 }
