@@ -30,8 +30,8 @@ public:
     /// `context` may be null.
     OutSerialiserMemory(FileStoreOut & store, CompareContext const * context);
 
-    /// The object's fields, without the object's own header.
-    [[nodiscard]] std::vector<std::uint8_t> const & WriteFields(Serialisable const & object);
+    /// The object with its class and its fields.
+    [[nodiscard]] std::vector<std::uint8_t> const & WriteWhole(Serialisable const & object);
 };
 
 }
