@@ -100,7 +100,8 @@ private:
     void CloseTag(std::string const & name);
     void CloseAllTags();
     void FinishHtmlParagraph(int line);
-    InlineText ReadInlineMarkdown(std::string const & text, int line);
+    /// Reads a caption's markup; `label` stands before it as it is.
+    InlineText ReadCaption(std::string const & label, std::string const & text, int line);
 
     [[nodiscard]] Place PlaceAt(int line) const { return {m_Options.m_ShownName, line + m_LineOffset, 0}; }
     void Warn(std::string_view kind, int line, std::string text);
@@ -121,6 +122,7 @@ private:
     std::vector<std::uint32_t> m_PendingAnchors;
     BlockKind m_BlockKind = BlockKind::Paragraph;
     int m_HtmlHeading = 0;
+    std::string m_ListingLabel;
     std::string m_ListingCaption;
     std::unique_ptr<Table> m_Table;
     int m_TableLine = 0;

@@ -170,7 +170,7 @@ void ChapterReader::ReadImageTag(HtmlToken const & token, int line)
     Builder().AddObject(ObjectKind::Picture, static_cast<std::uint32_t>(m_Chapter.m_Pictures.size() - 1));
 }
 
-InlineText ChapterReader::ReadInlineMarkdown(std::string const & text, int line)
+InlineText ChapterReader::ReadCaption(std::string const & label, std::string const & text, int line)
 {
     ReadOptions options = m_Options;
     options.m_Language = m_Chapter.m_FrontMatter.m_Language;
@@ -180,14 +180,21 @@ InlineText ChapterReader::ReadInlineMarkdown(std::string const & text, int line)
         message.m_Place = PlaceAt(line);
         m_Messages.Add(message.m_Severity, message.m_Kind, message.m_Place, message.m_Text);
     }
+    std::u16string const before = ToUtf16(label);
+    auto const shift = static_cast<std::uint32_t>(before.size());
     if (chapter.m_Blocks.empty()) {
-        return {};
+        return {before, {{0, shift, Mark::None, -1}}, {}};
     }
     // Links of a caption join the chapter's; its other objects have no place in a caption.
     InlineText result = std::move(chapter.m_Blocks.front().m_Text);
     auto const base = static_cast<std::int32_t>(m_Chapter.m_Links.size());
     for (Span & span : result.m_Spans) {
         span.m_Link += 0 <= span.m_Link ? base : 0;
+        span.m_Start += shift;
+    }
+    if (0 < shift) {
+        result.m_Text.insert(0, before);
+        result.m_Spans.insert(result.m_Spans.begin(), {0, shift, Mark::None, -1});
     }
     for (Link & link : chapter.m_Links) {
         link.m_Line = line + m_LineOffset;
@@ -201,9 +208,10 @@ InlineText ChapterReader::ReadInlineMarkdown(std::string const & text, int line)
 void ChapterReader::ReadListingTag(HtmlToken const & token, int line)
 {
     if (HtmlToken::Kind::CloseTag == token.m_Kind) {
-        if (!m_ListingCaption.empty()) {
+        if (!m_ListingCaption.empty() || !m_ListingLabel.empty()) {
             Block & block = Emit(BlockKind::Caption, line);
-            block.m_Text = ReadInlineMarkdown(std::exchange(m_ListingCaption, std::string()), line);
+            block.m_Text = ReadCaption(std::exchange(m_ListingLabel, std::string()),
+                                       std::exchange(m_ListingCaption, std::string()), line);
             PlacePendingAnchors(block);
         }
         return;
@@ -223,8 +231,8 @@ void ChapterReader::ReadListingTag(HtmlToken const & token, int line)
         block.m_Text = builder.Finish();
         PlacePendingAnchors(block);
     }
-    std::string const & caption = token.Value("caption");
-    m_ListingCaption = number.empty() ? caption : "Listing " + number + (caption.empty() ? "" : ": " + caption);
+    m_ListingCaption = token.Value("caption");
+    m_ListingLabel = number.empty() ? "" : "Listing " + number + (m_ListingCaption.empty() ? "" : ": ");
 }
 
 void ChapterReader::FinishHtmlParagraph(int line)

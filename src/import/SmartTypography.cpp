@@ -95,6 +95,21 @@ std::size_t RunLength(std::u16string_view text, std::size_t at)
     return end - at;
 }
 
+/// Whether the number that starts at `start` is a label after its noun, such as "Listing 1-2" or "Figure 3-4": a
+/// capitalised word in the singular.
+bool IsLabel(std::u16string_view text, std::size_t start)
+{
+    if (start < 2 || !(u' ' == text[start - 1] || u'\u00A0' == text[start - 1] || u'\n' == text[start - 1])) {
+        return false;
+    }
+    std::size_t const end = start - 1;
+    std::size_t first = end;
+    while (0 < first && u_isalpha(text[first - 1])) {
+        --first;
+    }
+    return 4 <= end - first && u_isupper(text[first]) && u's' != text[end - 1];
+}
+
 /// Whether the hyphen at `at` stands between two numbers that make a range: "12-34", "1939-45", but neither part of a
 /// date or number with more hyphens, nor a falling pair.
 bool IsRangeHyphen(std::u16string_view text, std::size_t at)
@@ -115,10 +130,11 @@ bool IsRangeHyphen(std::u16string_view text, std::size_t at)
     auto const joins = [](char16_t c) { return IsWord(c) || u'-' == c || u'.' == c || u'/' == c || u'_' == c || u':' == c; };
     bool const isBound = 0 < start && joins(text[start - 1]);
     bool const runsOn = end < text.size() && (IsWord(text[end]) || u'-' == text[end] || u'/' == text[end] || u'_' == text[end]);
-    if (isBound || runsOn) {
+    if (isBound || runsOn || IsLabel(text, start)) {
         return false;
     }
-    return second.size() == first.size() ? first < second : second.size() < first.size() ? 1 < second.size() || 2 == first.size() : true;
+    // A shorter second number stands for its last digits, as in "1939-45".
+    return second.size() != first.size() || first < second;
 }
 
 }

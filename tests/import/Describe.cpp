@@ -99,7 +99,8 @@ std::string Describe(ChapterText const & chapter, InlineText const & text)
             for (; object < text.m_Objects.size() && text.m_Objects[object].m_Position == at; ++object) {
                 inner += ObjectText(chapter, text.m_Objects[object]);
                 ObjectKind const kind = text.m_Objects[object].m_Kind;
-                if (ObjectKind::NoteReference == kind || ObjectKind::Picture == kind) {
+                bool const isInText = ObjectKind::NoteReference == kind || ObjectKind::Picture == kind;
+                if (isInText && u'\uFFFC' == text.m_Text[at]) {
                     covered = true;
                     ++object;
                     break;

@@ -60,7 +60,7 @@ TEST(MarkdownReaderTest, LooksLinksAndPictures)
         {"a picture in a line stays there", "see ![A](p.png) here", "p see <picture p.png> here\n"},
         {"html marks", "<em>a</em><br>H<sub>2</sub>O <kbd>Esc</kbd> x<sup>2</sup><!-- no -->",
          "p {em a}/H{sub 2}O {kbd Esc} x{sup 2}\n"},
-        {"html link and anchor", "<a id=\"q\"></a><a href=\"z.md\">t</a>", "p <anchor q>[t](z.md)\n"},
+        {"html link and anchor", "<a id=\"q\"></a><a href=\"z.md\">t</a>", "p [<anchor q>t](z.md)\n"},
         {"html block with picture and caption", "<figure>\n<img src=\"p.png\" alt=\"x\">\n<figcaption>Cap</figcaption>\n</figure>",
          "figure <picture p.png>\ncaption Cap\n"},
         {"caption span", "<span class=\"caption\">Table 1</span>", "caption Table 1\n"},
@@ -75,7 +75,7 @@ TEST(MarkdownReaderTest, AttributeLists)
 {
     Check({
         {"heading", "# A b {#my-id .x}\n\n## A b {y=1}", "h1 <anchor my-id>A b\nh2 <anchor a-b>A b\n"},
-        {"spans", "[a *b*]{#i .smallcaps} c", "p <anchor i>{smallcaps a }{em+smallcaps b} c\n"},
+        {"spans", "[a *b*]{#i .smallcaps} c", "p {smallcaps <anchor i>a }{em+smallcaps b} c\n"},
         {"index marks", "[dog]{.index} [cat]{.index topic=\"Animal!Cat\" see=\"Pet\"}", "p <index dog>dog <index Animal!Cat see Pet>cat\n"},
         {"picture width", "![A](p.png){width=60%}", "figure <picture p.png>A\n"},
         {"nested brackets", "[a [b] c]{.mark}", "p {highlight a [b] c}\n"},

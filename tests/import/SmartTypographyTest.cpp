@@ -32,7 +32,7 @@ TEST(SmartTypographyTest, EachLanguageGetsItsOwnMarks)
              Case{"en", "the '90s, 'tis, dogs' tails, rock 'n' roll", "the ’90s, ’tis, dogs’ tails, rock ’n’ roll"},
              Case{"en", "a--b --- c... d.... e..", "a–b — c… d…. e.."},
              Case{"en", "use --quiet or -o", "use --quiet or -o"},
-             Case{"en", "pp. 12-34, 1939-45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5", "pp. 12–34, 1939–45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5"},
+             Case{"en", "pp. 12-34, 1939-45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1-2", "pp. 12–34, 1939–45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1–2"},
              Case{"de-DE", "\"Das ist 'so'\"", "„Das ist ‚so‘“"},
              Case{"de-CH", "\"So\"", "«So»"},
              Case{"fr", "\"Oui\" : non ! l'eau", "«\u202FOui\u202F»\u00A0: non\u202F! l’eau"},
