@@ -145,6 +145,7 @@ public:
 
 private:
     friend class ArchiveSession;
+    friend struct ArchiveEntrySource;
     struct Reader;
     struct Writer;
 
