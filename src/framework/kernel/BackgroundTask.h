@@ -4,6 +4,7 @@
 #include "framework/kernel/CriticalSection.h"
 #include "framework/kernel/ThreadSafety.h"
 
+#include <chrono>
 #include <cstdint>
 
 class DomainCommand;
@@ -48,9 +49,15 @@ private:
     bool const m_WhileQueueOccupied;
     bool const m_GathersChanges;
 
+    /// With the lock held: sets the timer if there is work that nobody is at; keeps count of the process's activity.
+    /// `later` says that an interval has to pass in any case.
+    void Arm(bool later) KORVANE_REQUIRES(m_Lock);
+
     Kernel::CriticalSection m_Lock;
-    /// The domain whose pump it was handed to; that one takes itself out when it goes.
+    /// The domain whose pump it was handed to; not counted, since that one takes itself out when it goes.
     DomainController * m_Controller KORVANE_GUARDED_BY(m_Lock) = nullptr;
+    /// The pump runs.
+    bool m_Active KORVANE_GUARDED_BY(m_Lock) = false;
     /// Counts calls of `Dirty`; the task is dirty while it is ahead of `m_CleanUpTo`.
     std::uint64_t m_DirtyCount KORVANE_GUARDED_BY(m_Lock) = 0;
     std::uint64_t m_CleanUpTo KORVANE_GUARDED_BY(m_Lock) = 0;
@@ -58,4 +65,9 @@ private:
     std::uint64_t m_TakenAt KORVANE_GUARDED_BY(m_Lock) = 0;
     bool m_CommandInFlight KORVANE_GUARDED_BY(m_Lock) = false;
     bool m_CommandTaken KORVANE_GUARDED_BY(m_Lock) = false;
+    bool m_TimerSet KORVANE_GUARDED_BY(m_Lock) = false;
+    /// Dirty, and waiting for the queue to run empty.
+    bool m_AwaitsEmptyQueue KORVANE_GUARDED_BY(m_Lock) = false;
+    bool m_CountedAsActivity KORVANE_GUARDED_BY(m_Lock) = false;
+    std::chrono::nanoseconds m_LastCommand KORVANE_GUARDED_BY(m_Lock){INT64_MIN / 2};
 };

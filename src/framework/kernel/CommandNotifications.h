@@ -14,6 +14,7 @@ public:
     /// \param fraction from 0 to 1
     CommandProgressNotification(Kernel::Counted<DomainController const> controller, String description, float fraction,
                                 bool canAbort);
+    ~CommandProgressNotification() override;
 
     [[nodiscard]] Kernel::Counted<DomainController const> const & GetDomainController() const { return m_Controller; }
     /// In the user's language.
@@ -33,6 +34,7 @@ class CommandFailedNotification : public Kernel::Notification
 {
 public:
     CommandFailedNotification(Kernel::Counted<DomainController const> controller, String description, String reason);
+    ~CommandFailedNotification() override;
 
     /// Null for a command of the application.
     [[nodiscard]] Kernel::Counted<DomainController const> const & GetDomainController() const { return m_Controller; }

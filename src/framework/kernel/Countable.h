@@ -28,6 +28,16 @@ public:
         }
     }
 
+    /// Retains the object unless its last reference has gone already; the caller makes sure that its memory is still
+    /// there. For looking from a list of borrowed pointers at objects that take themselves out when they go.
+    [[nodiscard]] bool RetainIfAlive() const noexcept
+    {
+        std::uint32_t count = m_Count.load(std::memory_order_relaxed);
+        while (count != 0 && !m_Count.compare_exchange_weak(count, count + 1, std::memory_order_acq_rel)) {
+        }
+        return count != 0;
+    }
+
     /// Number of references at this moment: for assertions and tests only, as it may change at once.
     [[nodiscard]] std::uint32_t ReferenceCount() const noexcept { return m_Count.load(std::memory_order_relaxed); }
 

@@ -6,6 +6,7 @@
 #include "framework/kernel/Schedulable.h"
 
 #include <atomic>
+#include <cstdint>
 #include <memory>
 #include <vector>
 
@@ -82,9 +83,9 @@ public:
 
     /// Called on the queue's thread before it waits for the writer lock: a moment to let others in.
     virtual void ImmediatePausePriorToWriterLock() {}
-    /// Called every few milliseconds while a command waits for readers to leave. Setting `stop` asks the readers to end
-    /// early (`IsWriterWaiting`); `quiet` set ends these calls for this wait.
-    virtual void PeriodicWhileAwaitingReaderUnlock(bool & stop, bool & quiet);
+    /// Called every few milliseconds while a command waits for readers to leave. Setting `letReadersIn` lets the readers
+    /// go first that wait behind the command; `quiet` ends these calls for this wait.
+    virtual void PeriodicWhileAwaitingReaderUnlock(bool & letReadersIn, bool & quiet);
 
     /// Does the command and gathers what it has to say. Under the writer lock.
     virtual void ProcessCommand(Kernel::Counted<DomainCommand> command,
@@ -93,7 +94,7 @@ public:
     /// Folds a batch before it is posted: drops repeats by `GetDedupeId`, joins by `Merge`.
     virtual void SimplifyNotifications(std::vector<Kernel::Counted<Kernel::Notification>> & notifications);
 
-    /// The calling thread has got, or is about to release, the reader lock; not for nested ones.
+    /// The calling thread has got, or has released, the reader lock; not for nested ones.
     virtual void OnAcquireReaderLock() const {}
     virtual void OnReleaseReaderLock() const {}
 
@@ -136,12 +137,13 @@ protected:
     /// A command has been done and wants to be undoable; under the writer lock. A domain with a history takes it and
     /// returns true, and then owns its `Teardown`.
     virtual bool StackForUndo(Kernel::Counted<DomainCommand> const & command);
-    /// A command threw `what`. By default it posts a `CommandFailedNotification`. Under the writer lock.
-    virtual void CommandThrew(Kernel::Counted<DomainCommand> const & command, char const * what,
-                              std::vector<Kernel::Counted<Kernel::Notification>> & notifications);
+    /// A command threw `what`. By default it posts a `CommandFailedNotification`, also when notifications are
+    /// suppressed. Under the writer lock.
+    virtual void CommandThrew(Kernel::Counted<DomainCommand> const & command, char const * what);
 
 private:
     friend class BackgroundTask;
+    friend class BackgroundTaskPump;
     friend class DomainQueue;
     friend class DomainWriterUnlockSession;
     friend class Kernel::Question;

@@ -18,7 +18,7 @@ class Notification : public virtual Countable
 public:
     Notification() = default;
     /// A copy has not been posted.
-    Notification(Notification const & other) : Countable(other) {}
+    Notification(Notification const & other) : Countable(other), m_TellWhenPassed(other.m_TellWhenPassed) {}
     Notification & operator=(Notification const &) { return *this; }
 
     /// Two notifications of one batch and one class with the same id say the same thing, and the later one is dropped.
@@ -41,14 +41,17 @@ public:
 
 protected:
     /// Every sink that was registered when it was posted has returned from `Notify`. Runs once a posting, on the line
-    /// that was last, or on a thread of its own if there was no sink; it must neither wait nor throw.
+    /// that was last, or on a thread of its own if there was no sink; it must neither wait nor throw. Only for classes
+    /// whose constructor calls `TellWhenPassed`.
     virtual void OnPassedEveryLine() {}
+    void TellWhenPassed() { m_TellWhenPassed = true; }
 
 private:
     friend class ::BroadcastNotification;
 
     std::atomic<std::uint64_t> m_PostingNumber{0};
     std::atomic<int> m_LinesToPass{0};
+    bool m_TellWhenPassed = false;
 };
 
 }

@@ -25,10 +25,13 @@ public:
     static void Run(std::function<void()> function);
 
     /// Gives the object one turn when the steady time of `Clock` has come to `due`. With a clock that stands still
-    /// until it is moved, `PollTimers` tells the scheduler that it was.
+    /// until it is moved, `PollTimers` tells the scheduler that it was. At once while somebody waits for rest
+    /// (`Activity::WaitForRest`).
     static void GiveTurnAt(std::chrono::nanoseconds due, Counted<Schedulable> schedulable);
     /// Looks at the clock again at once.
     static void PollTimers();
+    /// Gives all turns that wait for a time at once.
+    static void RushTimers();
 
     /// Threads of the pool at this moment, for tests and diagnostics.
     [[nodiscard]] static std::size_t GetNumberOfThreads();
