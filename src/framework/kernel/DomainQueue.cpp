@@ -115,7 +115,7 @@ void DomainQueue::Append(Entry entry, std::vector<Entry> & dropped)
         // Not past a fence: who waits there waits for the callbacks of what stands before it.
         for (std::size_t index = m_Entries.size(); index-- > 0 && m_Entries[index].m_Command;) {
             if (entry.m_Command->IsAnotherAlreadyInQueue(m_Entries[index].m_Command)) {
-                Join(entry, m_Entries[index]);
+                Join(m_Entries[index], entry, entry);
                 dropped.push_back(std::move(m_Entries[index]));
                 m_Entries.erase(m_Entries.begin() + static_cast<std::ptrdiff_t>(index));
                 Kernel::Activity::End();
@@ -125,16 +125,20 @@ void DomainQueue::Append(Entry entry, std::vector<Entry> & dropped)
     m_Entries.push_back(std::move(entry));
 }
 
-void DomainQueue::Join(Entry & survivor, Entry & folded)
+void DomainQueue::Join(Entry & earlier, Entry & later, Entry & survivor)
 {
-    std::vector<std::function<void()>> callbacks = folded.m_Command->TakeCompletionCallbacks();
-    std::vector<std::function<void()>> own = survivor.m_Command->TakeCompletionCallbacks();
-    callbacks.insert(callbacks.end(), std::make_move_iterator(own.begin()), std::make_move_iterator(own.end()));
+    std::vector<std::function<void()>> callbacks = earlier.m_Command->TakeCompletionCallbacks();
+    for (std::function<void()> & callback : later.m_Command->TakeCompletionCallbacks()) {
+        callbacks.push_back(std::move(callback));
+    }
     survivor.m_Command->AddCompletionCallbacks(std::move(callbacks));
-    survivor.m_Waiters.insert(survivor.m_Waiters.end(), folded.m_Waiters.begin(), folded.m_Waiters.end());
-    survivor.m_Tasks.insert(survivor.m_Tasks.end(), folded.m_Tasks.begin(), folded.m_Tasks.end());
-    folded.m_Waiters.clear();
-    folded.m_Tasks.clear();
+    Entry & folded = &survivor == &later ? earlier : later;
+    for (Waiter * const waiter : std::exchange(folded.m_Waiters, {})) {
+        survivor.m_Waiters.push_back(waiter);
+    }
+    for (Counted<BackgroundTask> & task : std::exchange(folded.m_Tasks, {})) {
+        survivor.m_Tasks.push_back(std::move(task));
+    }
 }
 
 bool DomainQueue::ScheduleIfIdle()
@@ -316,7 +320,7 @@ Counted<DomainCommand> DomainQueue::TakeNext()
             next = m_Entries.empty() ? nullptr : m_Entries.front().m_Command;
         }
         entry.m_Command->Merge(folded.m_Command);
-        Join(entry, folded);
+        Join(entry, folded, entry);
         Kernel::Activity::End();
     }
     m_Taken = std::move(entry);

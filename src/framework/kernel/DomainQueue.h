@@ -79,7 +79,8 @@ private:
     void Run(Entry entry);
     /// What is left to do for an entry whose command has run or was dropped.
     void End(Entry entry);
-    static void Join(Entry & survivor, Entry & folded);
+    /// One of the two goes on for both.
+    static void Join(Entry & earlier, Entry & later, Entry & survivor);
 
     DomainController & m_Controller;
     std::mutex m_Lock;
