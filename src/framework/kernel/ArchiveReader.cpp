@@ -22,6 +22,16 @@ constexpr std::uint64_t MaximumExpansion = 1032;
 constexpr zip_int64_t MaximumItems = 65535;
 constexpr std::size_t MaximumNameLength = 1024;
 
+/// The file ends with the record that ends every container of ours, whatever lies before it.
+bool HasEnd(File const & file)
+{
+    constexpr std::size_t EndSize = 22;
+    std::uint64_t const size = file.GetSize();
+    char signature[4];
+    return EndSize <= size && file.ReadAt(size - EndSize, signature, sizeof(signature)) == sizeof(signature) &&
+           std::memcmp(signature, "PK\5\6", sizeof(signature)) == 0;
+}
+
 /// What the first bytes say; Success if they say that it is ours.
 Archive::OpenResult CheckStart(File const & file, IDTag type)
 {
@@ -67,12 +77,10 @@ std::unique_ptr<Archive::Reader> Archive::Reader::Open(std::shared_ptr<File> fil
         zip_source_t * const source = reader->m_Source.MakeSource();
         reader->m_Zip = source ? zip_open_from_source(source, ZIP_RDONLY | ZIP_CHECKCONS, &error) : nullptr;
         if (!reader->m_Zip) {
-            int const code = zip_error_code_zip(&error);
             zip_error_fini(&error);
             zip_source_free(source);
             reader->m_Source.ThrowFailure();
-            // Our start, and no directory at the end.
-            result = code == ZIP_ER_NOZIP ? OpenResult::Truncated : OpenResult::Corrupt;
+            result = HasEnd(*reader->m_File) ? OpenResult::Corrupt : OpenResult::Truncated;
             return nullptr;
         }
         if (!reader->ReadDirectory()) {

@@ -47,6 +47,7 @@ void ZipFileSource::Write(void const * data, std::size_t size)
     m_Window.resize(std::max(m_Window.size(), at + size));
     std::memcpy(m_Window.data() + at, data, size);
     m_WritePosition += size;
+    m_WriteEnd = std::max(m_WriteEnd, m_WritePosition);
 }
 
 void ZipFileSource::SeekWrite(std::uint64_t offset)
@@ -127,9 +128,8 @@ struct ZipFileSourceCallback
         case ZIP_SOURCE_SEEK_WRITE: {
             zip_error_t error;
             zip_error_init(&error);
-            std::uint64_t const end = source.m_WindowStart + source.m_Window.size();
-            zip_int64_t const to =
-                zip_source_seek_compute_offset(source.m_WritePosition, end, data, length, &error);
+            zip_int64_t const to = zip_source_seek_compute_offset(source.m_WritePosition, source.m_WriteEnd, data,
+                                                                  length, &error);
             if (to < 0) {
                 return -1;
             }

@@ -43,6 +43,7 @@ private:
     std::vector<std::uint8_t> m_Window;
     std::uint64_t m_WindowStart = 0;
     std::uint64_t m_WritePosition = 0;
+    std::uint64_t m_WriteEnd = 0;
     std::exception_ptr m_Failure;
 };
 
