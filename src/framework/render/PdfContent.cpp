@@ -42,9 +42,9 @@ PdfContent::PdfContent(Schema const & schema, PdfResources & resources, FormStor
 {
 }
 
-std::string PdfContent::Write(DisplayList const & list, Raster::AffineTransform::Params const & toPage, PdfUses & uses)
+std::string PdfContent::Write(std::initializer_list<DisplayList const *> lists,
+                              Raster::AffineTransform::Params const & toPage, PdfUses & uses)
 {
-    KORVANE_ASSERT(list.GetDepth() == 0);
     KORVANE_ASSERT_MESSAGE(toPage.a == 1 && toPage.b == 0 && toPage.c == 0 && toPage.d == -1,
                            "text is written upright and in its own size");
     m_ToPage = toPage;
@@ -54,6 +54,17 @@ std::string PdfContent::Write(DisplayList const & list, Raster::AffineTransform:
     m_State = GraphicsState();
     m_ForbiddenFonts.clear();
     m_HadMissingGlyph = false;
+    for (DisplayList const * list : lists) {
+        WriteList(*list);
+    }
+    EndText();
+    uses = m_Uses;
+    return std::move(m_Text);
+}
+
+void PdfContent::WriteList(DisplayList const & list)
+{
+    KORVANE_ASSERT(list.GetDepth() == 0);
     for (DisplayList::Operation const operation : list.GetOperations()) {
         switch (operation.m_Kind) {
         case DisplayList::Kind::Fill:
@@ -82,9 +93,6 @@ std::string PdfContent::Write(DisplayList const & list, Raster::AffineTransform:
             break;
         }
     }
-    EndText();
-    uses = m_Uses;
-    return std::move(m_Text);
 }
 
 void PdfContent::BeginGroup(Group const & group)

@@ -26,9 +26,10 @@ public:
 
     PdfContent(Schema const & schema, PdfResources & resources, FormStore storeForm, ImageSource images);
 
-    /// The content stream of a page. `toPage` goes from the list's coordinates to PDF's, y up. What it uses is in `uses`.
-    [[nodiscard]] std::string Write(DisplayList const & list, Raster::AffineTransform::Params const & toPage,
-                                    PdfUses & uses);
+    /// The content stream of a page that shows these lists, one over the other. `toPage` goes from the list's coordinates
+    /// to PDF's, y up. What it uses is in `uses`.
+    [[nodiscard]] std::string Write(std::initializer_list<DisplayList const *> lists,
+                                    Raster::AffineTransform::Params const & toPage, PdfUses & uses);
 
     /// Fonts of the last page whose licence forbids embedding, each once a page.
     [[nodiscard]] std::set<Typeset::FontFace const *> const & GetForbiddenFonts() const { return m_ForbiddenFonts; }
@@ -62,6 +63,7 @@ private:
         GraphicsState m_OuterState;
     };
 
+    void WriteList(DisplayList const & list);
     void BeginGroup(Group const & group);
     void EndGroup();
     void BeginMark(Mark const & mark);
