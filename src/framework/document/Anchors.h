@@ -1,59 +1,59 @@
 #pragma once
 
+#include "framework/document/TextFlow.h"
 #include "framework/kernel/Countable.h"
 #include "framework/kernel/Counted.h"
 #include "framework/kernel/Geometry.h"
 #include "framework/kernel/StringT.h"
+#include "framework/story/AnchorData.h"
 
 #include <vector>
 
-namespace Story
-{
-class AnchorData;
-}
 class DocumentController;
 class Selection;
 class SpreadNode;
-class TextFlow;
 
 /// One anchor at its place: the anchor's data, and where in the document it stands. A blind anchor has no place: it
 /// stands for an anchor of another chapter.
 ///
-/// Made by a visitor as a picture of the moment: it does not follow later edits.
+/// Made by a visitor as a picture of the moment: it does not follow later edits of the text, but sees a newer layout.
 class AnchorInstance : public virtual Kernel::Countable
 {
 public:
-    AnchorInstance(Kernel::Counted<Story::AnchorData const> anchor, Kernel::Counted<TextFlow> flow, std::uint32_t position,
-                   int outlineLevel);
+    /// `index` is the anchor's number among the anchors of the flow's story, `offset` its offset there.
+    AnchorInstance(Kernel::Counted<Story::AnchorData> anchor, Kernel::Counted<TextFlow> flow, std::size_t index,
+                   std::size_t offset);
     /// A blind anchor of the chapter at that position of the book.
-    AnchorInstance(Kernel::Counted<Story::AnchorData const> anchor, int chapterIndex);
+    AnchorInstance(Kernel::Counted<Story::AnchorData> anchor, int chapterIndex);
     ~AnchorInstance() override;
 
-    [[nodiscard]] Kernel::Counted<Story::AnchorData const> GetAnchor() const { return m_Anchor; }
-    [[nodiscard]] String GetUid() const;
-    [[nodiscard]] String GetName() const;
-    [[nodiscard]] bool IsPDFBookmark() const;
+    [[nodiscard]] Kernel::Counted<Story::AnchorData> const & GetAnchor() const { return m_Anchor; }
+    [[nodiscard]] String GetUid() const { return m_Anchor->GetUid(); }
+    [[nodiscard]] String GetName() const { return m_Anchor->GetName(); }
+    [[nodiscard]] bool IsPDFBookmark() const { return m_Anchor->IsPDFBookmark(); }
+    /// Depth in the outline from 1; 0 for an anchor that is no heading's.
+    [[nodiscard]] int GetOutlineLevel() const { return m_Anchor->GetLevel(); }
     [[nodiscard]] bool IsBlind() const { return !m_Flow; }
     /// Position of the chapter in its book; -1 for an anchor with a place.
     [[nodiscard]] int GetChapterIndex() const { return m_ChapterIndex; }
 
-    /// The spread that shows the anchor, with the top left of its line there, as saved layout or last composition had it.
-    /// Null, with `point` left alone, for a blind anchor and for text that found no place.
-    [[nodiscard]] Kernel::JailCounted<SpreadNode> GetSpreadAndTargetPoint(Kernel::PointT<double> & point) const;
+    /// The spread that shows the anchor, with the top left of its line there. Null, with `point` left alone, for a blind
+    /// anchor and for text that found no place.
+    Kernel::JailCounted<SpreadNode> GetSpreadAndTargetPoint(Kernel::PointT<double> & point) const;
     /// A selection of the anchor's place; null for a blind anchor.
     [[nodiscard]] Kernel::Counted<Selection> CreateSelection() const;
 
     [[nodiscard]] Kernel::Counted<TextFlow> const & GetTextFlow() const { return m_Flow; }
-    /// Position in the flow's story.
-    [[nodiscard]] std::uint32_t GetPosition() const { return m_Position; }
-    /// Depth in the outline from 1; 0 for an anchor whose paragraph is no heading.
-    [[nodiscard]] int GetOutlineLevel() const { return m_OutlineLevel; }
+    /// Offset in the flow's story: of the anchor, or of the element that holds it.
+    [[nodiscard]] std::size_t GetOffset() const { return m_Offset; }
 
 private:
-    Kernel::Counted<Story::AnchorData const> m_Anchor;
+    [[nodiscard]] Kernel::JailCounted<TextFrameNode> FindPlace(Kernel::PointT<double> & inFrame) const;
+
+    Kernel::Counted<Story::AnchorData> m_Anchor;
     Kernel::Counted<TextFlow> m_Flow;
-    std::uint32_t m_Position = 0;
-    int m_OutlineLevel = 0;
+    std::size_t m_Index = 0;
+    std::size_t m_Offset = 0;
     int m_ChapterIndex = -1;
 };
 

@@ -1,8 +1,6 @@
 #pragma once
 
-#include "framework/kernel/Counted.h"
-
-class DocumentController;
+#include "framework/document/DocumentController.h"
 
 /// Holds a document's reader lock for its own lifetime, so that its tree may be read from any thread. Whoever holds one
 /// waits for no queue.

@@ -1,20 +1,18 @@
 #pragma once
 
+#include "framework/document/DocumentPictures.h"
 #include "framework/document/DocumentSection.h"
 #include "framework/document/Node.h"
 #include "framework/document/PageSetup.h"
 #include "framework/document/Swatches.h"
+#include "framework/document/TextFlow.h"
+#include "framework/story/Index.h"
+#include "framework/story/StyleSheet.h"
 
 #include <vector>
 
-namespace Story
-{
-class Index;
-class StyleSheet;
-}
 class MasterSpreadNode;
 class SpreadNode;
-class TextFlow;
 
 /// Root of a document's tree: its spreads, masters, sections, styles and text flows.
 ///
@@ -23,7 +21,7 @@ class TextFlow;
 class DocumentNode : public Node
 {
 public:
-    DocumentNode();
+    explicit DocumentNode(Kernel::Counted<DocumentPictures> pictures);
     ~DocumentNode() override;
 
     [[nodiscard]] Kind GetKind() const override { return Kind::Document; }
@@ -73,15 +71,24 @@ public:
 
     /// The topic index; never null. One object for the life of the document, whatever its content.
     [[nodiscard]] Kernel::Counted<Story::Index> GetIndex() const { return m_Index; }
+    /// For loading: the index from the file becomes this document's.
+    void AdoptIndex(Kernel::Counted<Story::Index> index);
     [[nodiscard]] std::vector<Kernel::Counted<TextFlow>> const & GetTextFlows() const { return m_TextFlows; }
     /// The flow that grows and shrinks the document; null if it has none.
     [[nodiscard]] Kernel::Counted<TextFlow> GetMainFlow() const;
     void AddTextFlow(Kernel::Counted<TextFlow> flow);
+    void RemoveTextFlow(Kernel::Counted<TextFlow> const & flow);
     [[nodiscard]] Kernel::Counted<Story::StyleSheet const> const & GetStyleSheet() const { return m_StyleSheet; }
     void SetStyleSheet(Kernel::Counted<Story::StyleSheet const> styles);
     [[nodiscard]] Kernel::Consolidated<Swatches> const & GetSwatches() const { return m_Swatches; }
     void SetSwatches(Kernel::Consolidated<Swatches> swatches) { m_Swatches = std::move(swatches); }
 
+    /// The picture files that the document holds; never null.
+    [[nodiscard]] Kernel::Counted<DocumentPictures> const & GetPictures() const { return m_Pictures; }
+
+    /// What running heads show as the document's title. Worked out from title and text; never saved.
+    [[nodiscard]] String const & GetRunningTitle() const { return m_RunningTitle; }
+    void SetRunningTitle(String const & title) { m_RunningTitle = title; }
     /// Title of the whole publication, for running heads; empty if the document is not part of one.
     [[nodiscard]] String const & GetPublicationTitle() const { return m_PublicationTitle; }
     void SetPublicationTitle(String const & title) { m_PublicationTitle = title; }
@@ -92,6 +99,8 @@ private:
     std::vector<Kernel::Counted<TextFlow>> m_TextFlows;
     Kernel::Counted<Story::StyleSheet const> m_StyleSheet;
     Kernel::Consolidated<Swatches> m_Swatches;
+    Kernel::Counted<DocumentPictures> const m_Pictures;
+    String m_RunningTitle;
     String m_PublicationTitle;
     PageSetup m_PageSetup;
 };

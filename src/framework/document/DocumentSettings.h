@@ -1,20 +1,17 @@
 #pragma once
 
 #include "framework/document/DocumentMetadata.h"
+#include "framework/document/DocumentPictures.h"
 #include "framework/document/DocumentSection.h"
 #include "framework/document/PageSetup.h"
 #include "framework/document/RunningTextNode.h"
 #include "framework/document/Swatches.h"
 #include "framework/raster/Format.h"
 #include "framework/raster/ICCManager.h"
+#include "framework/story/StyleSheet.h"
 
 #include <optional>
 #include <vector>
-
-namespace Story
-{
-class StyleSheet;
-}
 
 /// A running head or folio of a master. Lengths in points, from the top left of its page.
 struct RunningTextSettings
@@ -54,6 +51,13 @@ struct MasterSettings
     MasterPageSettings m_Right;
 };
 
+/// A picture file for the document to hold. `m_Size` of the entry is filled in.
+struct PictureSettings
+{
+    Raster::Picture::Bytes m_Bytes;
+    DocumentPictures::Entry m_Entry;
+};
+
 /// Everything but the text that a new document is made from: what a template and a chapter's head say.
 ///
 /// A plain value, made by importers; two threads may make documents from copies of one at the same time.
@@ -64,6 +68,8 @@ struct DocumentSettings
     std::vector<MasterSettings> m_Masters;
     Kernel::Counted<Story::StyleSheet const> m_Styles;
     std::vector<Swatch> m_Swatches;
+    /// The pictures that the text names by `DocumentPictures::IdOf` their bytes. Those that it does not name are dropped.
+    std::vector<PictureSettings> m_Pictures;
     DocumentMetadata::Values m_Metadata;
     /// For running heads: the title of the book.
     String m_PublicationTitle;

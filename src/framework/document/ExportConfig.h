@@ -3,15 +3,8 @@
 #include "framework/kernel/Countable.h"
 #include "framework/kernel/Counted.h"
 #include "framework/kernel/StringT.h"
-
-namespace Raster
-{
-class ICCProfile;
-}
-namespace Renderer
-{
-class FileExportOptions;
-}
+#include "framework/raster/ICCProfile.h"
+#include "framework/render/FileExportOptions.h"
 
 /// How one exportable is written. An immutable value.
 class ExportConfig : public virtual Kernel::Countable

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "framework/document/Anchors.h"
+#include "framework/document/Selection.h"
 #include "framework/story/HyperlinkData.h"
 
 /// One hyperlink as output needs it: where it leads and what of the spread it covers. A plain record, made for one use.

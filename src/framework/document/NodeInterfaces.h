@@ -2,17 +2,10 @@
 
 #include "framework/kernel/Countable.h"
 #include "framework/kernel/Counted.h"
+#include "framework/kernel/DataSource.h"
 #include "framework/kernel/StringT.h"
+#include "framework/story/Story.h"
 
-namespace Kernel
-{
-class DataSource;
-}
-namespace Story
-{
-class Story;
-class Selection;
-}
 class TextFlow;
 
 /// A node that shows text of a story. Had from a `Node` by `CountedCast`.
@@ -21,7 +14,8 @@ class StoryInterface : public virtual Kernel::Countable
 public:
     /// The story that the node shows a part of; never null.
     [[nodiscard]] virtual Kernel::Counted<Story::Story> GetStory() const = 0;
-    /// What of the story this node holds. Where the text is not composed, nothing; with `wholeStory` all of it.
+    /// What of the story this node holds, by its layout; a null selection where it holds nothing. With `wholeStory` all
+    /// of the story.
     [[nodiscard]] virtual Story::Selection GetStorySelection(bool wholeStory) const = 0;
 };
 
@@ -45,7 +39,7 @@ public:
 class ImageResourceInterface : public virtual Kernel::Countable
 {
 public:
-    /// Where the file's bytes come from; null if the file is missing.
+    /// Where the file's bytes come from; never null, also if the file is missing.
     [[nodiscard]] virtual Kernel::Counted<Kernel::DataSource const> GetDataSource() const = 0;
 };
 

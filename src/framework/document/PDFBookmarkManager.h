@@ -4,12 +4,6 @@
 
 #include <map>
 
-namespace Kernel
-{
-class InSerialiser;
-class OutSerialiser;
-}
-
 /// Bookmarks that anchors stand for, known by the anchors' uids: names and order that a book keeps above its chapters.
 ///
 /// Shared between threads once it hangs in a document or book: change a clone and put that in its place.
@@ -26,6 +20,8 @@ public:
     [[nodiscard]] bool IsLogicallyDifferent(Kernel::Counted<PDFBookmarkManager const> other) const;
     /// Takes in the bookmarks among the anchors: new ones are added, known ones take the anchor's name. Others stay.
     void Reconcile(Kernel::Counted<Anchors const> anchors);
+    /// Adds one bookmark, or replaces the one of its uid.
+    void Add(Kernel::Counted<Story::AnchorData> data);
     /// The anchor's data, null if no bookmark has the uid.
     [[nodiscard]] Kernel::Counted<Story::AnchorData> GetDataFromUid(String const & uid) const;
     [[nodiscard]] std::size_t GetCount() const { return m_Data.size(); }

@@ -28,6 +28,8 @@ struct PageSetup
     /// Distance of the baselines of the grid, 0 for none, and of the first one from the top of a text frame.
     double m_GridIncrement = 0;
     double m_GridStart = 0;
+    /// Stands over the notes at the end of the flow, in the document's language.
+    String m_NotesHeading = "Notes";
 
     friend bool operator==(PageSetup const &, PageSetup const &) = default;
 };

@@ -14,11 +14,11 @@ public:
     [[nodiscard]] Kind GetKind() const override { return Kind::Picture; }
     [[nodiscard]] Kernel::RectT<double> GetSpreadBaseBox(bool) const override { return m_Rect; }
     [[nodiscard]] String const & GetGUID() const override { return m_Guid; }
-    [[nodiscard]] Kernel::Counted<Kernel::DataSource const> GetDataSource() const override;
-    [[nodiscard]] String const & GetPath() const { return m_Path; }
+    [[nodiscard]] Kernel::Counted<Kernel::DataSource const> GetDataSource() const override { return m_Source; }
+    [[nodiscard]] String const & GetPath() const { return m_Source->GetPath(); }
 
 private:
     Kernel::RectT<double> m_Rect;
-    String m_Path;
+    Kernel::Counted<Kernel::DataSource const> m_Source;
     String m_Guid;
 };

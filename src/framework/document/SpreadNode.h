@@ -5,8 +5,6 @@
 
 #include <vector>
 
-class MasterSpreadNode;
-
 /// The side of the fold on which a page lies.
 enum class PageSide : std::uint8_t
 {
@@ -26,8 +24,12 @@ struct SpreadPage
     /// Bleed margins: left, top, right, bottom.
     Kernel::RectT<double> m_Bleed;
     PageSide m_Side = PageSide::Single;
-    /// Whose items are drawn with the page's own; null for none, as on a blank page.
-    Kernel::Counted<MasterSpreadNode const> m_Master;
+    /// Name of the master whose items are drawn with the page's own; empty for none, as on a blank page.
+    String m_Master;
+    /// Holds no frame of the main flow: it was added to end the document on the right side.
+    bool m_Blank = false;
+
+    friend bool operator==(SpreadPage const &, SpreadPage const &) = default;
 };
 
 /// Pages that lie side by side (or one above the other), with the items on them.

@@ -30,6 +30,8 @@ public:
     [[nodiscard]] int GetFrameIndex() const override { return m_FrameIndex; }
 
     [[nodiscard]] Kernel::RectT<double> const & GetRect() const { return m_Rect; }
+    /// Index in the document of the page that the frame lies on; -1 for a frame in no document.
+    [[nodiscard]] int GetPageIndex() const;
     void SetRect(Kernel::RectT<double> const & rect) { m_Rect = rect; }
 
 private:

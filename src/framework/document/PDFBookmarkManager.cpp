@@ -1,0 +1,42 @@
+#include "framework/document/PDFBookmarkManager.h"
+
+PDFBookmarkManager::PDFBookmarkManager() = default;
+PDFBookmarkManager::~PDFBookmarkManager() = default;
+
+Kernel::Counted<PDFBookmarkManager> PDFBookmarkManager::Clone() const
+{
+    Kernel::Counted<PDFBookmarkManager> const clone = Kernel::MakeCounted<PDFBookmarkManager>();
+    clone->m_Data = m_Data;
+    return clone;
+}
+
+bool PDFBookmarkManager::IsLogicallyDifferent(Kernel::Counted<PDFBookmarkManager const> other) const
+{
+    for (auto const & [uid, data] : m_Data) {
+        Kernel::Counted<Story::AnchorData> const theirs = other ? other->GetDataFromUid(uid) : nullptr;
+        if (!theirs || theirs->GetName() != data->GetName()) {
+            return true;
+        }
+    }
+    return false;
+}
+
+void PDFBookmarkManager::Reconcile(Kernel::Counted<Anchors const> anchors)
+{
+    for (Kernel::Counted<AnchorInstance const> const & anchor : *anchors) {
+        if (String const uid = anchor->GetUid(); anchor->IsPDFBookmark() && !uid.Empty()) {
+            m_Data[uid] = anchor->GetAnchor();
+        }
+    }
+}
+
+void PDFBookmarkManager::Add(Kernel::Counted<Story::AnchorData> data)
+{
+    m_Data[data->GetUid()] = data;
+}
+
+Kernel::Counted<Story::AnchorData> PDFBookmarkManager::GetDataFromUid(String const & uid) const
+{
+    auto const found = m_Data.find(uid);
+    return found == m_Data.end() ? nullptr : found->second;
+}
