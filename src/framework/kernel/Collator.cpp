@@ -8,11 +8,6 @@
 namespace Kernel
 {
 
-void Collator::Close::operator()(UCollator * collator) const
-{
-    ucol_close(collator);
-}
-
 Collator::Collator(String const & language)
 {
     char locale[ULOC_FULLNAME_CAPACITY] = "";
@@ -23,13 +18,9 @@ Collator::Collator(String const & language)
     }
     status = U_ZERO_ERROR;
     // An empty name would mean the default locale of the process.
-    m_Collator.reset(ucol_open(locale[0] == 0 ? "root" : locale, &status));
+    m_Collator.reset(ucol_open(locale[0] == 0 ? "root" : locale, &status), &ucol_close);
     KORVANE_ASSERT_MESSAGE(U_SUCCESS(status) && m_Collator, "ICU has no collation data");
 }
-
-Collator::~Collator() = default;
-Collator::Collator(Collator &&) noexcept = default;
-Collator & Collator::operator=(Collator &&) noexcept = default;
 
 int Collator::Compare(String const & a, String const & b) const
 {
