@@ -10,13 +10,16 @@
 #include "framework/kernel/StringT.h"
 #include "framework/kernel/TimeStamp.h"
 #include "framework/kernel/UnitValue.h"
+#include "framework/kernel/UnitValueConverter.h"
 #include "framework/raster/Format.h"
 #include "framework/raster/ICCManager.h"
 
+#include <atomic>
 #include <functional>
 #include <map>
 #include <memory>
 #include <mutex>
+#include <thread>
 #include <vector>
 
 class DocumentMetadata;
@@ -78,7 +81,7 @@ public:
     BookChapter();
     /// A record for the file at `path`, named after it. Knows nothing of the document yet. Its cached start page is 0,
     /// which as a start page means "goes on from the chapter before", as the record does until the first update.
-    explicit BookChapter(const String & path);
+    explicit BookChapter(String const & path);
     ~BookChapter() override;
 
     [[nodiscard]] String GetName() const;
@@ -131,8 +134,8 @@ public:
     /// documents.
     [[nodiscard]] bool IsValid() const;
 
-    void SetName(const String & name);
-    void SetPath(const String & path);
+    void SetName(String const & name);
+    void SetPath(String const & path);
     void SetCachedStartPage(int page);
     void SetStartFromPage(int page);
     void SetColourFormat(Raster::Format format);
@@ -148,21 +151,21 @@ public:
     void SetHasEndnotesMarker(bool hasMarker);
     void SetContainsIndex(bool containsIndex);
     void SetRestricted(bool restricted);
-    void SetSpreadInfo(const std::vector<SpreadInfo> & spreads);
+    void SetSpreadInfo(std::vector<SpreadInfo> const & spreads);
     /// The endnotes with the number they start at and the number after the last one.
     void SetEndnotes(Kernel::Counted<Story::Story const> endnotes, int start, int end);
     /// Replaces the list, and the anchors are no longer dirty.
-    void SetAnchors(const std::vector<AnchorInfo> & anchors);
+    void SetAnchors(std::vector<AnchorInfo> const & anchors);
     /// Empties the list: nobody may take stale anchors for true ones.
     void SetAnchorsDirty();
 
     /// True if the status is another one than before.
     bool SetStatus(Status status);
     /// True if the text differs byte for byte.
-    bool SetPages(const String & pages);
+    bool SetPages(String const & pages);
     /// Stores both. True only if both differ: a book does not become unsaved over a status whose text, which is what
     /// the user sees, stays the same.
-    bool SetPreflightStatus(PreflightResult::Status status, const String & description);
+    bool SetPreflightStatus(PreflightResult::Status status, String const & description);
     /// Asks the file for its modification time. True if it gave one and that differs from the stored one, which it then
     /// replaces. A file that gives none leaves the field alone and counts as unchanged.
     bool UpdateTimeStamp();
@@ -185,10 +188,10 @@ public:
     [[nodiscard]] bool IsDoublePageStart() const;
     [[nodiscard]] bool HasHangingPageEnd() const;
     /// The first page of this chapter can share a spread with the hanging last page of `previous`, which may be null.
-    [[nodiscard]] bool CanMergeWithPrevious(Kernel::Counted<const BookChapter> previous) const;
+    [[nodiscard]] bool CanMergeWithPrevious(Kernel::Counted<BookChapter const> previous) const;
     /// Blank pages, 0 to 2, needed before this chapter so that its pages fall on their own sides. None without a
     /// chapter before, without `padStrays`, or where merging is wanted and possible.
-    [[nodiscard]] int GetPrePagePaddingCount(Kernel::Counted<const BookChapter> previous, bool padStrays,
+    [[nodiscard]] int GetPrePagePaddingCount(Kernel::Counted<BookChapter const> previous, bool padStrays,
                                              bool mergeStrays) const;
 
     /// Brackets a close of the chapter's document. Clearing it runs the function that a waiter left, under the lock of
@@ -199,33 +202,32 @@ public:
     bool IsInClose(std::function<void()> onCloseFinished) const;
     /// Lets one load at a time through the wait for a close, since the bracket remembers a single waiter. Hold it from
     /// the question to the end of the wait.
-    [[nodiscard]] const Kernel::CriticalSection & GetCloseGate() const { return m_CloseGate; }
+    [[nodiscard]] Kernel::CriticalSection const & GetCloseGate() const { return m_CloseGate; }
 
     /// Writes the seven persistent fields.
     void Save(Kernel::OutSerialiser & out) const override;
     /// Reads them; a missing one keeps what it had. Always true.
-    bool Load(const Kernel::InSerialiser & in, Kernel::FileStore & store, unsigned short version) override;
-    [[nodiscard]] const Kernel::ClassProperties * GetObjectClassProperties() const override;
-    static const Kernel::ClassProperties & GetTypeClassProperties();
+    bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
+    static Kernel::ClassProperties const & GetTypeClassProperties();
     static Kernel::Counted<Kernel::Serialisable> CreateObject();
-    static Kernel::ClassProperties ms_ClassProperties;
+    static Kernel::ClassProperties const ms_ClassProperties;
 
 private:
     using Facts = std::shared_ptr<const ChapterFacts>;
-
-    static const Kernel::ClassPropertiesBase::DefaultItem * __GetDefaultSerialisation();
 
     /// The facts that this thread has to see: its own draft inside an `UpdateSession`, else what is published.
     [[nodiscard]] Facts Now() const;
     /// Calls `change` on a copy of the facts, and publishes that unless a session will. Gives what `change` gives.
     template <typename TChange>
-    auto Change(const TChange & change);
+    auto Change(TChange const & change);
 
     Published<Facts> m_Facts;
     mutable std::recursive_mutex m_WriterLock;
     /// Not null while a session is open; touched under the writer lock only.
     std::shared_ptr<ChapterFacts> m_Draft;
     int m_SessionDepth = 0;
+    std::atomic<std::thread::id> m_DraftOwner{};
 
     Kernel::CriticalSection m_PasswordsLock;
     std::map<String, String> m_Passwords;

@@ -29,7 +29,7 @@ class BookCollection final : public BroadcastNotificationSink, public BookSink
 {
 public:
     using BookList = std::vector<Kernel::Counted<BookController>>;
-    using ChapterList = std::vector<Kernel::Counted<const BookChapter>>;
+    using ChapterList = std::vector<Kernel::Counted<BookChapter const>>;
 
     [[nodiscard]] static BookCollection & GetInstance();
 
@@ -38,70 +38,70 @@ public:
     /// Nothing if the book is registered already.
     void AddBookController(Kernel::Counted<BookController> book);
     /// Takes the book out, also from its place in front.
-    void RemoveBookController(Kernel::Counted<const BookController> book);
+    void RemoveBookController(Kernel::Counted<BookController const> book);
     /// All open books in the order in which they were added.
     [[nodiscard]] BookList Books() const;
     [[nodiscard]] int GetNumberOfActiveBookControllers() const;
     /// The book at that place among all; null out of range.
-    [[nodiscard]] Kernel::Counted<const BookController> GetActiveBookController(int index) const;
+    [[nodiscard]] Kernel::Counted<BookController const> GetActiveBookController(int index) const;
     /// The same book in mutable form; null if it is not registered. Whoever changes a book from outside its queue goes
     /// through this.
     [[nodiscard]] Kernel::Counted<BookController>
-    GetMutableBookController(Kernel::Counted<const BookController> book) const;
+    GetMutableBookController(Kernel::Counted<BookController const> book) const;
     /// The user interface has this book in front; null for none.
-    void SetUIActiveBookController(Kernel::Counted<const BookController> book);
+    void SetUIActiveBookController(Kernel::Counted<BookController const> book);
     /// Tells everybody that the book at `path` is the current one, by a `CurrentBookChangedNotification`. Nothing if
     /// there is no such book; nothing is stored.
     void SetActiveBookController(String path);
 
     // Look-ups --------------------------------------------------------------------------------------------------------
 
-    [[nodiscard]] Kernel::Counted<const BookController> GetBookFromPath(String path) const;
+    [[nodiscard]] Kernel::Counted<BookController const> GetBookFromPath(String path) const;
     /// The book that a document belongs to, by its path: the one in front if it has the chapter, else the most recently
     /// commanded one that has it, else null.
-    [[nodiscard]] Kernel::Counted<const BookController>
-    GetBookFromDocument(Kernel::Counted<const DocumentController> document) const;
-    [[nodiscard]] bool IsInBook(const String & path) const;
+    [[nodiscard]] Kernel::Counted<BookController const>
+    GetBookFromDocument(Kernel::Counted<DocumentController const> document) const;
+    [[nodiscard]] bool IsInBook(String const & path) const;
 
     // Commands --------------------------------------------------------------------------------------------------------
 
     /// Queues a command on the book and makes it the most recently commanded one. Dropped in silence if the book is no
     /// longer registered.
-    void EnqueueCommand(Kernel::Counted<BookCommand> command, Kernel::Counted<const BookController> book);
+    void EnqueueCommand(Kernel::Counted<BookCommand> command, Kernel::Counted<BookController const> book);
     /// The same, and returns at the end of this command. The book must be registered for as long; the caller must
     /// neither hold its writer lock nor be its queue.
-    void EnqueueCommandAndWait(Kernel::Counted<BookCommand> command, Kernel::Counted<const BookController> book);
+    void EnqueueCommandAndWait(Kernel::Counted<BookCommand> command, Kernel::Counted<BookController const> book);
     /// The book's queue refuses commands from now on, and runs empty.
-    void DisableCommandEnqueueAndEmpty(Kernel::Counted<const BookController> book);
+    void DisableCommandEnqueueAndEmpty(Kernel::Counted<BookController const> book);
 
     // Updates: all but the last three only hand in commands -----------------------------------------------------------
 
-    void UpdateNumbers(Kernel::Counted<const BookController> book, ChapterList chapters, bool pages, bool lists,
+    void UpdateNumbers(Kernel::Counted<BookController const> book, ChapterList chapters, bool pages, bool lists,
                        bool notes);
     /// Renumbers the pages of this chapter and all behind it. Nothing while a number update runs, or without automatic
     /// updates.
-    void UpdatePageNumbers(Kernel::Counted<const BookController> book, Kernel::Counted<const BookChapter> chapter);
-    void UpdatePageNumbers(Kernel::Counted<const BookController> book,
-                           Kernel::Counted<const DocumentController> document);
+    void UpdatePageNumbers(Kernel::Counted<BookController const> book, Kernel::Counted<BookChapter const> chapter);
+    void UpdatePageNumbers(Kernel::Counted<BookController const> book,
+                           Kernel::Counted<DocumentController const> document);
     /// Gives a document that has just opened its numbers, automatic updates or not.
-    void UpdateChapterNumbers(Kernel::Counted<const BookController> book,
-                              Kernel::Counted<const DocumentController> document);
-    void UpdateChapterPreflight(Kernel::Counted<const BookController> book,
-                                Kernel::Counted<const DocumentController> document);
-    void UpdateCrossReferences(Kernel::Counted<const BookController> book, ChapterList chapters);
-    void UpdateChapters(Kernel::Counted<const BookController> book);
+    void UpdateChapterNumbers(Kernel::Counted<BookController const> book,
+                              Kernel::Counted<DocumentController const> document);
+    void UpdateChapterPreflight(Kernel::Counted<BookController const> book,
+                                Kernel::Counted<DocumentController const> document);
+    void UpdateCrossReferences(Kernel::Counted<BookController const> book, ChapterList chapters);
+    void UpdateChapters(Kernel::Counted<BookController const> book);
     /// Stores where the chapter's numbers start, and renumbers from there if updates are automatic.
-    void SetPageNumberOptions(Kernel::Counted<const BookController> book, Kernel::Counted<const BookChapter> chapter,
+    void SetPageNumberOptions(Kernel::Counted<BookController const> book, Kernel::Counted<BookChapter const> chapter,
                               bool continueFromPrevious, int startPage);
     /// Hands in what has to be brought up to date before output, by the switches below, between an engage and a release
     /// of the book lock. With all switches off, nothing.
-    void PreOutput(Kernel::Counted<const BookController> book, ChapterList chapters);
-    void UpdateAnchors(Kernel::Counted<const BookController> book, Kernel::Counted<const DocumentController> document);
+    void PreOutput(Kernel::Counted<BookController const> book, ChapterList chapters);
+    void UpdateAnchors(Kernel::Counted<BookController const> book, Kernel::Counted<DocumentController const> document);
     /// The chapter's document has closed. Under the book's writer lock. True if the file has changed while the book was
     /// not looking, or the book has no such chapter; false if the book is gone.
-    bool UpdateChapter(Kernel::Counted<const BookController> book, const String & path);
+    bool UpdateChapter(Kernel::Counted<BookController const> book, String const & path);
     /// The chapter's document has been saved. Under the book's writer lock. True if the file's time has moved.
-    bool UpdateChapter(Kernel::Counted<const BookController> book, Kernel::Counted<const DocumentController> document);
+    bool UpdateChapter(Kernel::Counted<BookController const> book, Kernel::Counted<DocumentController const> document);
 
     // Switches of the session, all on at start ------------------------------------------------------------------------
 
@@ -118,47 +118,47 @@ public:
 
     // Answers to the document framework -------------------------------------------------------------------------------
 
-    [[nodiscard]] bool IsAnyTocOutOfDate(Kernel::Counted<const DocumentController> document) override;
-    [[nodiscard]] bool IsIndexOutOfDate(Kernel::Counted<const DocumentController> document) override;
-    [[nodiscard]] bool IsInBook(Kernel::Counted<const DocumentController> document) override;
+    [[nodiscard]] bool IsAnyTocOutOfDate(Kernel::Counted<DocumentController const> document) override;
+    [[nodiscard]] bool IsIndexOutOfDate(Kernel::Counted<DocumentController const> document) override;
+    [[nodiscard]] bool IsInBook(Kernel::Counted<DocumentController const> document) override;
     [[nodiscard]] Kernel::Counted<DomainCommand>
-    MakeUpdateIndexCommand(Kernel::Counted<const DocumentController> document) override;
+    MakeUpdateIndexCommand(Kernel::Counted<DocumentController const> document) override;
     [[nodiscard]] Kernel::Counted<DomainCommand>
-    MakeUpdateAllTocsCommand(Kernel::Counted<const DocumentController> document) override;
+    MakeUpdateAllTocsCommand(Kernel::Counted<DocumentController const> document) override;
     /// Takes book commands that were meant for a chapter's document to the book's queue. True if it took the command.
-    bool HandleCommand(Kernel::Counted<const DocumentController> document,
+    bool HandleCommand(Kernel::Counted<DocumentController const> document,
                        Kernel::Counted<DomainCommand> command) override;
-    bool GetAnchors(AnchorVisitor & visitor, Kernel::Counted<const DocumentController> document) override;
-    [[nodiscard]] bool IsAnchorPointValid(Kernel::Counted<const AnchorInstance> instance,
-                                          Kernel::Counted<const DocumentController> document) override;
-    [[nodiscard]] const AnchorInfo * GetAnchorInfo(const String & uid,
-                                                   Kernel::Counted<const DocumentController> document) override;
+    bool GetAnchors(AnchorVisitor & visitor, Kernel::Counted<DocumentController const> document) override;
+    [[nodiscard]] bool IsAnchorPointValid(Kernel::Counted<AnchorInstance const> instance,
+                                          Kernel::Counted<DocumentController const> document) override;
+    [[nodiscard]] AnchorInfo const * GetAnchorInfo(String const & uid,
+                                                   Kernel::Counted<DocumentController const> document) override;
     /// An anchor that no chapter has counts as above.
-    [[nodiscard]] bool IsAnchorAbove(const String & uid, Kernel::Counted<const DocumentController> document) override;
-    [[nodiscard]] String GetPasswordForGuid(String guid, Kernel::Counted<const DocumentController> document) override;
-    void SetPasswordForGuid(String guid, String password, Kernel::Counted<const DocumentController> document) override;
+    [[nodiscard]] bool IsAnchorAbove(String const & uid, Kernel::Counted<DocumentController const> document) override;
+    [[nodiscard]] String GetPasswordForGuid(String guid, Kernel::Counted<DocumentController const> document) override;
+    void SetPasswordForGuid(String guid, String password, Kernel::Counted<DocumentController const> document) override;
     ~BookCollection() override;
 
 private:
     BookCollection();
 
-    [[nodiscard]] Kernel::Counted<const BookController> GetBookFromChapterPath(const String & path) const;
+    [[nodiscard]] Kernel::Counted<BookController const> GetBookFromChapterPath(String const & path) const;
     /// Moves the book to the back of the recent ones, if it is there.
     void MarkRecent(const Kernel::Counted<BookController const> & book);
     /// For each book that has a chapter at `path`.
     template <typename TAction>
-    void ForEachBookWith(const String & path, const TAction & action) const;
+    void ForEachBookWith(String const & path, const TAction & action) const;
 
     // What the dispatch hands in of content commands.
-    void EnqueueSetMasterIndex(Kernel::Counted<const BookController> book,
-                               Kernel::Counted<const DocumentController> document);
-    void EnqueueReconcileAnchors(Kernel::Counted<const BookController> book, Kernel::Counted<const BookChapter> chapter,
-                                 Kernel::Counted<const DocumentController> document);
+    void EnqueueSetMasterIndex(Kernel::Counted<BookController const> book,
+                               Kernel::Counted<DocumentController const> document);
+    void EnqueueReconcileAnchors(Kernel::Counted<BookController const> book, Kernel::Counted<BookChapter const> chapter,
+                                 Kernel::Counted<DocumentController const> document);
 
     Published<Snapshot<BookList>> m_Books;
     /// The same books, the one that last received a command at the back. Under its lock only.
     BookList m_RecentBooks;
-    Published<Kernel::Counted<const BookController>> m_UIActiveBook;
+    Published<Kernel::Counted<BookController const>> m_UIActiveBook;
     Kernel::CriticalSection m_BooksLock;
     Kernel::CriticalSection m_RecentBooksLock;
     std::atomic<bool> m_UpdatePageNumbersAutomatically{true};

@@ -1,12 +1,13 @@
 #pragma once
 
 #include "core/BookChapter.h"
-#include "core/InUpdateFlag.h"
 #include "core/Published.h"
+#include "framework/document/DocumentController.h"
 #include "framework/kernel/Counted.h"
 #include "framework/kernel/CriticalSection.h"
 #include "framework/kernel/DomainController.h"
 #include "framework/kernel/FileStoreItem.h"
+#include "framework/kernel/PostingFlag.h"
 #include "framework/kernel/StringT.h"
 
 #include <atomic>
@@ -17,10 +18,13 @@
 #include <vector>
 
 class Anchors;
-class DocumentController;
 class DocumentSaveResult;
 class OpenDocumentFailedNotification;
 class PDFBookmarkManager;
+namespace Kernel
+{
+class ArchiveThumbnails;
+}
 namespace Raster
 {
 class DynamicBitmap;
@@ -57,7 +61,7 @@ class BookController final : public DomainController, public Kernel::FileStoreIt
 {
 public:
     using ChapterList = std::vector<Kernel::Counted<BookChapter>>;
-    using ConstChapterList = std::vector<Kernel::Counted<const BookChapter>>;
+    using ConstChapterList = std::vector<Kernel::Counted<BookChapter const>>;
 
     /// What synchronising chapters with the key chapter touches.
     struct SynchroniseSettings
@@ -66,7 +70,7 @@ public:
         bool m_TextStyles = true;
         bool m_TableStyles = true;
         bool m_MasterPages = true;
-        friend bool operator==(const SynchroniseSettings &, const SynchroniseSettings &) = default;
+        friend bool operator==(SynchroniseSettings const &, SynchroniseSettings const &) = default;
     };
 
     /// An empty book without a file, clean, no pump running.
@@ -83,45 +87,45 @@ public:
     [[nodiscard]] ChapterList::const_iterator ChapterEnd() const;
     /// Null for an index out of range.
     [[nodiscard]] Kernel::JailCounted<BookChapter> GetChapterAtIndex(int index);
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetChapterAtIndex(int index) const;
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetChapterAtIndex(int index) const;
     /// -1 if the book does not hold the chapter.
-    [[nodiscard]] int IndexFromChapter(Kernel::Counted<const BookChapter> chapter) const;
+    [[nodiscard]] int IndexFromChapter(Kernel::Counted<BookChapter const> chapter) const;
     /// The neighbours; null at the ends and for a chapter that the book does not hold.
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetNextChapter(Kernel::Counted<const BookChapter> chapter) const;
-    [[nodiscard]] Kernel::Counted<const BookChapter>
-    GetPreviousChapter(Kernel::Counted<const BookChapter> chapter) const;
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetNextChapter(Kernel::Counted<BookChapter const> chapter) const;
+    [[nodiscard]] Kernel::Counted<BookChapter const>
+    GetPreviousChapter(Kernel::Counted<BookChapter const> chapter) const;
     /// Appends all chapters.
     void GetChapters(ConstChapterList & chapters) const;
     /// Appends the chapters behind the given one; none if the book does not hold it.
-    void GetChaptersAfter(ConstChapterList & chapters, Kernel::Counted<const BookChapter> chapter) const;
+    void GetChaptersAfter(ConstChapterList & chapters, Kernel::Counted<BookChapter const> chapter) const;
     /// The same record in mutable form; null if the book does not hold it (any more).
-    [[nodiscard]] Kernel::Counted<BookChapter> GetMutableChapter(Kernel::Counted<const BookChapter> chapter) const;
+    [[nodiscard]] Kernel::Counted<BookChapter> GetMutableChapter(Kernel::Counted<BookChapter const> chapter) const;
     /// The first chapter whose path is the same byte for byte, or null.
-    [[nodiscard]] Kernel::Counted<BookChapter> GetChapterFromPath(const String & path);
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetChapterFromPath(const String & path) const;
-    [[nodiscard]] bool ContainsChapter(const String & path) const;
+    [[nodiscard]] Kernel::Counted<BookChapter> GetChapterFromPath(String const & path);
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetChapterFromPath(String const & path) const;
+    [[nodiscard]] bool ContainsChapter(String const & path) const;
     [[nodiscard]] bool ContainsValidChapters() const;
     /// Some chapter is believed to be open for editing, and the application no longer has its document.
     [[nodiscard]] bool ContainsEstrangedChapters() const;
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetChapterWithIndex() const;
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetChapterWithEndnotesMarker() const;
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetChapterWithIndex() const;
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetChapterWithEndnotesMarker() const;
     [[nodiscard]] bool HasEndnotesMarker() const;
 
     /// Adds the file at `path` in front of the chapter at `index`; a negative index or one past the end appends. Opens
     /// the file once to learn what is in it. The first chapter of a book becomes its key chapter. Null if the path is
     /// in the book already: nothing has changed then.
-    Kernel::Counted<BookChapter> AddChapter(const String & path, int index);
+    Kernel::Counted<BookChapter> AddChapter(String const & path, int index);
     /// Takes the chapters out; those that the book does not hold are passed over. If the key chapter goes, the first
     /// one that remains becomes key, and the book has no thumbnail until it is looked at again. Whatever comes to stand
     /// first starts at the page that it had.
-    void RemoveChapters(const ConstChapterList & chapters);
+    void RemoveChapters(ConstChapterList const & chapters);
     /// Puts a new record for `path` in the place of `old` and gives it; null if the book does not hold `old`. Only the
     /// place and the key flag carry over.
-    Kernel::Counted<BookChapter> ReplaceChapter(Kernel::Counted<const BookChapter> old, const String & path);
+    Kernel::Counted<BookChapter> ReplaceChapter(Kernel::Counted<BookChapter const> old, String const & path);
     /// Moves the chapters, in the given order, as a block in front of `before`, or to the end if that is null or among
     /// them. If the first chapter started at page 1, the one that comes first now does. Nothing happens at all if the
     /// book does not hold one of them.
-    void MoveChapters(Kernel::Counted<const BookChapter> before, ConstChapterList chapters);
+    void MoveChapters(Kernel::Counted<BookChapter const> before, ConstChapterList chapters);
     /// The first chapter starts at the page that it last had, whatever came before it.
     void OnFirstChapterChanged();
 
@@ -129,10 +133,10 @@ public:
 
     /// The first valid chapter with the key flag. If there is none, null, or with `fallBack` the first valid chapter.
     [[nodiscard]] Kernel::JailCounted<BookChapter> GetKeyChapter(bool fallBack);
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetKeyChapter(bool fallBack) const;
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetKeyChapter(bool fallBack) const;
     [[nodiscard]] bool HasValidKeyChapter() const;
     /// Moves the key flag. A flagged chapter that is not valid at the time keeps its flag, so that two can carry it.
-    void SetKeyChapter(Kernel::Counted<const BookChapter> chapter);
+    void SetKeyChapter(Kernel::Counted<BookChapter const> chapter);
 
     // Settings --------------------------------------------------------------------------------------------------------
     // Stray handling, synchronise settings and thumbnail reach the book file and yet do not make the book unsaved: they
@@ -143,11 +147,11 @@ public:
     [[nodiscard]] bool IsMergeStrays() const { return m_MergeStrays; }
     void SetMergeStrays(bool merge) { m_MergeStrays = merge; }
     [[nodiscard]] SynchroniseSettings GetSynchroniseSettings() const;
-    void SetSynchroniseSettings(const SynchroniseSettings & settings);
+    void SetSynchroniseSettings(SynchroniseSettings const & settings);
     [[nodiscard]] Kernel::Consolidated<Renderer::FileExportOptions> GetExportOptions() const;
     void SetExportOptions(Kernel::Consolidated<Renderer::FileExportOptions> options);
     /// The bookmark manager that the book file keeps; null until anchors were first looked at.
-    [[nodiscard]] Kernel::Counted<const PDFBookmarkManager> GetPDFBookmarks() const;
+    [[nodiscard]] Kernel::Counted<PDFBookmarkManager const> GetPDFBookmarks() const;
     /// A bitmap of the key chapter's first spread; null if none is known.
     [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap const> GetThumbnail() const;
     void UpdateThumbnail(Kernel::Counted<Raster::DynamicBitmap const> thumbnail);
@@ -157,7 +161,7 @@ public:
 
     /// Empty for a book that has no file.
     [[nodiscard]] String GetPath() const;
-    void SetPath(const String & path);
+    void SetPath(String const & path);
     /// The book's title for the user: the file's name without extension, or "Untitled" with `number` behind it from 2
     /// on; followed by a mark if the book has changes and `markModified` asks for it. Translated.
     [[nodiscard]] String GetName(int number, bool markModified) const;
@@ -168,16 +172,15 @@ public:
     /// Starts the background passes of a book that has just been made.
     void NewBook();
 
+    // Updates that are running. What an update itself provokes must not start another one, so on a thread that delivers
+    // a notification the answer is about the time when that was posted.
+
     [[nodiscard]] bool IsInIndexUpdate() const { return m_InIndexUpdate.IsSet(); }
-    void SetInIndexUpdate(bool inUpdate);
+    void SetInIndexUpdate(bool inUpdate) { m_InIndexUpdate.Set(inUpdate); }
     [[nodiscard]] bool IsInReconcileAnchors() const { return m_InReconcileAnchors.IsSet(); }
-    void SetInReconcileAnchors(bool inUpdate);
+    void SetInReconcileAnchors(bool inUpdate) { m_InReconcileAnchors.Set(inUpdate); }
     [[nodiscard]] bool IsInNumberUpdate() const { return m_InNumberUpdate.IsSet(); }
-    void SetInNumberUpdate(bool inUpdate);
-    // The same for a notification that is only now delivered: did the flag stand when it was posted?
-    [[nodiscard]] bool WasInIndexUpdate(const Kernel::Notification & notification);
-    [[nodiscard]] bool WasInReconcileAnchors(const Kernel::Notification & notification);
-    [[nodiscard]] bool WasInNumberUpdate(const Kernel::Notification & notification);
+    void SetInNumberUpdate(bool inUpdate) { m_InNumberUpdate.Set(inUpdate); }
 
     // Background passes (any thread) ----------------------------------------------------------------------------------
 
@@ -193,19 +196,19 @@ public:
 
     void Save(Kernel::OutStream & stream, Kernel::FileStoreOut & store) const override;
     bool Load(Kernel::InStream & stream, Kernel::FileStore & store) override;
-    [[nodiscard]] const Kernel::FileStoreItemType & GetObjectFileStoreItemType() const override;
-    static const Kernel::FileStoreItemType & GetTypeFileStoreItemType();
+    [[nodiscard]] Kernel::FileStoreItemType const & GetObjectFileStoreItemType() const override;
+    static Kernel::FileStoreItemType const & GetTypeFileStoreItemType();
     static Kernel::Counted<Kernel::FileStoreItem> CreateObject();
-    static Kernel::FileStoreItemType ms_FileStoreItemType;
+    static Kernel::FileStoreItemType const ms_FileStoreItemType;
 
     /// Reads the book at `path` and starts the background passes. On failure false, with the reason in `result`; the
     /// controller is then good for nothing. For a controller that nobody else has seen.
-    bool LoadBook(const String & path, OpenDocumentFailedNotification & result);
+    bool LoadBook(String const & path, OpenDocumentFailedNotification & result);
     /// Writes the book to its own path.
     void SaveBook(DocumentSaveResult & result);
     /// Writes the book to `path`, and the book is at that path from then on. An existing file stays whole if the write
     /// fails. Call it without the book's writer lock, on the book's own turn.
-    void SaveBookAsCopy(DocumentSaveResult & result, const String & path);
+    void SaveBookAsCopy(DocumentSaveResult & result, String const & path);
     /// The book file's preview pictures; null if the book has none.
     [[nodiscard]] Kernel::Counted<Kernel::ArchiveThumbnails> CreateThumbnails() const;
 
@@ -218,29 +221,29 @@ public:
     ///
     /// Loads on the calling thread. May wait for a close of the same chapter and for the user's passwords, never with
     /// the book's writer lock held for the latter.
-    Kernel::Counted<DocumentController> LoadChapterDocument(Kernel::Counted<const BookChapter> chapter, bool reconcile,
+    Kernel::Counted<DocumentController> LoadChapterDocument(Kernel::Counted<BookChapter const> chapter, bool reconcile,
                                                             bool allowRestricted);
     /// Ends one use. The last one saves the document if it has changes, and closes it in the background;
     /// `updateTimeStamp` then notes the file's time as looked at. False if the book holds no document for the chapter.
-    bool ReleaseChapterDocument(Kernel::Counted<const BookChapter> chapter, bool updateTimeStamp) const;
+    bool ReleaseChapterDocument(Kernel::Counted<BookChapter const> chapter, bool updateTimeStamp) const;
     /// The document that the book holds for the chapter, or null. With `preferForeground` the user's own comes first.
     /// Counts no use.
     [[nodiscard]] Kernel::Counted<DocumentController>
-    GetDocumentControllerForChapter(Kernel::Counted<const BookChapter> chapter, bool preferForeground) const;
-    [[nodiscard]] bool IsThisChapterThisDocument(Kernel::Counted<const BookChapter> chapter,
-                                                 Kernel::Counted<const DocumentController> document) const;
+    GetDocumentControllerForChapter(Kernel::Counted<BookChapter const> chapter, bool preferForeground) const;
+    [[nodiscard]] bool IsThisChapterThisDocument(Kernel::Counted<BookChapter const> chapter,
+                                                 Kernel::Counted<DocumentController const> document) const;
     /// The chapter whose document this is: by the documents that the book holds, then by path. Null if none.
     [[nodiscard]] Kernel::Counted<BookChapter>
-    GetChapterFromDocumentController(Kernel::Counted<const DocumentController> document);
-    [[nodiscard]] Kernel::Counted<const BookChapter>
-    GetChapterFromDocumentController(Kernel::Counted<const DocumentController> document) const;
+    GetChapterFromDocumentController(Kernel::Counted<DocumentController const> document);
+    [[nodiscard]] Kernel::Counted<BookChapter const>
+    GetChapterFromDocumentController(Kernel::Counted<DocumentController const> document) const;
     /// The user has the chapter open.
-    [[nodiscard]] bool IsForegroundChapter(Kernel::Counted<const BookChapter> chapter) const;
+    [[nodiscard]] bool IsForegroundChapter(Kernel::Counted<BookChapter const> chapter) const;
     /// Appends for each chapter that the user has open its index in the book and its document's name.
     void GetForegroundChapters(std::vector<std::pair<int, String>> & chapters) const;
     /// The open documents of these paths, in their order; with no path at all those of all chapters.
-    [[nodiscard]] std::vector<Kernel::Counted<const DocumentController>>
-    GetForegroundControllers(const std::vector<String> & paths) const;
+    [[nodiscard]] std::vector<Kernel::Counted<DocumentController const>>
+    GetForegroundControllers(std::vector<String> const & paths) const;
     /// Some chapter is open in the user's hands.
     [[nodiscard]] bool CanCloseOpenChapters() const;
     /// Some chapter in the user's hands has unsaved changes.
@@ -248,7 +251,7 @@ public:
     /// Starts a save of each of these, and does not wait.
     void SaveOpenChapters() const;
     /// The user has opened this document, which is a chapter of the book.
-    void OnDocumentOpen(Kernel::Counted<const DocumentController> document);
+    void OnDocumentOpen(Kernel::Counted<DocumentController const> document);
 
     // Status ----------------------------------------------------------------------------------------------------------
 
@@ -258,25 +261,25 @@ public:
     /// True only if `document` and `updateTimeStamp` were given and the file's time had changed.
     ///
     /// Does not set the status: that is done where its cause is known.
-    bool UpdateChapterStatus(Kernel::Counted<BookChapter> chapter, Kernel::Counted<const DocumentController> document,
+    bool UpdateChapterStatus(Kernel::Counted<BookChapter> chapter, Kernel::Counted<DocumentController const> document,
                              bool updateTimeStamp, bool adoptStartPage);
     /// The same for a chapter of this book; false for another one.
-    bool UpdateChapterStatus(Kernel::Counted<const BookChapter> chapter,
-                             Kernel::Counted<const DocumentController> document, bool updateTimeStamp,
+    bool UpdateChapterStatus(Kernel::Counted<BookChapter const> chapter,
+                             Kernel::Counted<DocumentController const> document, bool updateTimeStamp,
                              bool adoptStartPage);
     /// Updates each chapter that the user has open, from the open document.
     void UpdateForegroundChapterStatus();
     /// The same for readers, under the reader lock.
     void UpdateForegroundChapterStatus() const;
     /// Takes over the document's preflight results, after running the check if `run` says so.
-    void UpdatePreflightStatus(Kernel::Counted<const BookChapter> chapter,
-                               Kernel::Counted<const DocumentController> document, bool run);
+    void UpdatePreflightStatus(Kernel::Counted<BookChapter const> chapter,
+                               Kernel::Counted<DocumentController const> document, bool run);
 
     // Adding with questions -------------------------------------------------------------------------------------------
 
     /// Adds the files in front of `before`, or at the end if that is null or not in the book. Stops to ask the user
     /// about files of an older version, and goes on by itself when the answer comes.
-    void AddChapters(std::deque<String> paths, Kernel::Counted<const BookChapter> before);
+    void AddChapters(std::deque<String> paths, Kernel::Counted<BookChapter const> before);
     /// Takes out again what the add in progress has put in, and forgets the rest.
     void CancelAddChapters();
 
@@ -292,7 +295,7 @@ public:
     /// remembered and tried on all other missing chapters.
     void ResolveMissingChapters(String oldPath, String newPath);
     void RetryFilePermissions(bool ignoreAll);
-    void IgnoreFilePermissions(const Kernel::Counted<BookChapter const> & chapter);
+    void IgnoreFilePermissions(Kernel::Counted<BookChapter const> const & chapter);
     void IgnoreAllFilePermissions();
 
     /// Makes every chapter that the user has open hold still, or lets it go again. Waits for each document in turn.
@@ -304,82 +307,91 @@ public:
     /// brought in step.
     void SetMasterIndex(Kernel::Counted<Story::Index const> index);
     /// Brings the document's topics in step with the master, which also learns topics that it did not know.
-    void ReconcileIndex(Kernel::Counted<const DocumentController> document);
+    void ReconcileIndex(Kernel::Counted<DocumentController const> document);
 
     // Anchors: what a cross-reference needs to know of other chapters (in content) ------------------------------------
 
     /// Brings the chapter's anchors up to date; null `anchors` means that they have to be found first.
-    void UpdateChapterAnchors(Kernel::Counted<BookChapter> chapter, Kernel::Counted<const DocumentController> document,
+    void UpdateChapterAnchors(Kernel::Counted<BookChapter> chapter, Kernel::Counted<DocumentController const> document,
                               Kernel::Counted<Anchors> anchors);
-    void UpdateChapterAnchors(Kernel::Counted<BookChapter> chapter, Kernel::Counted<const DocumentController> document,
+    void UpdateChapterAnchors(Kernel::Counted<BookChapter> chapter, Kernel::Counted<DocumentController const> document,
                               Kernel::Counted<Anchors> anchors, int chapterIndex);
     /// The user has changed anchors of this document.
-    void UpdateAnchors(Kernel::Counted<const BookChapter> chapter, Kernel::Counted<const DocumentController> document);
+    void UpdateAnchors(Kernel::Counted<BookChapter const> chapter, Kernel::Counted<DocumentController const> document);
     void UpdateAnchorsForForegroundChapters();
-    /// What is known of the anchor, or null. Good until this thread asks again, whatever happens to the chapter.
-    [[nodiscard]] const AnchorInfo * GetAnchorInfo(const String & uid) const;
+    /// What is known of the anchor, or null. Good to the end of the calling turn, whatever happens to the chapter; the
+    /// implementation keeps the list for the turn (`Snapshot::KeepForTurn`).
+    [[nodiscard]] AnchorInfo const * GetAnchorInfo(String const & uid) const;
     /// The first chapter with this anchor, or null.
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetChapterContainingAnchor(const String & uid) const;
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetChapterContainingAnchor(String const & uid) const;
     /// Adds the anchors of all chapters but the asking one, as anchors without a place.
-    void AddBlindAnchors(Kernel::Counted<Anchors> anchors, Kernel::Counted<const BookChapter> chapter,
-                         Kernel::Counted<const PDFBookmarkManager> manager) const;
+    void AddBlindAnchors(Kernel::Counted<Anchors> anchors, Kernel::Counted<BookChapter const> chapter,
+                         Kernel::Counted<PDFBookmarkManager const> manager) const;
     /// Gives every anchor of the document an identity, and the document the book's bookmarks.
-    void ReconcileAnchors(Kernel::Counted<BookChapter> chapter, Kernel::Counted<const DocumentController> document);
+    void ReconcileAnchors(Kernel::Counted<BookChapter> chapter, Kernel::Counted<DocumentController const> document);
 
 private:
-    using ChapterDocuments = std::map<Kernel::Counted<const BookChapter>, Kernel::Counted<DocumentController>>;
+    using ChapterDocuments = std::map<Kernel::Counted<BookChapter const>, Kernel::Counted<DocumentController>>;
     /// Paths of chapters as they were learnt to have moved: old prefix, new prefix.
     using PathChanges = std::vector<std::pair<String, String>>;
 
     [[nodiscard]] Snapshot<ChapterList> Chapters() const { return m_Chapters.Get(); }
     /// Publishes the list with `change` done to it. Writers come one at a time, under the writer lock.
     template <typename TChange>
-    void ChangeChapters(const TChange & change);
+    void ChangeChapters(TChange const & change);
     void MarkChanged() { ++m_Changes; }
 
     // The steps of LoadChapterDocument.
-    void WaitForClose(const Kernel::Counted<BookChapter const> & chapter) const;
-    Kernel::Counted<DocumentController> AdoptForegroundDocument(const Kernel::Counted<BookChapter const> & chapter,
+    void WaitForClose(Kernel::Counted<BookChapter const> const & chapter) const;
+    Kernel::Counted<DocumentController> AdoptForegroundDocument(Kernel::Counted<BookChapter const> const & chapter,
                                                                 Kernel::Counted<DocumentController> document,
                                                                 bool reconcile);
-    Kernel::Counted<DocumentController> UseDocumentLoadedElsewhere(const Kernel::Counted<BookChapter const> & chapter,
+    Kernel::Counted<DocumentController> UseDocumentLoadedElsewhere(Kernel::Counted<BookChapter const> const & chapter,
                                                                    Kernel::Counted<DocumentController> document);
-    Kernel::Counted<DocumentController> OpenChapterDocument(const Kernel::Counted<BookChapter const> & chapter,
+    Kernel::Counted<DocumentController> OpenChapterDocument(Kernel::Counted<BookChapter const> const & chapter,
                                                             Kernel::Counted<DocumentController> document,
                                                             bool reconcile);
-    void AskForPasswords(const Kernel::Counted<BookChapter> & chapter,
-                         const Kernel::Counted<DocumentController> & document) const;
-    void StoreChapterDocument(const Kernel::Counted<BookChapter const> & chapter,
+    void AskForPasswords(Kernel::Counted<BookChapter> const & chapter,
+                         Kernel::Counted<DocumentController> const & document) const;
+    void StoreChapterDocument(Kernel::Counted<BookChapter const> const & chapter,
                               Kernel::Counted<DocumentController> document, bool adopted) const;
-    void CloseChapterDocument(const Kernel::Counted<BookChapter const> & chapter,
-                              const Kernel::Counted<DocumentController> & document) const;
+    /// Takes the chapter out of the table; the caller holds its lock.
+    void ForgetChapterDocument(Kernel::Counted<BookChapter const> const & chapter) const;
+    void CloseChapterDocument(Kernel::Counted<BookChapter const> const & chapter,
+                              Kernel::Counted<DocumentController> const & document) const;
 
-    void UpdatePreflightStatus(Kernel::Counted<BookChapter> chapter, Kernel::Counted<const DocumentController> document,
+    /// An earlier chapter of the book has endnotes.
+    [[nodiscard]] bool HasEndnotesBefore(Kernel::Counted<BookChapter const> const & chapter) const;
+    /// Advances `next` over the document's endnotes that run through the book (in content).
+    static void InvestigateEndnotes(Kernel::Counted<DocumentController const> document, int & next);
+    void UpdatePreflightStatus(Kernel::Counted<BookChapter> chapter, Kernel::Counted<DocumentController const> document,
                                bool run);
 
+    /// Runs the queue of files until it is empty, or until there is a question to the user.
     void DoAddChapters();
+    void AskAboutOldVersion(String const & path);
     bool ResolveChapterFilePath(String oldPath, String & newPath, Kernel::Counted<BookChapter> chapter) const;
 
-    void MapIndexGUIDs(Kernel::Counted<const DocumentController> document, Kernel::Counted<Story::Index const> index);
-    void AddMissingTopics(Kernel::Counted<const DocumentController> document,
+    void MapIndexGUIDs(Kernel::Counted<DocumentController const> document, Kernel::Counted<Story::Index const> index);
+    void AddMissingTopics(Kernel::Counted<DocumentController const> document,
                           Kernel::Counted<Story::Index const> index);
-    void SynchronizeIndexStructure(Kernel::Counted<const DocumentController> document,
+    void SynchronizeIndexStructure(Kernel::Counted<DocumentController const> document,
                                    Kernel::Counted<Story::Index const> index);
     /// True if the master learnt a topic.
-    bool AdoptOrphanTopics(Kernel::Counted<const DocumentController> document,
+    bool AdoptOrphanTopics(Kernel::Counted<DocumentController const> document,
                            Kernel::Counted<Story::Index const> index);
     /// Opens the chapter and fetches its anchors if they are known to be stale. A query's only way to open a document.
-    void EnsureChapterAnchors(Kernel::Counted<const BookChapter> chapter) const;
+    void EnsureChapterAnchors(Kernel::Counted<BookChapter const> chapter) const;
 
     /// Chapters with a document in the book's hands, and those of them that the user had open first. Changed under the
     /// lock, which is never held across a wait; read without it.
     mutable Published<Snapshot<ChapterDocuments>> m_ChapterDocuments;
-    mutable std::map<Kernel::Counted<const BookChapter>, bool> m_AdoptedChapters;
+    mutable std::map<Kernel::Counted<BookChapter const>, bool> m_AdoptedChapters;
     Kernel::CriticalSection m_ChapterDocumentsLock;
 
     Published<Snapshot<ChapterList>> m_Chapters;
     ChapterList m_MissingChapters;
-    Kernel::Counted<const BookChapter> m_ForbiddenChapter;
+    Kernel::Counted<BookChapter const> m_ForbiddenChapter;
     Published<String> m_Path;
     /// The path being written while a save runs, for the objects in the file that refer to other files.
     Published<String> m_SavePath;
@@ -387,10 +399,10 @@ private:
     /// The book needs saving while these differ. Counts, so that a save settles only the changes that it has written.
     std::atomic<unsigned long long> m_Changes{0};
     std::atomic<unsigned long long> m_SavedChanges{0};
-    mutable Published<Kernel::Counted<const PDFBookmarkManager>> m_PDFBookmarks;
-    InUpdateFlag m_InIndexUpdate;
-    InUpdateFlag m_InReconcileAnchors;
-    InUpdateFlag m_InNumberUpdate;
+    mutable Published<Kernel::Counted<PDFBookmarkManager const>> m_PDFBookmarks;
+    Kernel::PostingFlag m_InIndexUpdate;
+    Kernel::PostingFlag m_InReconcileAnchors;
+    Kernel::PostingFlag m_InNumberUpdate;
     std::atomic<bool> m_PadStrays{false};
     std::atomic<bool> m_MergeStrays{true};
     Published<Kernel::Counted<Raster::DynamicBitmap const>> m_Thumbnail;

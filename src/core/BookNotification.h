@@ -16,7 +16,7 @@ namespace Book
 class BookNotification : public Kernel::Notification
 {
 public:
-    [[nodiscard]] Kernel::Counted<const BookController> GetBookController() const { return m_BookController; }
+    [[nodiscard]] Kernel::Counted<BookController const> GetBookController() const { return m_BookController; }
 
     // None of the family waits for previews, is quick to show, or passes while the book lock holds documents still.
     [[nodiscard]] bool RequiredForPreviewing() const override { return false; }
@@ -27,7 +27,7 @@ protected:
     explicit BookNotification(const Kernel::Counted<BookController const> & book) : m_BookController(book) {}
 
 private:
-    Kernel::Counted<const BookController> m_BookController;
+    Kernel::Counted<BookController const> m_BookController;
 };
 
 /// A book has opened.
@@ -67,16 +67,16 @@ class BookStructureChangedNotification final : public BookNotification
 {
 public:
     BookStructureChangedNotification(const Kernel::Counted<BookController const> & book,
-                                     Kernel::Counted<const BookChapter> chapter)
+                                     Kernel::Counted<BookChapter const> chapter)
         : BookNotification(book),
           m_Chapter(std::move(chapter))
     {
     }
     /// The first chapter whose position changed; may be null.
-    [[nodiscard]] Kernel::Counted<const BookChapter> GetChapter() const { return m_Chapter; }
+    [[nodiscard]] Kernel::Counted<BookChapter const> GetChapter() const { return m_Chapter; }
 
 private:
-    Kernel::Counted<const BookChapter> m_Chapter;
+    Kernel::Counted<BookChapter const> m_Chapter;
 };
 
 /// Facts of these chapters have changed.
@@ -84,21 +84,21 @@ class ChapterChangedNotification final : public BookNotification
 {
 public:
     ChapterChangedNotification(const Kernel::Counted<BookController const> & book,
-                               std::vector<Kernel::Counted<const BookChapter>> chapters)
+                               std::vector<Kernel::Counted<BookChapter const>> chapters)
         : BookNotification(book),
           m_Chapters(std::move(chapters))
     {
     }
     ChapterChangedNotification(const Kernel::Counted<BookController const> & book,
-                               Kernel::Counted<const BookChapter> chapter)
+                               Kernel::Counted<BookChapter const> chapter)
         : BookNotification(book),
           m_Chapters{std::move(chapter)}
     {
     }
-    [[nodiscard]] const std::vector<Kernel::Counted<BookChapter const>> & GetChapters() const { return m_Chapters; }
+    [[nodiscard]] std::vector<Kernel::Counted<const BookChapter>> const & GetChapters() const { return m_Chapters; }
 
 private:
-    std::vector<Kernel::Counted<const BookChapter>> m_Chapters;
+    std::vector<Kernel::Counted<BookChapter const>> m_Chapters;
 };
 
 /// These open documents have gone into a book or out of it; what in them depends on that is to be looked at again.
@@ -106,15 +106,15 @@ class BookChapterInclusionChangedNotification final : public BookNotification
 {
 public:
     BookChapterInclusionChangedNotification(const Kernel::Counted<BookController const> & book,
-                                            std::vector<Kernel::Counted<const DocumentController>> documents);
+                                            std::vector<Kernel::Counted<DocumentController const>> documents);
     ~BookChapterInclusionChangedNotification() override;
-    [[nodiscard]] const std::vector<Kernel::Counted<DocumentController const>> & GetDocuments() const
+    [[nodiscard]] std::vector<Kernel::Counted<const DocumentController>> const & GetDocuments() const
     {
         return m_Documents;
     }
 
 private:
-    std::vector<Kernel::Counted<const DocumentController>> m_Documents;
+    std::vector<Kernel::Counted<DocumentController const>> m_Documents;
 };
 
 }

@@ -10,7 +10,7 @@ namespace Book
 class BookSavedNotification final : public BookNotification
 {
 public:
-    BookSavedNotification(Kernel::Counted<const BookController> book, const DocumentSaveResult & result,
+    BookSavedNotification(Kernel::Counted<BookController const> book, const DocumentSaveResult & result,
                           bool closeOnSuccess)
         : BookNotification(book),
           m_Result(result),

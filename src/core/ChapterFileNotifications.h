@@ -2,6 +2,7 @@
 
 #include "core/BookNotification.h"
 #include "framework/document/DocumentPromptNotification.h"
+#include "framework/kernel/Question.h"
 
 namespace Book
 {
@@ -10,7 +11,7 @@ namespace Book
 class ChooseChapterFileNotification : public BookNotification
 {
 public:
-    ChooseChapterFileNotification(String title, String currentPath, Kernel::Counted<const BookController> book);
+    ChooseChapterFileNotification(String title, String currentPath, Kernel::Counted<BookController const> book);
 
     [[nodiscard]] String GetTitle() const { return m_Title; }
     [[nodiscard]] String GetCurrentPath() const { return m_CurrentPath; }
@@ -23,50 +24,63 @@ private:
 };
 
 /// Asks where the file of a missing chapter has gone. The answer goes to `BookController::ResolveMissingChapters`, as a
-/// turn of the book's queue.
+/// turn of the book's queue; the first one counts.
 class LocateMissingChapterFileNotification final : public ChooseChapterFileNotification
 {
 public:
     LocateMissingChapterFileNotification(String path, Kernel::Counted<BookController> book);
     void ProcessResponse(String path) const override;
 
+protected:
+    void OnPassedEveryLine() override { m_Question.MarkAsked(); }
+
+private:
+    Kernel::Counted<BookController> m_MutableBook;
+    Kernel::Question m_Question;
+};
+
+/// Asks whether the user wants to look for the missing chapters.
+class PromptMissingChapterFileNotification : public DocumentPromptNotification
+{
+public:
+    explicit PromptMissingChapterFileNotification(Kernel::Counted<BookController> book);
+
+    /// What is taken where nobody can be asked: no.
+    [[nodiscard]] virtual DocumentPromptChoice GetDefaultChoice() const;
+    /// What the user's choice does; called by the base with the answer, as a turn of the book's queue.
+    virtual void ProcessChoice(DocumentPromptChoice choice) const;
+
 private:
     Kernel::Counted<BookController> m_MutableBook;
 };
 
-/// Asks whether the user wants to look for the missing chapters.
-class PromptMissingChapterFileNotification final : public DocumentPromptNotification
-{
-public:
-    explicit PromptMissingChapterFileNotification(Kernel::Counted<const BookController> book);
-
-    /// No.
-    [[nodiscard]] DocumentPromptChoice GetDefaultChoice() const override;
-    void ProcessChoice(DocumentPromptChoice choice) override;
-};
-
-/// Asks the user to let the program at a chapter's file. The front end ends in `Ignore`, `IgnoreAll` or `Retry`.
+/// Asks the user to let the program at a chapter's file. The front end ends in `Ignore`, `IgnoreAll` or `Retry`, of
+/// which the first counts; it runs as a turn of the book's queue.
 class PromptFixBookPermissionsNotification final : public BookNotification
 {
 public:
     PromptFixBookPermissionsNotification(Kernel::Counted<BookController> book,
-                                         Kernel::Counted<const BookChapter> chapter);
+                                         Kernel::Counted<BookChapter const> chapter);
 
     [[nodiscard]] String GetPath() const { return m_Chapter->GetPath(); }
     [[nodiscard]] String GetChapterPath() const { return m_Chapter->GetPath(); }
     /// Gives up on this chapter, and tries the others again.
-    void Ignore();
+    void Ignore() const;
     /// Stops asking for permission.
-    void IgnoreAll();
+    void IgnoreAll() const;
     /// Tries again.
-    void Retry(bool ignoreAll);
+    void Retry(bool ignoreAll) const;
     [[nodiscard]] Kernel::LocalisedString GetTitle() const;
     /// With "%@" where the front end puts the path.
     [[nodiscard]] Kernel::LocalisedString GetMessage() const;
 
+protected:
+    void OnPassedEveryLine() override { m_Question.MarkAsked(); }
+
 private:
     Kernel::Counted<BookController> m_MutableBook;
-    Kernel::Counted<const BookChapter> m_Chapter;
+    Kernel::Counted<BookChapter const> m_Chapter;
+    Kernel::Question m_Question;
 };
 
 }

@@ -1,9 +1,10 @@
 #pragma once
 
+#include "framework/kernel/Counted.h"
 #include "framework/kernel/CriticalSection.h"
+#include "framework/kernel/TurnSession.h"
 
 #include <cstddef>
-#include <memory>
 #include <utility>
 
 namespace Book
@@ -49,27 +50,43 @@ template <typename T>
 class Snapshot
 {
 public:
-    Snapshot() : m_Value(EmptyValue()) {}
-    explicit Snapshot(T value) : m_Value(std::make_shared<const T>(std::move(value))) {}
+    Snapshot() : m_Held(Empty()) {}
+    explicit Snapshot(T value) : m_Held(Kernel::MakeCounted<Held>(std::move(value))) {}
 
-    [[nodiscard]] T const & operator*() const noexcept { return *m_Value; }
-    [[nodiscard]] T const * operator->() const noexcept { return m_Value.get(); }
+    [[nodiscard]] T const & operator*() const noexcept { return m_Held->m_Value; }
+    [[nodiscard]] T const * operator->() const noexcept { return &m_Held->m_Value; }
+
+    /// For who gives out a pointer into the snapshot: it stays to the end of the calling thread's turn. On a thread
+    /// without a turn or session, only as long as somebody holds the snapshot.
+    void KeepForTurn() const
+    {
+        if (Kernel::TurnSession::IsOpen()) {
+            Kernel::TurnSession::Keep(m_Held);
+        }
+    }
 
     // What lists offer, so that a snapshot of one reads like the list.
-    [[nodiscard]] auto begin() const { return m_Value->begin(); }
-    [[nodiscard]] auto end() const { return m_Value->end(); }
-    [[nodiscard]] std::size_t size() const { return m_Value->size(); }
-    [[nodiscard]] bool empty() const { return m_Value->empty(); }
-    [[nodiscard]] decltype(auto) operator[](std::size_t index) const { return (*m_Value)[index]; }
+    [[nodiscard]] auto begin() const { return m_Held->m_Value.begin(); }
+    [[nodiscard]] auto end() const { return m_Held->m_Value.end(); }
+    [[nodiscard]] std::size_t size() const { return m_Held->m_Value.size(); }
+    [[nodiscard]] bool empty() const { return m_Held->m_Value.empty(); }
+    [[nodiscard]] decltype(auto) operator[](std::size_t index) const { return m_Held->m_Value[index]; }
 
 private:
-    static const std::shared_ptr<T const> & EmptyValue()
+    struct Held final : public virtual Kernel::Countable
     {
-        static const std::shared_ptr<T const> empty = std::make_shared<const T>();
+        Held() = default;
+        explicit Held(T value) : m_Value(std::move(value)) {}
+        T const m_Value{};
+    };
+
+    static const Kernel::Counted<Held const> & Empty()
+    {
+        static const Kernel::Counted<Held const> empty = Kernel::MakeCounted<Held>();
         return empty;
     }
 
-    std::shared_ptr<const T> m_Value;
+    Kernel::Counted<const Held> m_Held;
 };
 
 }

@@ -34,7 +34,7 @@ int PagesAt(const Spreads & spreads, int index)
                                                                   : PagesOf(spreads[static_cast<std::size_t>(index)]);
 }
 
-Kernel::Rect At(const std::vector<Kernel::Rect> & rects, int page)
+Kernel::Rect At(std::vector<Kernel::Rect> const & rects, int page)
 {
     return page < 0 || page >= static_cast<int>(rects.size()) ? Kernel::Rect{} : rects[static_cast<std::size_t>(page)];
 }

@@ -13,7 +13,7 @@ class UpdateChaptersTask final : public BackgroundTask
 {
 public:
     /// The first three arguments are those of `BackgroundTask`.
-    UpdateChaptersTask(int interval, bool canIgnoreIfQueueOccupied, bool second, bool foregroundOnly);
+    UpdateChaptersTask(int interval, bool whileQueueOccupied, bool gathersChanges, bool foregroundOnly);
 
     /// A new `UpdateChaptersCommand`. Built in the folder of the commands.
     Kernel::Counted<DomainCommand> GenerateCommand() override;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "framework/kernel/Archive.h"
 #include "framework/kernel/Counted.h"
 #include "framework/kernel/DomainCommand.h"
 #include "framework/kernel/Notification.h"
@@ -13,6 +14,7 @@
 class BackgroundTask;
 class BackgroundTaskPump;
 class DomainQueue;
+class OpenDocumentFailedNotification;
 
 namespace Kernel
 {
@@ -134,6 +136,10 @@ public:
     void UpdateProgress(Kernel::Counted<DomainCommand const> command, float fraction);
 
 protected:
+    /// Fills a failure from the result of `Kernel::Archive::Open`: its code, and a sentence for the user.
+    static void SetNotifyResultFromError(OpenDocumentFailedNotification & notification,
+                                         enum Kernel::Archive::OpenResult & result);
+
     /// A command has been done and wants to be undoable; under the writer lock. A domain with a history takes it and
     /// returns true, and then owns its `Teardown`.
     virtual bool StackForUndo(Kernel::Counted<DomainCommand> const & command);
