@@ -117,6 +117,10 @@ private:
 
     VantraController();
 
+    /// The user's command has to wait, and is told so.
+    [[nodiscard]] bool Refuses(DocumentController const & document, DomainCommand const & command, bool byUser);
+    void IntroduceFront(Kernel::Counted<DocumentController> const & document);
+
     std::unique_ptr<DocumentRegistry> const m_Registry;
     Kernel::Counted<ApplicationQueue> const m_Queue;
     std::atomic<int> m_LoadingItems{0};

@@ -105,6 +105,7 @@ bool DomainQueue::Wait(Entry entry)
     lock.unlock();
     dropped.clear();
     thread->Sleep(waiter.m_Signal);
+    thread->AwaitLentLocks();
     return true;
 }
 

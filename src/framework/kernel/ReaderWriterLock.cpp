@@ -59,6 +59,7 @@ bool ReaderWriterLock::AcquireReaderSlowly(std::shared_ptr<ThreadNode> const & t
         });
         std::lock_guard const lock(m_Lock);
         if (!m_Levels.empty() && blocked) {
+            step.EnterLoan(*m_Levels.back().m_Thread, *this);
             if (Reader * const reader = FindReader(*thread, true)) {
                 ++reader->m_Depth;
                 return false;
@@ -76,6 +77,7 @@ bool ReaderWriterLock::AcquireReaderSlowly(std::shared_ptr<ThreadNode> const & t
     }
     thread->Sleep(waiter.m_Signal);
     WaitGraph::EndWait(*thread);
+    thread->AwaitLentLocks();
     return true;
 }
 
@@ -94,7 +96,9 @@ bool ReaderWriterLock::ReleaseReader()
     }
     bool const plain = !reader->m_UnderWriter;
     m_Readers.erase(m_Readers.begin() + (reader - m_Readers.data()));
-    if (plain && --m_PlainReaders == 0) {
+    if (!plain) {
+        WakeOwners();
+    } else if (--m_PlainReaders == 0) {
         LetNextIn(false);
     }
     return plain;
@@ -136,6 +140,7 @@ void ReaderWriterLock::AcquireWriterSlowly(std::shared_ptr<ThreadNode> const & t
         if (blocked) {
             KORVANE_ASSERT_MESSAGE(!m_Levels.empty(),
                                    "a thread that holds a lock for reading waits for one that asks for it for writing");
+            step.EnterLoan(*m_Levels.back().m_Thread, *this);
             m_Levels.push_back({thread, 1});
             return;
         }
@@ -155,6 +160,43 @@ void ReaderWriterLock::AcquireWriterSlowly(std::shared_ptr<ThreadNode> const & t
     }
     thread->Sleep(waiter.m_Signal);
     WaitGraph::EndWait(*thread);
+    thread->AwaitLentLocks();
+}
+
+bool ReaderWriterLock::IsReturnedTo(ThreadNode const & thread) const
+{
+    return IsWriter(thread) && std::none_of(m_Readers.begin(), m_Readers.end(), [&](Reader const & reader) {
+               return reader.m_UnderWriter && reader.m_Thread.get() != &thread;
+           });
+}
+
+void ReaderWriterLock::WakeOwners()
+{
+    std::erase_if(m_WaitingOwners, [this](Waiter * waiter) {
+        std::shared_ptr<ThreadNode> const thread = waiter->m_Thread;
+        bool const returned = IsReturnedTo(*thread);
+        if (returned) {
+            thread->Give(waiter->m_Signal);
+        }
+        return returned;
+    });
+}
+
+void ReaderWriterLock::AwaitReturn()
+{
+    std::shared_ptr<ThreadNode> const & thread = ThreadNode::Current();
+    Waiter waiter{thread, {}};
+    {
+        WaitGraph::Step step;
+        std::lock_guard const lock(m_Lock);
+        if (IsReturnedTo(*thread)) {
+            return;
+        }
+        m_WaitingOwners.push_back(&waiter);
+        step.EnterLockWait(*thread, *this);
+    }
+    thread->Sleep(waiter.m_Signal);
+    WaitGraph::EndWait(*thread);
 }
 
 void ReaderWriterLock::ReleaseWriter()
@@ -168,6 +210,8 @@ void ReaderWriterLock::ReleaseWriter()
     m_Levels.pop_back();
     if (m_Levels.empty()) {
         LetNextIn(true);
+    } else {
+        WakeOwners();
     }
 }
 
@@ -250,6 +294,12 @@ void ReaderWriterLock::AddHolders(ThreadNode const & waiting, std::vector<Thread
     if (!m_Levels.empty()) {
         if (m_Levels.back().m_Thread.get() != &waiting) {
             holders.push_back(m_Levels.back().m_Thread.get());
+            return;
+        }
+        for (Reader const & reader : m_Readers) {
+            if (reader.m_UnderWriter && reader.m_Thread.get() != &waiting) {
+                holders.push_back(reader.m_Thread.get());
+            }
         }
         return;
     }

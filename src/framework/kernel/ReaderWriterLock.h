@@ -56,6 +56,10 @@ public:
     [[nodiscard]] bool IsWriterWaiting() const;
     [[nodiscard]] bool IsReaderWaiting() const;
 
+    /// Of a thread that holds it for writing, after a sleep in which others may have borrowed it: sleeps until they have
+    /// given it back.
+    void AwaitReturn();
+
     /// For the wait graph: adds the threads that keep a waiting thread out.
     void AddHolders(ThreadNode const & waiting, std::vector<ThreadNode const *> & holders) const;
 
@@ -79,6 +83,9 @@ private:
     {
         return !m_Levels.empty() && m_Levels.back().m_Thread.get() == &thread;
     }
+    /// The thread is the writer, and nobody else has borrowed the lock from it.
+    [[nodiscard]] bool IsReturnedTo(ThreadNode const & thread) const;
+    void WakeOwners();
     /// The thread's entry of one kind, or null.
     [[nodiscard]] Reader * FindReader(ThreadNode const & thread, bool underWriter);
     void AddReader(std::shared_ptr<ThreadNode> const & thread, bool underWriter);
@@ -98,6 +105,8 @@ private:
     /// In the order of coming; they live on their threads' stacks.
     std::vector<Waiter *> m_WaitingReaders;
     std::vector<Waiter *> m_WaitingWriters;
+    /// Those who have lent the lock and wait for it.
+    std::vector<Waiter *> m_WaitingOwners;
 };
 
 }

@@ -63,6 +63,21 @@ void ThreadNode::Give(Signal & signal)
     m_Given.notify_one();
 }
 
+void ThreadNode::AwaitLentLocks()
+{
+    for (std::vector<ReaderWriterLock *> lent; !(lent = WaitGraph::TakeLent(*this)).empty();) {
+        for (ReaderWriterLock * const lock : lent) {
+            lock->AwaitReturn();
+        }
+    }
+}
+
+std::vector<ReaderWriterLock *> WaitGraph::TakeLent(ThreadNode & thread)
+{
+    std::lock_guard const lock(GraphLock());
+    return std::exchange(thread.m_Lent, {});
+}
+
 bool WaitGraph::WaitForWorker(ThreadNode & thread, std::atomic<ThreadNode *> const & worker)
 {
     Step const step;
@@ -85,6 +100,11 @@ WaitGraph::Step::Step() : m_Held(GraphLock()) {}
 void WaitGraph::Step::EnterLockWait(ThreadNode & thread, ReaderWriterLock const & lock)
 {
     thread.m_AwaitedLock = &lock;
+}
+
+void WaitGraph::Step::EnterLoan(ThreadNode & lender, ReaderWriterLock & lock)
+{
+    lender.m_Lent.push_back(&lock);
 }
 
 bool WaitGraph::Step::IsBlockedOn(ThreadNode const * thread, ThreadNode const & other) const

@@ -4,6 +4,7 @@
 #include <condition_variable>
 #include <memory>
 #include <mutex>
+#include <vector>
 
 namespace Kernel
 {
@@ -31,6 +32,10 @@ public:
     /// Gives the signal. The sleeper may destroy the signal as soon as it has it; this node must be kept by the caller.
     void Give(Signal & signal);
 
+    /// Own thread, after a wait: sleeps until every lock is back that others have borrowed from it meanwhile. The thread
+    /// that lent may have been woken by another way than the one by which the borrower made sure of it.
+    void AwaitLentLocks();
+
 private:
     friend class WaitGraph;
 
@@ -39,6 +44,8 @@ private:
     /// What it waits for; guarded by the wait graph. At most one of them.
     std::atomic<ThreadNode *> const * m_AwaitedWorker = nullptr;
     ReaderWriterLock const * m_AwaitedLock = nullptr;
+    /// Locks that were borrowed from it while it slept; guarded by the wait graph.
+    std::vector<ReaderWriterLock *> m_Lent;
 };
 
 /// Who waits for whom: the edges between threads that wait for a queue's worker or for a lock's holder.
@@ -51,6 +58,8 @@ public:
     /// Enters that the thread waits for the worker of a queue, unless that worker is blocked on the thread: then nothing
     /// is entered, and the result is false.
     [[nodiscard]] static bool WaitForWorker(ThreadNode & thread, std::atomic<ThreadNode *> const & worker);
+    /// The locks lent since it was last asked.
+    [[nodiscard]] static std::vector<ReaderWriterLock *> TakeLent(ThreadNode & thread);
     /// The wait is over. Called before the thread is woken, so that nobody takes it for blocked when it is not.
     static void EndWait(ThreadNode & thread);
 
@@ -62,6 +71,7 @@ public:
         /// The thread, or one that it waits for however indirectly, is `other`.
         [[nodiscard]] bool IsBlockedOn(ThreadNode const * thread, ThreadNode const & other) const;
         void EnterLockWait(ThreadNode & thread, ReaderWriterLock const & lock);
+        void EnterLoan(ThreadNode & lender, ReaderWriterLock & lock);
 
     private:
         std::unique_lock<std::mutex> m_Held;
