@@ -279,6 +279,39 @@ String DocumentController::GetTimeText()
     return ToIsoTime(Kernel::Clock::Get().Now());
 }
 
+namespace
+{
+
+/// A file without its pictures would be a loss that nobody sees: better no file.
+bool ReportLostPictures(DocumentFile::Content const & content, String const & target, DocumentSaveResult & result)
+{
+    if (content.m_LostPictures.empty()) {
+        return false;
+    }
+    result.SetResult(DocumentSaveResult::SourceDamaged,
+                     Kernel::Format(Kernel::LocalisedString("The picture \"%1\" in \"%2\" can't be read any more, so the "
+                                                            "document was not written.",
+                                                            "Save document"),
+                                    content.m_LostPictures.front(), target));
+    return true;
+}
+
+}
+
+void DocumentController::SaveCopy(DocumentSaveResult & result, String const & path)
+{
+    result.SetSuccess(false);
+    DocumentFile file(*this);
+    DocumentFile::Content content;
+    content.m_Document = file.WriteDocument();
+    file.WriteItems(content);
+    if (!ReportLostPictures(content, path, result) &&
+        DocumentFile::WriteArchive(content, path, nullptr, Kernel::FileLock::Kind::Shared, result)) {
+        result.SetResult(DocumentSaveResult::Success);
+        result.SetSuccess(true);
+    }
+}
+
 void DocumentController::SaveDocument(DocumentSaveResult & result, String const & path)
 {
     String const ownPath = GetPath();
@@ -311,12 +344,7 @@ void DocumentController::SaveDocument(DocumentSaveResult & result, String const 
     SetMetadata(std::move(metadata));
     content.m_Document = file.WriteDocument();
     file.WriteItems(content);
-    if (!content.m_LostPictures.empty()) {
-        result.SetResult(DocumentSaveResult::SourceDamaged,
-                         Kernel::Format(Kernel::LocalisedString("The picture \"%1\" in \"%2\" can't be read any more, so the "
-                                                                "document was not written.",
-                                                                "Save document"),
-                                        content.m_LostPictures.front(), target));
+    if (ReportLostPictures(content, target, result)) {
         return;
     }
 

@@ -85,6 +85,8 @@ public:
     /// the document is still dirty.
     void SaveDocument(DocumentSaveResult & result, String const & path);
 
+    /// Writes the document to a path that does not become its own; the document stays as dirty as it was.
+    void SaveCopy(DocumentSaveResult & result, String const & path);
     /// This moment, as metadata have it.
     [[nodiscard]] static String GetTimeText();
 

@@ -1,0 +1,135 @@
+#include "framework/commands/IndexTopicCommands.h"
+
+#include "framework/commands/CommandException.h"
+
+namespace
+{
+
+CommandRegistration const s_Add(typeid(AddIndexTopicCommand), "AddIndexTopicCommand");
+CommandRegistration const s_Guid(typeid(Commands::SetIndexTopicGUIDCommand), "Commands::SetIndexTopicGUIDCommand");
+CommandRegistration const s_Rename(typeid(Commands::RenameIndexTopicCommand), "Commands::RenameIndexTopicCommand");
+CommandRegistration const s_Sort(typeid(Commands::SetIndexTopicSortCommand), "Commands::SetIndexTopicSortCommand");
+CommandRegistration const s_Parent(typeid(Commands::ReparentIndexTopicCommand), "Commands::ReparentIndexTopicCommand");
+CommandRegistration const s_AddReference(typeid(Commands::AddIndexCrossReferenceCommand),
+                                         "Commands::AddIndexCrossReferenceCommand");
+CommandRegistration const s_DeleteReference(typeid(Commands::DeleteIndexCrossReferenceCommand),
+                                            "Commands::DeleteIndexCrossReferenceCommand");
+CommandRegistration const s_Delete(typeid(Commands::DeleteIndexTopicCommand), "Commands::DeleteIndexTopicCommand");
+
+}
+
+void IndexTopicCommand::Do()
+{
+    Story::Index & index = *Tree().GetIndex();
+    std::shared_ptr<Story::Index::Content const> before = index.GetContent();
+    Change(index);
+    m_Before = std::move(before);
+}
+
+void IndexTopicCommand::Undo()
+{
+    Tree().GetIndex()->SetContent(m_Before);
+}
+
+void IndexTopicCommand::Notify(std::vector<Kernel::Counted<Kernel::Notification>> & notifications)
+{
+    notifications.push_back(Kernel::MakeCounted<IndexTopicsChangedNotification>(Self()));
+}
+
+Kernel::JailCounted<Story::IndexTopic> IndexTopicCommand::Require(Story::Index const & index,
+                                                                  Kernel::Counted<Story::IndexTopic const> const & topic)
+{
+    Kernel::JailCounted<Story::IndexTopic> found = topic ? index.GetMutableTopic(topic) : nullptr;
+    if (!found) {
+        throw CommandException(Kernel::LocalisedString("The topic is not in the document's index any more.", "Index").ToString());
+    }
+    return found;
+}
+
+Kernel::LocalisedString AddIndexTopicCommand::GetDescription() const
+{
+    return {"Add index topics", "Document Command"};
+}
+
+void AddIndexTopicCommand::Change(Story::Index & index)
+{
+    for (Kernel::Counted<Story::IndexTopic> const & topic : m_Topics) {
+        index.AddTopic(topic);
+    }
+}
+
+namespace Commands
+{
+
+Kernel::LocalisedString SetIndexTopicGUIDCommand::GetDescription() const
+{
+    return {"Identify index topic", "Document Command"};
+}
+
+void SetIndexTopicGUIDCommand::Change(Story::Index & index)
+{
+    Require(index, m_Topic)->SetGUID(m_Text);
+}
+
+Kernel::LocalisedString RenameIndexTopicCommand::GetDescription() const
+{
+    return {"Rename index topic", "Document Command"};
+}
+
+void RenameIndexTopicCommand::Change(Story::Index & index)
+{
+    Require(index, m_Topic)->SetName(m_Text);
+}
+
+Kernel::LocalisedString SetIndexTopicSortCommand::GetDescription() const
+{
+    return {"Sort index topic", "Document Command"};
+}
+
+void SetIndexTopicSortCommand::Change(Story::Index & index)
+{
+    Require(index, m_Topic)->SetSortString(m_Text);
+}
+
+Kernel::LocalisedString ReparentIndexTopicCommand::GetDescription() const
+{
+    return {"Move index topic", "Document Command"};
+}
+
+void ReparentIndexTopicCommand::Change(Story::Index & index)
+{
+    Kernel::JailCounted<Story::IndexTopic> const topic = Require(index, m_Topic);
+    topic->SetParent(m_Other ? Kernel::Counted<Story::IndexTopic const>(Require(index, m_Other)) : nullptr);
+}
+
+Kernel::LocalisedString AddIndexCrossReferenceCommand::GetDescription() const
+{
+    return {"Add index cross-reference", "Document Command"};
+}
+
+void AddIndexCrossReferenceCommand::Change(Story::Index & index)
+{
+    Require(index, m_Topic)->AddCrossReference(Require(index, m_Other));
+}
+
+Kernel::LocalisedString DeleteIndexCrossReferenceCommand::GetDescription() const
+{
+    return {"Delete index cross-reference", "Document Command"};
+}
+
+void DeleteIndexCrossReferenceCommand::Change(Story::Index & index)
+{
+    Require(index, m_Topic)->RemoveCrossReference(m_Other);
+}
+
+Kernel::LocalisedString DeleteIndexTopicCommand::GetDescription() const
+{
+    return {"Delete index topics", "Document Command"};
+}
+
+void DeleteIndexTopicCommand::Change(Story::Index & index)
+{
+    index.RemoveTopics(m_Topics);
+}
+
+}
