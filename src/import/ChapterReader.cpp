@@ -51,7 +51,6 @@ ChapterReader::ChapterReader(std::string_view text, ReadOptions const & options,
         m_Chapter.m_FrontMatter.m_Language = options.m_Language;
     }
     m_Smart = SmartTypography(m_Chapter.m_FrontMatter.m_Language);
-    m_Target = &m_Chapter.m_Blocks;
     m_Builders.emplace_back();
 }
 
@@ -69,7 +68,6 @@ ChapterText ChapterReader::Read()
     }
     cmark_iter_free(iterator);
 
-    m_Target = &m_Chapter.m_Blocks;
     if (!m_PendingAnchors.empty()) {
         if (m_Chapter.m_Blocks.empty()) {
             Emit(BlockKind::Paragraph, 1);
@@ -157,7 +155,7 @@ void ChapterReader::VisitItem(cmark_node * node, bool isEnter)
 
 Block & ChapterReader::Emit(BlockKind kind, int line)
 {
-    Block & block = m_Target->emplace_back();
+    Block & block = Target().emplace_back();
     block.m_Kind = kind;
     block.m_Line = line + m_LineOffset;
     block.m_ListDepth = static_cast<std::uint8_t>(std::min<std::size_t>(m_Lists.size(), 255));
@@ -238,7 +236,7 @@ void ChapterReader::VisitHeading(cmark_node * node, bool isEnter)
         AddAnchorAt(0, attributes.m_Id, line);
     }
     EmitText(BlockKind::Heading, cmark_node_get_heading_level(node), line);
-    m_Target->back().m_Classes = attributes.m_Classes;
+    Target().back().m_Classes = attributes.m_Classes;
 }
 
 void ChapterReader::VisitParagraph(cmark_node * node, bool isEnter)
@@ -331,7 +329,9 @@ void ChapterReader::ReadCodeBlock(cmark_node * node)
     block.m_Text = builder.Finish();
     // Trimming must not touch a code block's first indentation.
     block.m_Text.m_Text = std::move(text);
-    block.m_Text.m_Spans = {{0, static_cast<std::uint32_t>(block.m_Text.m_Text.size()), Mark::Code, -1}};
+    if (!block.m_Text.m_Text.empty()) {
+        block.m_Text.m_Spans = {{0, static_cast<std::uint32_t>(block.m_Text.m_Text.size()), Mark::Code, -1}};
+    }
     block.m_CodeLanguage = info ? ListTextOf(info) : std::string();
     PlacePendingAnchors(block);
 }
@@ -380,9 +380,7 @@ void ChapterReader::VisitNoteDefinition(cmark_node * node, bool isEnter)
 {
     // The parser moves used definitions to the end, in the order of their first marks.
     if (!isEnter) {
-        if (0 == --m_NoteDepth) {
-            m_Target = &m_Chapter.m_Blocks;
-        }
+        m_OpenNotes.pop_back();
         return;
     }
     int const line = cmark_node_get_start_line(node);
@@ -394,8 +392,7 @@ void ChapterReader::VisitNoteDefinition(cmark_node * node, bool isEnter)
     Note & note = m_Chapter.m_Notes[index];
     note.m_Line = line + m_LineOffset;
     note.m_Label = NoteLabel(WithoutLines(m_Source, line - 1));
-    m_Target = &note.m_Blocks;
-    ++m_NoteDepth;
+    m_OpenNotes.push_back(index);
 }
 
 void ChapterReader::RememberLines(cmark_node * node)

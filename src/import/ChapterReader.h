@@ -106,6 +106,11 @@ private:
     [[nodiscard]] Place PlaceAt(int line) const { return {m_Options.m_ShownName, line + m_LineOffset, 0}; }
     void Warn(std::string_view kind, int line, std::string text);
     InlineBuilder & Builder() { return m_Builders.back(); }
+    /// The blocks of the chapter, or of the note that is being read.
+    std::vector<Block> & Target()
+    {
+        return m_OpenNotes.empty() ? m_Chapter.m_Blocks : m_Chapter.m_Notes[m_OpenNotes.back()].m_Blocks;
+    }
 
     std::string_view m_Source;
     ReadOptions m_Options;
@@ -115,7 +120,6 @@ private:
     SlugCounter m_Slugs;
     std::set<std::string> m_ExplicitIds;
 
-    std::vector<Block> * m_Target = nullptr;
     std::vector<OpenList> m_Lists;
     int m_QuoteDepth = 0;
     ListMark m_PendingMark = ListMark::None;
@@ -127,7 +131,8 @@ private:
     std::unique_ptr<Table> m_Table;
     int m_TableLine = 0;
     int m_NotesSeen = 0;
-    int m_NoteDepth = 0;
+    /// Indices of the notes that are being read, one within the other.
+    std::vector<std::size_t> m_OpenNotes;
 
     /// The paragraph's builder below, one for each open picture's alternative text above.
     std::vector<InlineBuilder> m_Builders;

@@ -36,6 +36,7 @@ TEST(MarkdownReaderTest, BlocksAndTheirNesting)
         {"line break", "one  \ntwo\\\nthree", "p one/two/three\n"},
         {"rule", "a\n\n***\n\nb", "p a\nrule\np b\n"},
         {"code keeps spaces and blank lines", "```rust,ignore\n  a\n\n\tb\n```", "code:rust {code   a//    b}\n"},
+        {"code without a line", "```\n```\n", "code\n"},
         {"indented code", "    x\n", "code {code x}\n"},
         {"nested lists and quotations", "1. a\n   - b\n\n     c\n2. d\n\n> q\n> > r\n",
          "  1. p a\n    - p b\n    p c\n  2. p d\n>p q\n>>p r\n"},

@@ -1,0 +1,123 @@
+#include "import/PictureLoader.h"
+
+#include "framework/document/DocumentPictures.h"
+#include "framework/kernel/FileSystem.h"
+#include "framework/raster/Picture.h"
+#include "import/SourceText.h"
+
+#include <algorithm>
+#include <cstring>
+#include <fstream>
+
+namespace Import
+{
+
+namespace
+{
+
+/// Resolution of a picture that does not tell its own.
+constexpr double g_DefaultDpi = 96;
+
+std::string LoweredExtension(std::filesystem::path const & path)
+{
+    std::string extension = path.extension().string();
+    std::transform(extension.begin(), extension.end(), extension.begin(),
+                   [](unsigned char c) { return static_cast<char>(c < 0x80 ? std::tolower(c) : c); });
+    return extension;
+}
+
+/// Whether the file ends as its format wants it; a file cut short shows by this without being decoded.
+bool HasEnd(std::vector<unsigned char> const & bytes, Raster::PictureKind kind)
+{
+    std::string_view const tail(reinterpret_cast<char const *>(bytes.data()) + (bytes.size() - std::min<std::size_t>(bytes.size(), 512)),
+                                std::min<std::size_t>(bytes.size(), 512));
+    return std::string_view::npos != (Raster::PictureKind::Png == kind ? tail.rfind("IEND") : tail.rfind("\xFF\xD9"));
+}
+
+}
+
+PictureLoader::PictureLoader(std::filesystem::path const & chapter, std::string shownName, DocumentPictures & pictures,
+                             std::map<std::string, KnownFile> & known, MessageList & messages) :
+    m_Folder(chapter.parent_path()), m_ShownName(std::move(shownName)), m_Pictures(pictures), m_Known(known), m_Messages(messages)
+{
+}
+
+PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture const & picture)
+{
+    std::string const extension = LoweredExtension(picture.m_Path);
+    bool const isRemote = std::string::npos != picture.m_Path.find("://");
+    if (isRemote) {
+        return {"", 0, 0, "is on the web; save it beside the chapter", "picture-remote"};
+    }
+    KnownFile & known = m_Known[path];
+    known.m_Stamp = FileStamp::Of(path);
+    if (!known.m_Stamp.Exists()) {
+        return {"", 0, 0, "is missing", "picture-missing"};
+    }
+    std::ifstream stream(path, std::ios::binary);
+    auto const bytes = std::make_shared<std::vector<unsigned char>>(static_cast<std::size_t>(known.m_Stamp.m_Size));
+    stream.read(reinterpret_cast<char *>(bytes->data()), known.m_Stamp.m_Size);
+    if (!stream || stream.gcount() != known.m_Stamp.m_Size) {
+        return {"", 0, 0, "cannot be read", "picture-unreadable"};
+    }
+    known.m_Hash = HashBytes({reinterpret_cast<char const *>(bytes->data()), bytes->size()});
+    if (".svg" == extension || ".pdf" == extension) {
+        return {"", 0, 0, "is a drawing in " + extension.substr(1) + ", which cannot be placed yet", "later-picture"};
+    }
+
+    Raster::PictureProblem problem;
+    auto const opened = Raster::Picture::FromBytes(bytes, String(picture.m_Path), problem);
+    if (!opened) {
+        bool const isOtherKind = Raster::PictureProblem::Code::UnknownKind == problem.m_Code;
+        return {"", 0, 0, isOtherKind ? "is neither PNG nor JPEG, whatever its name says" : "cannot be used (" + problem.m_Text.ToStd() + ")",
+                isOtherKind ? "picture-kind" : "picture-damaged"};
+    }
+    Raster::PictureInfo const & info = opened->GetInfo();
+    if (!HasEnd(*bytes, info.m_Kind) && !opened->Decode(problem)) {
+        return {"", 0, 0, "is cut short or damaged", "picture-damaged"};
+    }
+    std::string const promised = ".jpeg" == extension ? ".jpg" : extension;
+    std::string const actual = Raster::PictureKind::Png == info.m_Kind ? ".png" : ".jpg";
+    if (promised != actual) {
+        m_Messages.Warn("picture-kind", {m_ShownName, picture.m_Line},
+                        "The picture " + picture.m_Path + " is a " + (".png" == actual ? "PNG" : "JPEG") + " under another name; it is set all the same.");
+    }
+
+    DocumentPictures::Entry entry;
+    entry.m_SourcePath = String(path);
+    Kernel::FileSystem::GetModifiedTime(entry.m_SourcePath, entry.m_SourceTime);
+    entry.m_Size = bytes->size();
+    Loaded loaded;
+    loaded.m_DataId = m_Pictures.Add(bytes, entry).ToStd();
+    auto const points = [](int pixels, double dpi) { return pixels * 72.0 / (1 < dpi ? dpi : g_DefaultDpi); };
+    loaded.m_Width = points(info.UprightWidth(), info.UprightDpiX());
+    loaded.m_Height = points(info.UprightHeight(), info.UprightDpiY());
+    return loaded;
+}
+
+Story::PictureGlyph::Fields PictureLoader::Load(Picture const & picture)
+{
+    std::string const path = (m_Folder / picture.m_Path).lexically_normal().string();
+    auto known = m_Loaded.find(path);
+    if (known == m_Loaded.end()) {
+        known = m_Loaded.emplace(path, Read(path, picture)).first;
+    }
+    Loaded const & loaded = known->second;
+    Story::PictureGlyph::Fields fields;
+    fields.m_Path = String(picture.m_Path);
+    fields.m_AltText = String(picture.m_Alternative);
+    fields.m_DataId = String(loaded.m_DataId);
+    fields.m_NaturalWidth = loaded.m_Width;
+    fields.m_NaturalHeight = loaded.m_Height;
+    fields.m_WantedWidth = picture.m_Width;
+    fields.m_WantedMeasurePart = picture.m_WidthShare;
+    if (!loaded.m_Problem.empty()) {
+        std::string const sentence = "The picture " + picture.m_Path + " " + loaded.m_Problem;
+        fields.m_IsMissing = true;
+        fields.m_MissingReason = String(sentence + ".");
+        m_Messages.Warn(loaded.m_Kind, {m_ShownName, picture.m_Line}, sentence + "; a marked box stands in its place.");
+    }
+    return fields;
+}
+
+}

@@ -1,0 +1,48 @@
+#pragma once
+
+#include "framework/story/PictureGlyph.h"
+#include "import/ChapterText.h"
+#include "import/Message.h"
+#include "import/WorkState.h"
+
+#include <filesystem>
+#include <map>
+
+class DocumentPictures;
+
+namespace Import
+{
+
+/// Takes the pictures of one chapter into its document. A picture that can't be set becomes a marked box with the reason
+/// in it, and a message. Used by one thread.
+class PictureLoader
+{
+public:
+    /// `chapter` is the chapter's file, `shownName` what messages call it. Borrows all but those two.
+    PictureLoader(std::filesystem::path const & chapter, std::string shownName, DocumentPictures & pictures,
+                  std::map<std::string, KnownFile> & known, MessageList & messages);
+
+    [[nodiscard]] Story::PictureGlyph::Fields Load(Picture const & picture);
+
+private:
+    /// What a file gave; kept so that a picture that stands in many places is read once.
+    struct Loaded
+    {
+        std::string m_DataId;
+        double m_Width = 0;
+        double m_Height = 0;
+        std::string m_Problem;
+        std::string m_Kind;
+    };
+
+    [[nodiscard]] Loaded Read(std::string const & path, Picture const & picture);
+
+    std::filesystem::path m_Folder;
+    std::string m_ShownName;
+    DocumentPictures & m_Pictures;
+    std::map<std::string, KnownFile> & m_Known;
+    MessageList & m_Messages;
+    std::map<std::string, Loaded> m_Loaded;
+};
+
+}
