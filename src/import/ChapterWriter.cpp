@@ -2,7 +2,6 @@
 
 #include "framework/document/DocumentController.h"
 #include "framework/document/DocumentNode.h"
-#include "framework/document/LoadDocumentOptions.h"
 #include "framework/document/DocumentSaveResult.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/story/Index.h"
