@@ -74,6 +74,7 @@ private:
 /// An anchor of a story, in the order of `Layout::GetAnchors`.
 struct CollectedAnchor
 {
+    Kernel::Counted<AnchorGlyph const> m_Glyph;
     Kernel::Counted<AnchorData> m_Data;
     /// Offset in the main story: of the anchor, or of the element that holds it.
     std::uint32_t m_StoryOffset = 0;

@@ -32,7 +32,7 @@ struct Glyph
     float m_Advance = 0;
 };
 
-/// Displacement of a glyph from its pen position, for runs that have such: y up, as fonts count.
+/// Displacement of a glyph from its pen position, to the right and downwards, for runs that have such.
 struct Offset
 {
     float m_X = 0;

@@ -51,6 +51,7 @@ public:
     static constexpr char const * NoteTextStyle = "Note text";
     static constexpr char const * NoteReferenceStyle = "Note reference";
     static constexpr char const * NoteNumberStyle = "Note number";
+    static constexpr char const * TableTextStyle = "Table text";
     static constexpr char const * MissingPictureStyle = "Missing picture";
 
     /// Attributes of text without any style, which all styles start from.
