@@ -5,6 +5,9 @@
 #include "framework/kernel/InSerialiserContext.h"
 #include "framework/kernel/TaggedStreamFormat.h"
 
+#include <algorithm>
+#include <utility>
+
 namespace Kernel
 {
 
@@ -13,6 +16,14 @@ using namespace TaggedStream;
 String InSerialiser::Context::PlaceOf(std::uint8_t const * at) const
 {
     return Format("byte %1", at - m_Buffer->GetData());
+}
+
+void InSerialiser::Context::CheckDepth(int levels, std::uint8_t const * at) const
+{
+    if (MaximumDepth <= levels) {
+        throw ArchiveCorruptionException(m_SourceName, PlaceOf(at),
+                                         "values refer to each other in too long a chain");
+    }
 }
 
 bool InSerialiser::Find(IDTag tag, PropType type, std::span<std::uint8_t const> & payload) const
@@ -162,15 +173,15 @@ Counted<Serialisable> InSerialiser::MakeObject(std::span<std::uint8_t const> pay
     if (properties->GetVersion() < version) {
         throw FutureVersionException(m_Context->m_SourceName, uid, version, properties->GetVersion());
     }
-    if (MaximumDepth * 4 <= m_Context->m_Depth) {
-        throw ArchiveCorruptionException(m_Context->m_SourceName, m_Context->PlaceOf(payload.data()),
-                                         "shared values refer to each other in too long a chain");
-    }
+    int const outerHeight = std::exchange(m_Context->m_Height, 0);
+    m_Context->CheckDepth(m_Context->m_Depth, payload.data());
     Counted<Serialisable> object = properties->GetCreator()();
     InSerialiser const fields(*m_Context, payload.subspan(ObjectHeaderSize));
     ++m_Context->m_Depth;
     bool const usable = object && object->Load(fields, m_Context->m_Store, version);
     --m_Context->m_Depth;
+    m_Context->CheckDepth(m_Context->m_Height, payload.data());
+    m_Context->m_Height = std::max(outerHeight, m_Context->m_Height + 1);
     return usable ? object : nullptr;
 }
 
@@ -224,10 +235,14 @@ bool InSerialiser::LoadSharedObjectI(IDTag tag, Consolidated<SharedSerialisable>
                                              "a shared value that holds itself");
         }
         shared.m_Loading = true;
+        int const outerHeight = std::exchange(m_Context->m_Height, 0);
         Counted<Serialisable> const made = MakeObject(shared.m_Payload);
         shared.m_Object = Consolidated<SharedSerialisable>(CountedCast<SharedSerialisable const>(made));
         shared.m_Loading = false;
+        shared.m_Height = m_Context->m_Height;
+        m_Context->m_Height = outerHeight;
     }
+    m_Context->m_Height = std::max(m_Context->m_Height, shared.m_Height);
     object = shared.m_Object;
     return true;
 }
