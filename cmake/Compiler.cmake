@@ -28,3 +28,6 @@ elseif(KORVANE_SANITIZE STREQUAL "thread")
     add_compile_options(-fsanitize=thread -fno-omit-frame-pointer)
     add_link_options(-fsanitize=thread)
 endif()
+
+# libqpdf's headers ask for this: shared pointers are the standard ones, and its own old ones are not used.
+add_compile_definitions(POINTERHOLDER_TRANSITION=4)

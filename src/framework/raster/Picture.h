@@ -85,7 +85,7 @@ class Picture : public virtual Kernel::Countable
 public:
     /// Greatest width and height, and greatest count of pixels, that are accepted.
     static constexpr int MaximumSide = 65500;
-    static constexpr std::int64_t MaximumPixels = 400'000'000;
+    static constexpr std::int64_t MaximumPixels = 200'000'000;
 
     using Bytes = std::shared_ptr<std::vector<unsigned char> const>;
 

@@ -42,7 +42,7 @@ public:
         bool m_Bookmarks = true;
         bool m_PageLabels = true;
         /// Outline entries down to this level are shown open; 0 shows none open.
-        int m_OpenBookmarkLevels = 1;
+        int m_OpenBookmarkLevels = 0;
         PrintersMarksOptions m_PrintersMarks;
         /// Pictures with more pixels to the inch than this are reduced to it; 0 for no limit. JPEG files that are within
         /// the limit are taken over untouched.

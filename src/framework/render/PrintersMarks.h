@@ -14,14 +14,12 @@ struct PrintersMarksOptions
 {
     bool m_CropMarks = false;
     bool m_RegistrationMarks = false;
-    /// File name and page label below the page.
-    bool m_PageInformation = false;
     /// From the trimmed page to the marks; at least the bleed.
     double m_Offset = 8.5;
     double m_Length = 14;
     double m_LineWidth = 0.25;
 
-    [[nodiscard]] bool HasAny() const { return m_CropMarks || m_RegistrationMarks || m_PageInformation; }
+    [[nodiscard]] bool HasAny() const { return m_CropMarks || m_RegistrationMarks; }
     friend bool operator==(PrintersMarksOptions const &, PrintersMarksOptions const &) = default;
 };
 
@@ -34,7 +32,7 @@ public:
     PrintersMarksHelper(Kernel::Rect const & rect, Kernel::Counted<Kernel::UnitValueConverter const> converter);
 
     void SetOptions(PrintersMarksOptions const & options) { m_Options = options; }
-    /// The output's file name, for the page information.
+    /// The output's file name.
     void SetFilename(String const & filename) { m_Filename = filename; }
     void SetIsIncludeBleed(bool includeBleed) { m_IncludeBleed = includeBleed; }
 
