@@ -22,7 +22,10 @@ endif()
 
 if(KORVANE_SANITIZE STREQUAL "address")
     add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
-    add_compile_definitions(_GLIBCXX_SANITIZE_VECTOR)
+    # libFuzzer brings instances of std::vector without these marks, and the linker takes either.
+    if(NOT KORVANE_FUZZ)
+        add_compile_definitions(_GLIBCXX_SANITIZE_VECTOR)
+    endif()
     add_link_options(-fsanitize=address,undefined)
 elseif(KORVANE_SANITIZE STREQUAL "thread")
     add_compile_options(-fsanitize=thread -fno-omit-frame-pointer)
