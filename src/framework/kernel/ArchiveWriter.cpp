@@ -55,7 +55,7 @@ struct ArchiveEntrySource
             return 0;
         case ZIP_SOURCE_READ: {
             std::size_t const size = std::min<std::size_t>(length, entry.m_Bytes->GetSize() - entry.m_Read);
-            std::memcpy(data, entry.m_Bytes->GetData() + entry.m_Read, size);
+            std::copy_n(entry.m_Bytes->GetData() + entry.m_Read, size, static_cast<std::uint8_t *>(data));
             entry.m_Read += size;
             return static_cast<zip_int64_t>(size);
         }
