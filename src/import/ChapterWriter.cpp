@@ -129,12 +129,17 @@ bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
     return SaveDocument(*document, path, planned.m_Name, job.m_Messages);
 }
 
+std::uint64_t Importer::FactsOfTitlePage() const
+{
+    std::string const facts = m_Plan.m_Title + '\0' + m_Plan.m_Subtitle + '\0' + m_Plan.AuthorsAsText() + '\0' + m_Plan.m_Language;
+    return HashBytes(facts, m_Look.m_Hash);
+}
+
 bool Importer::WriteTitleDocument(std::vector<ImportedChapter> & chapters, MessageList & messages)
 {
     fs::path const path = m_Work / "title-page.kvdoc";
     KnownChapter & known = m_State.m_Chapters[""];
-    std::string const facts = m_Plan.m_Title + '\0' + m_Plan.m_Subtitle + '\0' + m_Plan.AuthorsAsText() + '\0' + m_Plan.m_Language;
-    std::uint64_t const hash = HashBytes(facts, m_Look.m_Hash);
+    std::uint64_t const hash = FactsOfTitlePage();
     bool const isCurrent = known.m_Facts == hash && FileStamp::Of(path).Exists();
     if (!isCurrent) {
         auto const document = OpenOrMake(path, "title page", messages);

@@ -198,6 +198,44 @@ void Importer::CheckLinks(std::vector<Job> & jobs, MessageList & messages) const
     }
 }
 
+std::vector<Importer::Job> Importer::MakeJobs() const
+{
+    std::vector<Job> jobs(m_Plan.m_Chapters.size());
+    for (std::size_t at = 0; at < jobs.size(); ++at) {
+        jobs[at].m_Planned = &m_Plan.m_Chapters[at];
+        if (auto const known = m_State.m_Chapters.find(jobs[at].m_Planned->m_Name); known != m_State.m_Chapters.end()) {
+            jobs[at].m_Known = known->second;
+        }
+    }
+    return jobs;
+}
+
+bool Importer::IsEverythingCurrent(MessageList & messages)
+{
+    auto const isTouched = [this](KnownChapter const & known) {
+        return known.m_Document.empty() || !known.m_DocumentStamp.Exists() || known.m_DocumentStamp != FileStamp::Of(m_Work / known.m_Document);
+    };
+    if (m_Plan.m_HasTitlePage) {
+        auto const title = m_State.m_Chapters.find("");
+        if (title == m_State.m_Chapters.end() || title->second.m_Facts != FactsOfTitlePage() || isTouched(title->second)) {
+            return false;
+        }
+    }
+    std::vector<Job> jobs = MakeJobs();
+    for (Job & job : jobs) {
+        if (isTouched(job.m_Known) || !IsCurrent(job, FactsOf(*job.m_Planned))) {
+            return false;
+        }
+    }
+    for (Job const & job : jobs) {
+        for (Message const & message : job.m_Known.m_Messages) {
+            messages.Add(message.m_Severity, message.m_Kind, message.m_Place, message.m_Text);
+        }
+    }
+    CheckLinks(jobs, messages);
+    return true;
+}
+
 bool Importer::Run(std::vector<ImportedChapter> & chapters, MessageList & messages, Progress const & progress)
 {
     std::error_code error;
@@ -207,13 +245,7 @@ bool Importer::Run(std::vector<ImportedChapter> & chapters, MessageList & messag
         return false;
     }
 
-    std::vector<Job> jobs(m_Plan.m_Chapters.size());
-    for (std::size_t at = 0; at < jobs.size(); ++at) {
-        jobs[at].m_Planned = &m_Plan.m_Chapters[at];
-        if (auto const known = m_State.m_Chapters.find(jobs[at].m_Planned->m_Name); known != m_State.m_Chapters.end()) {
-            jobs[at].m_Known = known->second;
-        }
-    }
+    std::vector<Job> jobs = MakeJobs();
     NameDocuments(jobs);
     if (m_Plan.m_HasTitlePage && !WriteTitleDocument(chapters, messages)) {
         return false;
@@ -239,7 +271,7 @@ bool Importer::Run(std::vector<ImportedChapter> & chapters, MessageList & messag
         work();
     }
 
-    bool isWhole = !IsAborted();
+    bool const isWhole = !IsAborted();
     for (Job & job : jobs) {
         for (Message const & message : job.m_Messages.All()) {
             messages.Add(message.m_Severity, message.m_Kind, message.m_Place, message.m_Text);

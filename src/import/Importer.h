@@ -42,6 +42,10 @@ public:
     /// none is half-written.
     bool Run(std::vector<ImportedChapter> & chapters, MessageList & messages, Progress const & progress);
 
+    /// Whether nothing at all has changed since a build ended: no source, no fact, and no document by another hand. If so,
+    /// the messages of the unchanged chapters are appended. Writes nothing.
+    bool IsEverythingCurrent(MessageList & messages);
+
     /// The memory of the folder, for the one who builds: it is saved by `Run` and again when the build has ended.
     [[nodiscard]] WorkState & State() { return m_State; }
 
@@ -56,10 +60,12 @@ private:
         bool m_IsUsable = false;
     };
 
+    [[nodiscard]] std::vector<Job> MakeJobs() const;
     void RunJob(Job & job) const;
     bool IsCurrent(Job & job, std::uint64_t facts) const;
     void Import(Job & job, std::uint64_t facts) const;
     bool WriteDocument(Job & job, ChapterText const & chapter) const;
+    [[nodiscard]] std::uint64_t FactsOfTitlePage() const;
     bool WriteTitleDocument(std::vector<ImportedChapter> & chapters, MessageList & messages);
     void CheckLinks(std::vector<Job> & jobs, MessageList & messages) const;
     void NameDocuments(std::vector<Job> & jobs) const;
