@@ -1,0 +1,352 @@
+#include "framework/render/RasterSink.h"
+
+#include "framework/kernel/Assert.h"
+#include "framework/raster/ColourTransform.h"
+#include "framework/raster/PngEncoder.h"
+
+#include <cairo.h>
+#include <cstring>
+#include <memory>
+
+namespace Renderer::RenderTree
+{
+
+namespace
+{
+
+struct CairoDeleter
+{
+    void operator()(cairo_t * context) const { cairo_destroy(context); }
+    void operator()(cairo_surface_t * surface) const { cairo_surface_destroy(surface); }
+    void operator()(cairo_pattern_t * pattern) const { cairo_pattern_destroy(pattern); }
+};
+using ContextPtr = std::unique_ptr<cairo_t, CairoDeleter>;
+using SurfacePtr = std::unique_ptr<cairo_surface_t, CairoDeleter>;
+using PatternPtr = std::unique_ptr<cairo_pattern_t, CairoDeleter>;
+
+cairo_matrix_t MatrixOf(Raster::AffineTransform::Params const & map)
+{
+    return {map.a, map.b, map.c, map.d, map.e, map.f};
+}
+
+/// cairo's pixels: 32 bits in the machine's order, alpha highest, colours multiplied by it.
+std::uint32_t Premultiplied(std::uint8_t const * rgba)
+{
+    std::uint32_t const alpha = rgba[3];
+    auto const times = [alpha](std::uint32_t value) { return (value * alpha + 127) / 255; };
+    return alpha << 24 | times(rgba[0]) << 16 | times(rgba[1]) << 8 | times(rgba[2]);
+}
+
+/// Sends a glyph's outline to cairo.
+class OutlineToCairo : public Typeset::OutlineSink
+{
+public:
+    OutlineToCairo(cairo_t * context, double scale, double slant) : m_Context(context), m_Scale(scale), m_Slant(slant) {}
+
+    void SetOrigin(double x, double y)
+    {
+        m_OriginX = x;
+        m_OriginY = y;
+    }
+    void MoveTo(double x, double y) override
+    {
+        cairo_move_to(m_Context, X(x, y), Y(y));
+        Keep(x, y);
+    }
+    void LineTo(double x, double y) override
+    {
+        cairo_line_to(m_Context, X(x, y), Y(y));
+        Keep(x, y);
+    }
+    void QuadTo(double controlX, double controlY, double x, double y) override
+    {
+        CubicTo(m_LastX + (controlX - m_LastX) * 2 / 3, m_LastY + (controlY - m_LastY) * 2 / 3,
+                x + (controlX - x) * 2 / 3, y + (controlY - y) * 2 / 3, x, y);
+    }
+    void CubicTo(double x1, double y1, double x2, double y2, double x, double y) override
+    {
+        cairo_curve_to(m_Context, X(x1, y1), Y(y1), X(x2, y2), Y(y2), X(x, y), Y(y));
+        Keep(x, y);
+    }
+    void Close() override { cairo_close_path(m_Context); }
+
+private:
+    [[nodiscard]] double X(double x, double y) const { return m_OriginX + (x + m_Slant * y) * m_Scale; }
+    [[nodiscard]] double Y(double y) const { return m_OriginY - y * m_Scale; }
+    void Keep(double x, double y)
+    {
+        m_LastX = x;
+        m_LastY = y;
+    }
+
+    cairo_t * m_Context;
+    double m_Scale;
+    double m_Slant;
+    double m_OriginX = 0;
+    double m_OriginY = 0;
+    double m_LastX = 0;
+    double m_LastY = 0;
+};
+
+/// One drawing of one list.
+class Painter
+{
+public:
+    Painter(cairo_t * context, Schema const & schema, std::vector<Warning> * warnings)
+        : m_Context(context), m_Schema(schema), m_Warnings(warnings)
+    {
+    }
+
+    void Draw(DisplayList const & list)
+    {
+        for (DisplayList::Operation const operation : list.GetOperations()) {
+            switch (operation.m_Kind) {
+            case DisplayList::Kind::Fill: {
+                DisplayList::FilledPath const & fill = list.GetFill(operation.m_Index);
+                SetColour(fill.m_Colour);
+                AddPath(fill.m_Path);
+                SetRule(fill.m_Rule);
+                cairo_fill(m_Context);
+                break;
+            }
+            case DisplayList::Kind::Stroke: {
+                DisplayList::StrokedPath const & stroke = list.GetStroke(operation.m_Index);
+                SetColour(stroke.m_Colour);
+                SetStroke(stroke.m_Stroke);
+                AddPath(stroke.m_Path);
+                cairo_stroke(m_Context);
+                break;
+            }
+            case DisplayList::Kind::Glyphs:
+                Glyphs(list, list.GetRun(operation.m_Index));
+                break;
+            case DisplayList::Kind::Picture:
+                Picture(list.GetPicture(operation.m_Index));
+                break;
+            case DisplayList::Kind::BeginGroup:
+                BeginGroup(list.GetGroup(operation.m_Index));
+                break;
+            case DisplayList::Kind::EndGroup:
+                EndGroup();
+                break;
+            case DisplayList::Kind::BeginMark:
+            case DisplayList::Kind::EndMark:
+                break;
+            }
+        }
+    }
+
+private:
+    void SetColour(Raster::Colour const & colour)
+    {
+        Raster::Colour const rgb = Raster::ConvertColour(colour, Raster::ColourSpace::Rgb, m_Schema.GetProfiles());
+        cairo_set_source_rgba(m_Context, static_cast<double>(rgb.m_Components[0]),
+                              static_cast<double>(rgb.m_Components[1]), static_cast<double>(rgb.m_Components[2]),
+                              static_cast<double>(rgb.m_Alpha));
+    }
+
+    void SetRule(FillRule rule)
+    {
+        cairo_set_fill_rule(m_Context,
+                            rule == FillRule::EvenOdd ? CAIRO_FILL_RULE_EVEN_ODD : CAIRO_FILL_RULE_WINDING);
+    }
+
+    void SetStroke(Stroke const & stroke)
+    {
+        cairo_set_line_width(m_Context, stroke.m_Width);
+        static constexpr cairo_line_cap_t caps[] = {CAIRO_LINE_CAP_BUTT, CAIRO_LINE_CAP_ROUND, CAIRO_LINE_CAP_SQUARE};
+        static constexpr cairo_line_join_t joins[] = {CAIRO_LINE_JOIN_MITER, CAIRO_LINE_JOIN_ROUND,
+                                                      CAIRO_LINE_JOIN_BEVEL};
+        cairo_set_line_cap(m_Context, caps[static_cast<int>(stroke.m_Cap)]);
+        cairo_set_line_join(m_Context, joins[static_cast<int>(stroke.m_Join)]);
+        cairo_set_miter_limit(m_Context, stroke.m_MiterLimit);
+        cairo_set_dash(m_Context, stroke.m_Dashes.data(), static_cast<int>(stroke.m_Dashes.size()), stroke.m_DashPhase);
+    }
+
+    void AddPath(Path const & path)
+    {
+        Kernel::Point const * p = path.GetPoints().data();
+        for (Path::Verb const verb : path.GetVerbs()) {
+            switch (verb) {
+            case Path::Verb::Move:
+                cairo_move_to(m_Context, p->x, p->y);
+                ++p;
+                break;
+            case Path::Verb::Line:
+                cairo_line_to(m_Context, p->x, p->y);
+                ++p;
+                break;
+            case Path::Verb::Curve:
+                cairo_curve_to(m_Context, p[0].x, p[0].y, p[1].x, p[1].y, p[2].x, p[2].y);
+                p += 3;
+                break;
+            case Path::Verb::Close:
+                cairo_close_path(m_Context);
+                break;
+            }
+        }
+    }
+
+    void BeginGroup(Group const & group)
+    {
+        cairo_save(m_Context);
+        if (group.m_Clip) {
+            AddPath(*group.m_Clip);
+            SetRule(group.m_ClipRule);
+            cairo_clip(m_Context);
+        }
+        cairo_matrix_t const matrix = MatrixOf(group.m_Transform);
+        cairo_transform(m_Context, &matrix);
+        m_Opacities.push_back(group.m_Opacity);
+        if (group.m_Opacity < 1) {
+            cairo_push_group(m_Context);
+        }
+    }
+
+    void EndGroup()
+    {
+        double const opacity = m_Opacities.back();
+        m_Opacities.pop_back();
+        if (opacity < 1) {
+            cairo_pop_group_to_source(m_Context);
+            cairo_paint_with_alpha(m_Context, std::max(0.0, opacity));
+        }
+        cairo_restore(m_Context);
+    }
+
+    void Glyphs(DisplayList const & list, GlyphRun const & run)
+    {
+        SetColour(run.m_Colour);
+        SetRule(FillRule::NonZero);
+        OutlineToCairo outline(m_Context, run.m_Size / run.m_Face->GetUnitsPerEm(), run.m_Slant);
+        double pen = run.m_Origin.x;
+        for (Typeset::PlacedGlyph const & glyph : list.GlyphsOf(run)) {
+            outline.SetOrigin(pen + static_cast<double>(glyph.m_OffsetX),
+                              run.m_Origin.y + static_cast<double>(glyph.m_OffsetY));
+            run.m_Face->DrawGlyph(glyph.m_Glyph, outline);
+            pen += static_cast<double>(glyph.m_Advance);
+        }
+        cairo_fill(m_Context);
+    }
+
+    Kernel::Counted<Raster::DynamicBitmap> PixelsOf(PlacedPicture const & placed)
+    {
+        Kernel::Counted<Raster::DynamicBitmap const> bitmap = placed.m_Bitmap;
+        Kernel::Consolidated<Raster::ICCProfile> profile = placed.m_BitmapProfile;
+        if (placed.m_Picture) {
+            Raster::PictureProblem problem;
+            bitmap = placed.m_Picture->Decode(problem);
+            profile = placed.m_Picture->ReadProfile();
+            if (!bitmap) {
+                if (m_Warnings) {
+                    m_Warnings->push_back(
+                        {Warning::Code::PictureMissing, 0, placed.m_Picture->GetPath(), problem.m_Text});
+                }
+                return nullptr;
+            }
+        }
+        Raster::ICCManager::ICCProfileSet const & set = m_Schema.GetProfiles();
+        if (!profile) {
+            profile = set.ForSpace(Raster::SpaceOfFormat(bitmap->GetFormat()));
+        }
+        return Raster::ConvertToRgba8(*bitmap, profile, set.ForSpace(Raster::ColourSpace::Rgb), set.m_Intent,
+                                      set.m_BlackPointCompensation);
+    }
+
+    void Picture(PlacedPicture const & placed)
+    {
+        Kernel::Counted<Raster::DynamicBitmap> const pixels = PixelsOf(placed);
+        cairo_save(m_Context);
+        cairo_matrix_t const placement = MatrixOf(placed.m_Placement);
+        cairo_transform(m_Context, &placement);
+        cairo_rectangle(m_Context, 0, 0, 1, 1);
+        if (!pixels || pixels->GetPixels().empty()) {
+            cairo_set_source_rgb(m_Context, 0.92, 0.92, 0.92);
+            cairo_fill(m_Context);
+            cairo_restore(m_Context);
+            return;
+        }
+        int const width = pixels->GetWidth();
+        int const height = pixels->GetHeight();
+        SurfacePtr const surface(cairo_image_surface_create(CAIRO_FORMAT_ARGB32, width, height));
+        if (cairo_surface_status(surface.get()) == CAIRO_STATUS_SUCCESS) {
+            unsigned char * const data = cairo_image_surface_get_data(surface.get());
+            std::size_t const stride = static_cast<std::size_t>(cairo_image_surface_get_stride(surface.get()));
+            for (int y = 0; y < height; ++y) {
+                for (int x = 0; x < width; ++x) {
+                    std::uint32_t const value = Premultiplied(pixels->GetRow(y) + static_cast<std::size_t>(x) * 4);
+                    std::memcpy(data + static_cast<std::size_t>(y) * stride + static_cast<std::size_t>(x) * 4, &value, 4);
+                }
+            }
+            cairo_surface_mark_dirty(surface.get());
+            PatternPtr const pattern(cairo_pattern_create_for_surface(surface.get()));
+            cairo_matrix_t toPixels;
+            cairo_matrix_init_scale(&toPixels, width, height);
+            cairo_pattern_set_matrix(pattern.get(), &toPixels);
+            cairo_pattern_set_filter(pattern.get(), CAIRO_FILTER_GOOD);
+            // Edge pixels go on outwards, so that the picture's rim is not mixed with nothing.
+            cairo_pattern_set_extend(pattern.get(), CAIRO_EXTEND_PAD);
+            cairo_set_source(m_Context, pattern.get());
+            cairo_fill(m_Context);
+        }
+        cairo_restore(m_Context);
+    }
+
+    cairo_t * m_Context;
+    Schema const & m_Schema;
+    std::vector<Warning> * m_Warnings;
+    std::vector<double> m_Opacities;
+};
+
+/// cairo's pixels as the raster layer has them.
+Kernel::Counted<Raster::DynamicBitmap> Unpremultiplied(cairo_surface_t * surface)
+{
+    cairo_surface_flush(surface);
+    int const width = cairo_image_surface_get_width(surface);
+    int const height = cairo_image_surface_get_height(surface);
+    unsigned char const * const data = cairo_image_surface_get_data(surface);
+    std::size_t const stride = static_cast<std::size_t>(cairo_image_surface_get_stride(surface));
+    Kernel::Counted<Raster::DynamicBitmap> bitmap = Kernel::MakeCounted<Raster::DynamicBitmap>();
+    bitmap->Create(width, height, Raster::Format::Rgba8, Raster::MipmapMode::OnDemand,
+                   Raster::HardwareCachePolicy::Default);
+    for (int y = 0; y < height; ++y) {
+        std::uint8_t * target = bitmap->GetRow(y);
+        for (int x = 0; x < width; ++x, target += 4) {
+            std::uint32_t value = 0;
+            std::memcpy(&value, data + static_cast<std::size_t>(y) * stride + static_cast<std::size_t>(x) * 4, 4);
+            std::uint32_t const alpha = value >> 24;
+            for (int channel = 0; channel < 3 && alpha > 0; ++channel) {
+                std::uint32_t const colour = value >> (16 - 8 * channel) & 0xFF;
+                target[channel] = static_cast<std::uint8_t>(std::min(255U, (colour * 255 + alpha / 2) / alpha));
+            }
+            target[3] = static_cast<std::uint8_t>(alpha);
+        }
+    }
+    return bitmap;
+}
+
+}
+
+Kernel::Counted<Raster::DynamicBitmap> RasterSink::Draw(DisplayList const & list, int width, int height,
+                                                        Raster::AffineTransform::Params const & toPixels,
+                                                        std::vector<Warning> * warnings) const
+{
+    KORVANE_ASSERT(list.GetDepth() == 0);
+    if (width < 1 || height < 1 || width > MaximumSide || height > MaximumSide) {
+        return nullptr;
+    }
+    SurfacePtr const surface(cairo_image_surface_create(CAIRO_FORMAT_ARGB32, width, height));
+    ContextPtr const context(cairo_create(surface.get()));
+    if (cairo_status(context.get()) != CAIRO_STATUS_SUCCESS) {
+        return nullptr;
+    }
+    cairo_matrix_t const matrix = MatrixOf(toPixels);
+    cairo_set_matrix(context.get(), &matrix);
+    Painter(context.get(), *m_Schema, warnings).Draw(list);
+    if (cairo_status(context.get()) != CAIRO_STATUS_SUCCESS) {
+        return nullptr;
+    }
+    return Unpremultiplied(surface.get());
+}
+
+}
