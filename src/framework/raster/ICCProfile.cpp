@@ -1,6 +1,8 @@
 #include "framework/raster/ICCProfile.h"
 
 #include "framework/kernel/HashAccumulator.h"
+#include "framework/kernel/InSerialiser.h"
+#include "framework/kernel/OutSerialiser.h"
 
 #include <lcms2.h>
 #include <memory>
@@ -35,26 +37,56 @@ ColourSpace SpaceOf(cmsColorSpaceSignature signature)
 
 }
 
-Kernel::Consolidated<ICCProfile> ICCProfile::FromBytes(std::vector<unsigned char> bytes, String & reason)
+Kernel::ClassProperties const ICCProfile::ms_ClassProperties(
+    Kernel::ClassUID("ICCP"), [] { return Kernel::Counted<Kernel::Serialisable>(new ICCProfile); }, 1, {}, nullptr);
+static Kernel::ClassPropertiesBase::Init const s_ICCProfileInit(ICCProfile::GetTypeClassProperties());
+
+bool ICCProfile::Take(std::vector<unsigned char> bytes, String & reason)
 {
     ProfileHandle const handle(cmsOpenProfileFromMem(bytes.data(), static_cast<cmsUInt32Number>(bytes.size())));
     if (!handle) {
         reason = "The colour profile is damaged.";
-        return nullptr;
+        return false;
     }
-    ColourSpace const space = SpaceOf(cmsGetColorSpace(handle.get()));
-    if (space == ColourSpace::None) {
+    m_Space = SpaceOf(cmsGetColorSpace(handle.get()));
+    if (m_Space == ColourSpace::None) {
         reason = "The colour profile is not for grey, RGB, CMYK or Lab colours.";
-        return nullptr;
+        return false;
     }
-    Kernel::Counted<ICCProfile> profile(new ICCProfile);
     char name[256] = {};
     cmsGetProfileInfoASCII(handle.get(), cmsInfoDescription, "en", "US", name, sizeof(name));
-    profile->m_Description = name[0] ? name : "Unnamed profile";
-    profile->m_Space = space;
-    profile->m_Hash = Kernel::HashBytes64(bytes.data(), bytes.size());
-    profile->m_Bytes = std::move(bytes);
-    return Kernel::Counted<ICCProfile const>(profile);
+    m_Description = name[0] ? name : "Unnamed profile";
+    m_Hash = Kernel::HashBytes64(bytes.data(), bytes.size());
+    m_Bytes = std::move(bytes);
+    return true;
+}
+
+Kernel::Consolidated<ICCProfile> ICCProfile::FromBytes(std::vector<unsigned char> bytes, String & reason)
+{
+    Kernel::Counted<ICCProfile> profile(new ICCProfile);
+    return profile->Take(std::move(bytes), reason) ? Kernel::Counted<ICCProfile const>(profile) : nullptr;
+}
+
+void ICCProfile::Save(Kernel::OutSerialiser & out) const
+{
+    out.SaveData("Data", m_Bytes);
+}
+
+bool ICCProfile::Load(Kernel::InSerialiser const & in, Kernel::FileStore &, unsigned short)
+{
+    std::span<std::uint8_t const> bytes;
+    String reason;
+    return in.LoadData("Data", bytes) && Take({bytes.begin(), bytes.end()}, reason);
+}
+
+Kernel::ClassProperties const & ICCProfile::GetObjectClassProperties() const
+{
+    return ms_ClassProperties;
+}
+
+Kernel::ClassProperties const & ICCProfile::GetTypeClassProperties()
+{
+    return ms_ClassProperties;
 }
 
 bool ICCProfile::IsSame(ICCProfile const & other) const

@@ -2,8 +2,8 @@
 
 #include <vector>
 
-#include "framework/kernel/Countable.h"
 #include "framework/kernel/Counted.h"
+#include "framework/kernel/Serialisable.h"
 #include "framework/kernel/StringT.h"
 #include "framework/raster/Format.h"
 
@@ -11,7 +11,7 @@ namespace Raster
 {
 
 /// A colour profile (ICC.1): immutable, shared by `Kernel::Consolidated<ICCProfile>`, safe on any thread.
-class ICCProfile : public virtual Kernel::Countable
+class ICCProfile : public Kernel::SharedSerialisable
 {
 public:
     /// From the bytes of a profile. Null if they are none that the colour engine can read, or if its space is not grey,
@@ -28,8 +28,17 @@ public:
     /// Same bytes, in whatever objects.
     [[nodiscard]] bool IsSame(ICCProfile const & other) const;
 
+    void Save(Kernel::OutSerialiser & out) const override;
+    /// False for bytes that `FromBytes` would refuse.
+    bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
+    [[nodiscard]] static Kernel::ClassProperties const & GetTypeClassProperties();
+
 private:
+    static Kernel::ClassProperties const ms_ClassProperties;
+
     ICCProfile() = default;
+    [[nodiscard]] bool Take(std::vector<unsigned char> bytes, String & reason);
 
     std::vector<unsigned char> m_Bytes;
     ColourSpace m_Space = ColourSpace::None;

@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <optional>
 
-#include "framework/kernel/Counted.h"
+#include "framework/kernel/Serialisable.h"
 #include "framework/kernel/StringT.h"
 #include "framework/render/PrintersMarks.h"
 
@@ -12,7 +12,7 @@ namespace Renderer
 
 /// What an output file is to be like. Filled in, then put into a `Kernel::Consolidated` and only read. The class tells
 /// the format: ask with `Kernel::CountedCast` or `dynamic_cast`.
-class FileExportOptions : public virtual Kernel::Countable
+class FileExportOptions : public Kernel::SharedSerialisable
 {
 public:
     /// The file extension without its dot.
@@ -26,7 +26,13 @@ public:
     [[nodiscard]] bool GetEmbedMetadata() const { return m_EmbedMetadata; }
     void SetEmbedMetadata(bool embed) { m_EmbedMetadata = embed; }
 
+    void Save(Kernel::OutSerialiser & out) const override;
+    bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
+    [[nodiscard]] static Kernel::ClassProperties const & GetTypeClassProperties();
+
 private:
+    static Kernel::ClassProperties const ms_ClassProperties;
+
     bool m_IncludeBleed = false;
     bool m_EmbedMetadata = true;
 };
@@ -68,7 +74,14 @@ public:
     [[nodiscard]] bool GetBookmarks() const { return m_Settings.m_Bookmarks; }
     [[nodiscard]] PrintersMarksOptions const & GetPrintersMarks() const { return m_Settings.m_PrintersMarks; }
 
+    void Save(Kernel::OutSerialiser & out) const override;
+    bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
+    [[nodiscard]] static Kernel::ClassProperties const & GetTypeClassProperties();
+
 private:
+    static Kernel::ClassProperties const ms_ClassProperties;
+
     Settings m_Settings;
 };
 
