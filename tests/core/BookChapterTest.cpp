@@ -161,11 +161,11 @@ TEST(BookChapterTest, WalksOverThePagesThatExport)
         char const * m_Walk;
         char const * m_Last;
     };
-    for (Row const & row : {Row{"", 0, 0, "0.0 ", "0.0"}, Row{"o", 1, 1, "0.0 ", "0.0"},
-                            Row{"o|oo|oo", 5, 5, "0.0 1.0 1.1 2.0 2.1 ", "2.1"},
-                            Row{"x|xo|xx|ox", 7, 2, "1.1 3.0 ", "3.0"},
-                            // Where nothing exports every page counts, and the last is the very last.
-                            Row{"x|xx", 3, 0, "0.0 1.0 1.1 ", "1.1"}}) {
+    for (Row const & row :
+         {Row{"", 0, 0, "0.0 ", "0.0"}, Row{"o", 1, 1, "0.0 ", "0.0"},
+          Row{"o|oo|oo", 5, 5, "0.0 1.0 1.1 2.0 2.1 ", "2.1"}, Row{"x|xo|xx|ox", 7, 2, "1.1 3.0 ", "3.0"},
+          // Where nothing exports every page counts, and the last is the very last.
+          Row{"x|xx", 3, 0, "0.0 1.0 1.1 ", "1.1"}}) {
         auto const chapter = ChapterWith(row.m_Sketch);
         EXPECT_EQ(chapter->GetPageCount(), row.m_Pages) << row.m_Sketch;
         EXPECT_EQ(chapter->GetExportingPageCount(), row.m_Exporting) << row.m_Sketch;
@@ -184,11 +184,12 @@ TEST(BookChapterTest, TellsDoubleStartsAndHangingEnds)
         bool m_Hangs;
         char const * m_Why;
     };
-    for (Row const & row : {Row{"", false, false, "nothing"}, Row{"o", false, true, "one page is alone"},
-                            Row{"oo", true, false, "a full double page"}, Row{"xo", false, false, "starts on the right"},
-                            Row{"oo|ox", true, true, "the last page that exports is a left one"},
-                            Row{"ooo", false, false, "a spread of three is neither"},
-                            Row{"o|oo", false, false, "starts alone, ends full"}}) {
+    for (Row const & row :
+         {Row{"", false, false, "nothing"}, Row{"o", false, true, "one page is alone"},
+          Row{"oo", true, false, "a full double page"}, Row{"xo", false, false, "starts on the right"},
+          Row{"oo|ox", true, true, "the last page that exports is a left one"},
+          Row{"ooo", false, false, "a spread of three is neither"},
+          Row{"o|oo", false, false, "starts alone, ends full"}}) {
         auto const chapter = ChapterWith(row.m_Sketch);
         EXPECT_EQ(chapter->IsDoublePageStart(), row.m_IsDoubleStart) << row.m_Why;
         EXPECT_EQ(chapter->HasHangingPageEnd(), row.m_Hangs) << row.m_Why;
@@ -256,7 +257,9 @@ TEST(CanMergeWithPreviousTest, ComparesSizesAndTheEdgesThatMeet)
         {"single pages: every bleed margin counts", false,
          [](Spreads & ours, Spreads &) { ours[0].m_PageBoxes[0].right = 9; }},
         {"single pages: margins within tolerance", true,
-         [](Spreads & ours, Spreads &) { ours[0].m_PageBoxes[0] = {0.005, -0.005, 0.005, 0.004}; }},
+         [](Spreads & ours, Spreads &) {
+             ours[0].m_PageBoxes[0] = {0.005, -0.005, 0.005, 0.004};
+         }},
         // Our page is the second of its spread: the right margin of theirs meets the left one of ours.
         {"right page joins: inner margins that meet agree", true,
          [](Spreads & ours, Spreads & theirs) {
@@ -272,7 +275,10 @@ TEST(CanMergeWithPreviousTest, ComparesSizesAndTheEdgesThatMeet)
          "xo"},
         {"top margins differ", false, [](Spreads & ours, Spreads &) { ours[0].m_PageBoxes[1].top = 1; }, "xo"},
         {"sizes are compared at the place of the hanging page", true,
-         [](Spreads & ours, Spreads &) { ours[0].m_PageRects[1] = {100, 0, 500, 500}; }, "xo"},
+         [](Spreads & ours, Spreads &) {
+             ours[0].m_PageRects[1] = {100, 0, 500, 500};
+         },
+         "xo"},
     };
     for (MergeRow const & row : rows) {
         EXPECT_EQ(Merges(row, false), row.m_Merges) << row.m_Why;
@@ -310,13 +316,13 @@ TEST(GetPrePagePaddingCountTest, BringsPagesToTheirOwnSides)
         int m_Count;
         char const * m_Why;
     };
-    for (Row const & row : {Row{"oo", "oo", 0, "full spreads follow each other"},
-                            Row{"oo", "oo|o", 1, "the hanging page gets its partner"},
-                            Row{"o|oo", "oo", 1, "a single first page comes on its own side"},
-                            Row{"o|oo", "oo|o", 2, "both"}, Row{"xo|oo", "oo", 1, "starts on the second page"},
-                            Row{"o|xo", "oo", 1, "the first spread counts once"},
-                            // The first page that exports is the first of spread 1, and spread 0 has one page.
-                            Row{"x|oo", "oo", 1, "the document's first spread decides"}, Row{"", "oo|o", 1, "no pages"}}) {
+    for (Row const & row :
+         {Row{"oo", "oo", 0, "full spreads follow each other"},
+          Row{"oo", "oo|o", 1, "the hanging page gets its partner"},
+          Row{"o|oo", "oo", 1, "a single first page comes on its own side"}, Row{"o|oo", "oo|o", 2, "both"},
+          Row{"xo|oo", "oo", 1, "starts on the second page"}, Row{"o|xo", "oo", 1, "the first spread counts once"},
+          // The first page that exports is the first of spread 1, and spread 0 has one page.
+          Row{"x|oo", "oo", 1, "the document's first spread decides"}, Row{"", "oo|o", 1, "no pages"}}) {
         auto const chapter = FacingChapter(row.m_Ours);
         auto const previous = FacingChapter(row.m_Theirs);
         EXPECT_EQ(chapter->GetPrePagePaddingCount(previous, true, false), row.m_Count) << row.m_Why;

@@ -10,6 +10,7 @@
 #include "framework/raster/ResamplerType.h"
 
 #include <atomic>
+#include <concepts>
 #include <memory>
 #include <vector>
 
@@ -39,6 +40,13 @@ public:
     /// the document is not open; then its callback does not run.
     bool EnqueueCommand(Kernel::Counted<DocumentCommand> command, Kernel::Counted<DocumentController const> document,
                         bool byUser);
+    /// Any class of document command is one of these.
+    template <std::derived_from<DocumentCommand> TCommand>
+    bool EnqueueCommand(Kernel::Counted<TCommand> command, Kernel::Counted<DocumentController const> document,
+                        bool byUser)
+    {
+        return EnqueueCommand(Kernel::Counted<DocumentCommand>(std::move(command)), std::move(document), byUser);
+    }
     /// The same for a command that may be a book's: the book sinks are asked first.
     bool EnqueueCommand(Kernel::Counted<DomainCommand> command, Kernel::Counted<DocumentController const> document,
                         bool byUser);

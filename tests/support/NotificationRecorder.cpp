@@ -1,0 +1,79 @@
+#include "support/NotificationRecorder.h"
+
+#include "framework/document/VantraController.h"
+
+#include <algorithm>
+#include <cxxabi.h>
+#include <memory>
+#include <typeinfo>
+
+namespace
+{
+
+std::string NameOf(Kernel::Notification const & notification)
+{
+    int status = 0;
+    std::unique_ptr<char, void (*)(void *)> const name(
+        abi::__cxa_demangle(typeid(notification).name(), nullptr, nullptr, &status), std::free);
+    return status == 0 ? name.get() : typeid(notification).name();
+}
+
+constexpr std::string_view BookNamespace = "Book::";
+
+}
+
+NotificationRecorder::NotificationRecorder()
+{
+    BroadcastNotification::RegisterBroadcastSink(this);
+}
+
+NotificationRecorder::~NotificationRecorder()
+{
+    BroadcastNotification::UnregisterBroadcastSink(this);
+}
+
+void NotificationRecorder::Notify(Kernel::Counted<Kernel::Notification> notification)
+{
+    std::lock_guard const lock(m_Lock);
+    m_Notifications.push_back(std::move(notification));
+}
+
+std::vector<Kernel::Counted<Kernel::Notification>> NotificationRecorder::Rested()
+{
+    VantraController::GetInstance().WaitUntilIdle();
+    std::lock_guard const lock(m_Lock);
+    return m_Notifications;
+}
+
+void NotificationRecorder::Clear()
+{
+    VantraController::GetInstance().WaitUntilIdle();
+    std::lock_guard const lock(m_Lock);
+    m_Notifications.clear();
+}
+
+std::vector<std::string> NotificationRecorder::Names()
+{
+    std::vector<std::string> names;
+    for (Kernel::Counted<Kernel::Notification> const & notification : Rested()) {
+        std::string name = NameOf(*notification);
+        names.push_back(name.starts_with(BookNamespace) ? name.substr(BookNamespace.size()) : name);
+    }
+    return names;
+}
+
+std::vector<std::string> NotificationRecorder::BookNames(std::vector<std::string> const & except)
+{
+    std::vector<std::string> names;
+    for (Kernel::Counted<Kernel::Notification> const & notification : Rested()) {
+        std::string const name = NameOf(*notification);
+        if (!name.starts_with(BookNamespace)) {
+            continue;
+        }
+        std::string const plain = name.substr(BookNamespace.size());
+        if (std::find(except.begin(), except.end(), plain) == except.end()) {
+            names.push_back(plain);
+        }
+    }
+    return names;
+}
