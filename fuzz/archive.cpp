@@ -18,8 +18,7 @@ public:
     [[nodiscard]] String GetPath() const { return String("/proc/self/fd/" + std::to_string(m_Descriptor)); }
     [[nodiscard]] bool Set(std::uint8_t const * data, std::size_t size) const
     {
-        return ::ftruncate(m_Descriptor, 0) == 0 &&
-               ::pwrite(m_Descriptor, data, size, 0) == static_cast<ssize_t>(size);
+        return ::ftruncate(m_Descriptor, 0) == 0 && ::pwrite(m_Descriptor, data, size, 0) == static_cast<ssize_t>(size);
     }
 
 private:

@@ -83,8 +83,8 @@ Counted<Node> Read(Counted<RawData const> const & data)
 {
     EmptyFileStore store;
     MemoryInStream stream(data, "fuzz");
-    auto const in = InSerialiserFile::ParseWithChecks(stream, store, InSerialiser::DelayLoadsBehaviour::CheckAll,
-                                                      nullptr, nullptr);
+    auto const in =
+        InSerialiserFile::ParseWithChecks(stream, store, InSerialiser::DelayLoadsBehaviour::CheckAll, nullptr, nullptr);
     Counted<Node> root;
     if (in) {
         in->LoadObject("root", root);

@@ -9,8 +9,8 @@
 
 extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const * data, std::size_t size);
 
-/// Feeds every file of the given folders to the fuzz target that it is linked with, so that first inputs and the crashes
-/// found once are tried again in every build, without libFuzzer.
+/// Feeds every file of the given folders to the fuzz target that it is linked with, so that first inputs and the
+/// crashes found once are tried again in every build, without libFuzzer.
 int main(int count, char ** arguments)
 {
     int inputs = 0;

@@ -102,7 +102,8 @@ TEST(HashTest, DependsOnValuesAndTheirBoundsNotOnTheCuts)
 TEST(HashTest, AContentHashIsSha256)
 {
     TemporaryFolder const folder;
-    char const * const expected = "ba7816bf8f01cfea414140de5dae2223b00361a396177a9cb410ff61f20015ad"; // FIPS 180-4: "abc"
+    char const * const expected =
+        "ba7816bf8f01cfea414140de5dae2223b00361a396177a9cb410ff61f20015ad"; // FIPS 180-4: "abc"
     EXPECT_EQ(expected, ContentHash::OfBytes("abc", 3).ToString());
     ContentHash ofFile;
     EXPECT_TRUE(ContentHash::OfFile(folder.WriteFile("font", "abc"), ofFile));
@@ -142,9 +143,9 @@ TEST(UnitValueConverterTest, UnitsRelateToThePoint)
 {
     UnitValueConverter const converter(144.0);
     std::pair<UnitValue::UnitType, double> const inches[] = {
-        {UnitValue::UnitType::Points, 72.0},       {UnitValue::UnitType::Picas, 6.0},
-        {UnitValue::UnitType::Inches, 1.0},        {UnitValue::UnitType::Millimetres, 25.4},
-        {UnitValue::UnitType::Centimetres, 2.54},  {UnitValue::UnitType::Pixels, 144.0},
+        {UnitValue::UnitType::Points, 72.0},      {UnitValue::UnitType::Picas, 6.0},
+        {UnitValue::UnitType::Inches, 1.0},       {UnitValue::UnitType::Millimetres, 25.4},
+        {UnitValue::UnitType::Centimetres, 2.54}, {UnitValue::UnitType::Pixels, 144.0},
     };
     for (auto const & [unit, oneInch] : inches) {
         EXPECT_DOUBLE_EQ(72.0, converter.ToPoints(oneInch, unit));

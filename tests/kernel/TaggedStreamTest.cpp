@@ -13,7 +13,10 @@ using namespace Kernel;
 namespace
 {
 
-enum class Colour : std::uint32_t { Red = 7 };
+enum class Colour : std::uint32_t
+{
+    Red = 7
+};
 
 class Shade : public SharedSerialisable
 {

@@ -104,10 +104,17 @@ TEST(PathTest, AppendPutsExactlyOneSeparatorBetween)
         char const * m_Expected;
     };
     Row const rows[] = {
-        {"/books", "one", "/books/one"},     {"/books/", "one", "/books/one"},  {"/books", "/one", "/books/one"},
-        {"/books/", "/one", "/books/one"},   {"", "one", "one"},                {"/books", "", "/books"},
-        {"C:\\books", "one", "C:\\books\\one"}, {"C:\\books\\", "one", "C:\\books\\one"}, {"a\\b/c", "d", "a\\b/c/d"},
-        {"books", "one", "books/one"},       {"/", "one", "/one"},
+        {"/books", "one", "/books/one"},
+        {"/books/", "one", "/books/one"},
+        {"/books", "/one", "/books/one"},
+        {"/books/", "/one", "/books/one"},
+        {"", "one", "one"},
+        {"/books", "", "/books"},
+        {"C:\\books", "one", "C:\\books\\one"},
+        {"C:\\books\\", "one", "C:\\books\\one"},
+        {"a\\b/c", "d", "a\\b/c/d"},
+        {"books", "one", "books/one"},
+        {"/", "one", "/one"},
     };
     for (Row const & row : rows) {
         EXPECT_EQ(row.m_Expected, PathTraitsDos::Append(String(row.m_Path), String(row.m_Part)));

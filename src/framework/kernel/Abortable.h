@@ -6,7 +6,8 @@ namespace Kernel
 {
 
 /// Base of work that can be stopped from outside. It polls a flag that belongs to somebody else, or its own if it was
-/// given none, and stops soon after the flag is set. The flag may be set on any thread; it is never cleared by the work.
+/// given none, and stops soon after the flag is set. The flag may be set on any thread; it is never cleared by the
+/// work.
 class Abortable
 {
 public:

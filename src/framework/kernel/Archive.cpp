@@ -101,9 +101,7 @@ ArchiveFileException::Reason ToReason(FileIOException::Reason reason)
 
 }
 
-Archive::Archive(String path, IDTag type) : m_Path(std::move(path)), m_Type(type)
-{
-}
+Archive::Archive(String path, IDTag type) : m_Path(std::move(path)), m_Type(type) {}
 
 Archive::~Archive() = default;
 
@@ -143,8 +141,7 @@ Counted<Archive> Archive::Open(String const & path, OpenMode mode, IDTag type, O
 {
     if (mode == OpenMode::ReadUnlocked) {
         auto file = std::make_shared<File>();
-        result = ToOpenResult(
-            file->OpenEx(path.c_str(), "rb", File::ShareMode::Shared, File::VisibilityMode::Normal));
+        result = ToOpenResult(file->OpenEx(path.c_str(), "rb", File::ShareMode::Shared, File::VisibilityMode::Normal));
         if (result != OpenResult::Success) {
             return nullptr;
         }

@@ -23,7 +23,8 @@ namespace Kernel
 class Archive : public FileStore
 {
 public:
-    enum class OpenMode {
+    enum class OpenMode
+    {
         /// For reading, with a shared lock for as long as the archive or its lock lives.
         Read = 0,
         /// For reading by somebody who means to change the file: exclusive lock.
@@ -31,7 +32,8 @@ public:
         /// For one look, without a lock. What is read is consistent all the same, as a save replaces the file whole.
         ReadUnlocked = 2,
     };
-    enum class OpenResult {
+    enum class OpenResult
+    {
         Success = 0,
         Missing,
         IsFolder,
@@ -57,7 +59,8 @@ public:
     /// Why nothing could be created.
     struct CreateResult
     {
-        enum Code {
+        enum Code
+        {
             Success = 0,
             Unknown = 1,
             /// The target's folder does not exist; `m_Text` names it.
@@ -82,11 +85,13 @@ public:
         String m_Text;
     };
 
-    enum class SessionType {
+    enum class SessionType
+    {
         /// Writes the whole file anew.
         Whole = 2,
     };
-    enum class SessionResult {
+    enum class SessionResult
+    {
         Success = 0,
         /// The archive was opened for reading, or has had its session.
         NotWritable = 1,

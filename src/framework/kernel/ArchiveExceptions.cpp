@@ -33,13 +33,18 @@ FutureVersionException::FutureVersionException(String path, ClassUID uid, unsign
     : Exception(Format("The file %1 was written by a later version of this program (%2 version %3, known up to %4). "
                        "Update the program to open it.",
                        path, UidText(uid), static_cast<int>(found), static_cast<int>(known))),
-      m_Path(std::move(path)), m_ClassUID(uid), m_Found(found)
+      m_Path(std::move(path)),
+      m_ClassUID(uid),
+      m_Found(found)
 {
 }
 
 ArchiveFileException::ArchiveFileException(Counted<Archive const> archive, Reason reason, WhatFile whatFile,
                                            Counted<Archive const> other, String message)
-    : Exception(std::move(message)), m_Archive(std::move(archive)), m_Other(std::move(other)), m_Reason(reason),
+    : Exception(std::move(message)),
+      m_Archive(std::move(archive)),
+      m_Other(std::move(other)),
+      m_Reason(reason),
       m_WhatFile(whatFile)
 {
 }

@@ -40,7 +40,8 @@ private:
 class ArchiveFileException : public Exception
 {
 public:
-    enum class Reason {
+    enum class Reason
+    {
         Unknown = 0,
         OutOfSpace = 1,
         QuotaExceeded = 2,
@@ -51,14 +52,15 @@ public:
         DeviceError = 7,
     };
     /// What was being done with the file.
-    enum class WhatFile {
+    enum class WhatFile
+    {
         Written = 0,
         Read = 1,
     };
 
     /// `archive` is the one whose file failed; `other` another one that takes part, null if there is none.
-    ArchiveFileException(Counted<Archive const> archive, Reason reason, WhatFile whatFile,
-                         Counted<Archive const> other, String message);
+    ArchiveFileException(Counted<Archive const> archive, Reason reason, WhatFile whatFile, Counted<Archive const> other,
+                         String message);
     ~ArchiveFileException() override;
     ArchiveFileException(ArchiveFileException const &);
 

@@ -46,10 +46,10 @@ Archive::OpenResult CheckStart(File const & file, IDTag type)
     std::optional<IDTag> const found = Archive::IdentifyType(start, size);
     if (!found) {
         // A start of ours that just ends early, or somebody else's container.
-        bool const begins = size < VersionOffset + 1 &&
-                            (size <= LocalHeaderSize || std::memcmp(start + LocalHeaderSize, TypeEntry.data(),
-                                                                    std::min(size - LocalHeaderSize,
-                                                                             TypeEntry.size())) == 0);
+        bool const begins =
+            size < VersionOffset + 1 &&
+            (size <= LocalHeaderSize || std::memcmp(start + LocalHeaderSize, TypeEntry.data(),
+                                                    std::min(size - LocalHeaderSize, TypeEntry.size())) == 0);
         return begins ? Archive::OpenResult::Truncated : Archive::OpenResult::NotAnArchive;
     }
     if (*found != type) {
@@ -179,9 +179,8 @@ Counted<RawData const> Archive::Reader::Read(String const & name, Item const & i
         std::unique_ptr<libdeflate_decompressor, decltype(&libdeflate_free_decompressor)> const decompressor(
             libdeflate_alloc_decompressor(), &libdeflate_free_decompressor);
         // Never writes more than the declared size, and fails unless it comes out exactly.
-        libdeflate_result const result =
-            libdeflate_deflate_decompress(decompressor.get(), compressed.data(), compressed.size(),
-                                          data->GetMutableData(), data->GetSize(), nullptr);
+        libdeflate_result const result = libdeflate_deflate_decompress(
+            decompressor.get(), compressed.data(), compressed.size(), data->GetMutableData(), data->GetSize(), nullptr);
         if (result != LIBDEFLATE_SUCCESS) {
             Fail(name, "the item's compressed bytes do not hold together");
         }

@@ -8,9 +8,7 @@
 namespace Kernel
 {
 
-ArchiveSession::ArchiveSession(Counted<Archive> archive) : m_Archive(std::move(archive))
-{
-}
+ArchiveSession::ArchiveSession(Counted<Archive> archive) : m_Archive(std::move(archive)) {}
 
 String const & ArchiveSession::GetPath() const
 {
@@ -25,8 +23,7 @@ void ArchiveSession::SaveFile(String const & name, FileStoreCompressionHint cons
     SaveBytes(name, hint, stream.RelinquishOwnership());
 }
 
-void ArchiveSession::SaveBytes(String const & name, FileStoreCompressionHint const & hint,
-                               Counted<RawData const> data)
+void ArchiveSession::SaveBytes(String const & name, FileStoreCompressionHint const & hint, Counted<RawData const> data)
 {
     KORVANE_ASSERT_MESSAGE(m_Archive && data, "the session is closed, or there is nothing to save");
     if (!Abortable::IsFlagSet(const_cast<bool *>(m_Archive->m_Writer->m_Abort))) {

@@ -13,7 +13,8 @@ namespace Kernel
 class ArchiveThumbnails : public virtual Countable
 {
 public:
-    enum class FileType {
+    enum class FileType
+    {
         /// Thumbnails/thumbnail.png
         Png = 0,
     };

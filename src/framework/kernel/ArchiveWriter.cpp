@@ -31,8 +31,8 @@ Counted<RawData const> Deflate(int level, RawData const & data)
     std::unique_ptr<libdeflate_compressor, decltype(&libdeflate_free_compressor)> const compressor(
         libdeflate_alloc_compressor(level), &libdeflate_free_compressor);
     RawData::Bytes bytes(libdeflate_deflate_compress_bound(compressor.get(), data.GetSize()));
-    std::size_t const size = libdeflate_deflate_compress(compressor.get(), data.GetData(), data.GetSize(),
-                                                         bytes.data(), bytes.size());
+    std::size_t const size =
+        libdeflate_deflate_compress(compressor.get(), data.GetData(), data.GetSize(), bytes.data(), bytes.size());
     if (size == 0 || data.GetSize() <= size) {
         return nullptr;
     }
@@ -85,9 +85,9 @@ struct ArchiveEntrySource
 
 void Archive::Writer::Add(String const & name, int deflateLevel, Counted<RawData const> data)
 {
-    KORVANE_ASSERT_MESSAGE(std::none_of(m_Entries.begin(), m_Entries.end(),
-                                        [&name](Entry const & entry) { return entry.m_Name == name; }),
-                           "an item of this name is in the archive already");
+    KORVANE_ASSERT_MESSAGE(
+        std::none_of(m_Entries.begin(), m_Entries.end(), [&name](Entry const & entry) { return entry.m_Name == name; }),
+        "an item of this name is in the archive already");
     std::uint64_t const size = data->GetSize();
     std::uint32_t const checksum = libdeflate_crc32(0, data->GetData(), data->GetSize());
     Counted<RawData const> const deflated = Deflate(deflateLevel, *data);

@@ -56,7 +56,10 @@ public:
     /// the object.
     constexpr ClassProperties(ClassUID uid, Creator creator, unsigned short version,
                               std::span<DefaultItem const> defaults, ClassProperties const * base)
-        : ClassPropertiesBase(uid, version), m_Creator(creator), m_Defaults(defaults), m_Base(base)
+        : ClassPropertiesBase(uid, version),
+          m_Creator(creator),
+          m_Defaults(defaults),
+          m_Base(base)
     {
     }
 

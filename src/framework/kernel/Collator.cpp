@@ -25,9 +25,8 @@ Collator::Collator(String const & language)
 int Collator::Compare(String const & a, String const & b) const
 {
     UErrorCode status = U_ZERO_ERROR;
-    UCollationResult const result =
-        ucol_strcollUTF8(m_Collator.get(), a.Data(), static_cast<std::int32_t>(a.Length()), b.Data(),
-                         static_cast<std::int32_t>(b.Length()), &status);
+    UCollationResult const result = ucol_strcollUTF8(m_Collator.get(), a.Data(), static_cast<std::int32_t>(a.Length()),
+                                                     b.Data(), static_cast<std::int32_t>(b.Length()), &status);
     return result == UCOL_LESS ? -1 : result == UCOL_GREATER ? 1 : 0;
 }
 

@@ -18,7 +18,8 @@ public:
     /// that is not known.
     explicit Collator(String const & language);
 
-    /// Below, at or above zero as `a` comes before, with or after `b`. Texts that the language does not tell apart are 0.
+    /// Below, at or above zero as `a` comes before, with or after `b`. Texts that the language does not tell apart are
+    /// 0.
     [[nodiscard]] int Compare(String const & a, String const & b) const;
     /// For sorted containers and `std::sort`.
     bool operator()(String const & a, String const & b) const { return Compare(a, b) < 0; }

@@ -9,7 +9,8 @@ namespace Kernel
 {
 
 /// What the file layer is about to do to the disk.
-enum class DiskOperation {
+enum class DiskOperation
+{
     Open,
     Read,
     Write,

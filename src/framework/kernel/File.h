@@ -13,16 +13,19 @@ class File
 {
 public:
     /// What others may do with the file meanwhile.
-    enum class ShareMode {
+    enum class ShareMode
+    {
         /// Anything; locks of others are not looked at.
         Shared = 0,
         /// Opening for writing is refused where another program holds a lock on the file.
         RespectLocks = 1,
     };
-    enum class VisibilityMode {
+    enum class VisibilityMode
+    {
         Normal = 0,
     };
-    enum class OpenUnmanagedResult {
+    enum class OpenUnmanagedResult
+    {
         Success = 0,
         /// Opened for reading although writing was asked for as well.
         SuccessReadOnly = 1,
@@ -51,7 +54,8 @@ public:
     {
     public:
         OpenUnmanagedException(OpenUnmanagedResult result, String message)
-            : Exception(std::move(message)), m_Result(result)
+            : Exception(std::move(message)),
+              m_Result(result)
         {
         }
         [[nodiscard]] OpenUnmanagedResult GetResult() const { return m_Result; }
@@ -76,8 +80,9 @@ public:
     /// False if the system reports a failure of an earlier write only now.
     bool Close();
 
-    /// These throw `FileIOException`. `Read` gives fewer bytes than asked for only at the end of the file; `ReadAt` reads
-    /// at an offset and leaves the position alone, so that several threads may use it; `Flush` is through to the disk.
+    /// These throw `FileIOException`. `Read` gives fewer bytes than asked for only at the end of the file; `ReadAt`
+    /// reads at an offset and leaves the position alone, so that several threads may use it; `Flush` is through to the
+    /// disk.
     std::size_t Read(void * buffer, std::size_t size);
     std::size_t ReadAt(std::uint64_t offset, void * buffer, std::size_t size) const;
     void Write(void const * data, std::size_t size);

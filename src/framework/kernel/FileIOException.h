@@ -9,7 +9,8 @@ namespace Kernel
 class FileIOException : public Exception
 {
 public:
-    enum class Reason {
+    enum class Reason
+    {
         Unknown = 0,
         WriteFailed = 1,
         AccessDenied = 2,
@@ -20,7 +21,9 @@ public:
     };
 
     FileIOException(Reason reason, String path, String message)
-        : Exception(std::move(message)), m_Reason(reason), m_Path(std::move(path))
+        : Exception(std::move(message)),
+          m_Reason(reason),
+          m_Path(std::move(path))
     {
     }
 

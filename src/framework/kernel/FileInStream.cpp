@@ -8,8 +8,7 @@ namespace Kernel
 Counted<FileInStream> FileInStream::Open(char const * path, bool throwOnFailure)
 {
     auto stream = MakeCounted<FileInStream>();
-    auto const result =
-        stream->m_File.OpenEx(path, "rb", File::ShareMode::Shared, File::VisibilityMode::Normal);
+    auto const result = stream->m_File.OpenEx(path, "rb", File::ShareMode::Shared, File::VisibilityMode::Normal);
     if (result != File::OpenUnmanagedResult::Success) {
         if (throwOnFailure) {
             throw File::OpenUnmanagedException(result, File::GetResultText(result, path));

@@ -37,17 +37,14 @@ bool LockFile(File const & file, FileLock::Kind & kind)
 
 }
 
-FileLock::FileLock(std::shared_ptr<File> file, Kind kind) : m_File(std::move(file)), m_Kind(kind)
-{
-}
+FileLock::FileLock(std::shared_ptr<File> file, Kind kind) : m_File(std::move(file)), m_Kind(kind) {}
 
 Counted<FileLock> FileLock::Acquire(String const & path, Kind kind, Result & result)
 {
     for (;;) {
         auto file = std::make_shared<File>();
         // Opened for writing as well, so that a shared lock can be made exclusive later on.
-        auto const opened =
-            file->OpenEx(path.c_str(), "r+b", File::ShareMode::Shared, File::VisibilityMode::Normal);
+        auto const opened = file->OpenEx(path.c_str(), "r+b", File::ShareMode::Shared, File::VisibilityMode::Normal);
         if (opened != File::OpenUnmanagedResult::Success && opened != File::OpenUnmanagedResult::SuccessReadOnly) {
             if (opened == File::OpenUnmanagedResult::IsFolder) {
                 errno = EISDIR;

@@ -17,11 +17,13 @@ class File;
 class FileLock : public virtual Countable
 {
 public:
-    enum class Kind {
+    enum class Kind
+    {
         Shared,
         Exclusive,
     };
-    enum class Result {
+    enum class Result
+    {
         Success,
         /// Somebody else holds a lock that stands against it.
         Locked,
@@ -37,7 +39,8 @@ public:
     [[nodiscard]] static Counted<FileLock> AcquireOn(std::shared_ptr<File> file, Kind kind);
 
     [[nodiscard]] Kind GetKind() const { return m_Kind; }
-    /// Changes the lock in place; false, and unchanged, if others' locks forbid it or the file is open for reading only.
+    /// Changes the lock in place; false, and unchanged, if others' locks forbid it or the file is open for reading
+    /// only.
     bool ChangeKind(Kind kind);
     /// The path names the file that is locked, not one that has since taken its place.
     [[nodiscard]] bool IsFor(String const & path) const;

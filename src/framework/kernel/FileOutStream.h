@@ -26,13 +26,13 @@ public:
 /// Writes a file. What `Create` makes is written beside its target and takes the target's place on `Close`, so that the
 /// target is whole or untouched at every moment; a stream that goes without `Close` leaves nothing.
 ///
-/// A failure throws `FileIOException`; with an error handler it is told to the handler and recorded, and the stream then
-/// swallows what follows.
+/// A failure throws `FileIOException`; with an error handler it is told to the handler and recorded, and the stream
+/// then swallows what follows.
 class FileOutStream : public OutStream
 {
 public:
-    /// Null if the target cannot be made, with the reason in `result`, and a sentence in `*message` if that is not null.
-    /// The folder must exist. A target that is no regular file, such as a pipe, is written to directly.
+    /// Null if the target cannot be made, with the reason in `result`, and a sentence in `*message` if that is not
+    /// null. The folder must exist. A target that is no regular file, such as a pipe, is written to directly.
     [[nodiscard]] static Counted<FileOutStream> Create(char const * path, File::ShareMode share,
                                                        File::OpenUnmanagedResult & result, String * message);
     /// Writes to a file that is open already, in place. It is left where it is on `Close`; with `deleteOnRelease` it is

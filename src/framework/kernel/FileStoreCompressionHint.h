@@ -6,7 +6,8 @@ namespace Kernel
 {
 
 /// What a predictor does to the bytes before they are compressed.
-enum class CompressionPredictorType {
+enum class CompressionPredictorType
+{
     None = 0,
 };
 
@@ -22,7 +23,8 @@ public:
 class FileStoreCompressionHintGeneral : public FileStoreCompressionHint
 {
 public:
-    enum class CompressionLevel {
+    enum class CompressionLevel
+    {
         /// As they are: for what is compressed already, or read more often than it is worth.
         Stored = 0,
         Fast = 1,
@@ -32,7 +34,9 @@ public:
 
     /// `predictorStride` is the bytes of one element for the predictor; 0 without one.
     FileStoreCompressionHintGeneral(CompressionLevel level, CompressionPredictorType predictor, int predictorStride)
-        : m_Level(level), m_Predictor(predictor), m_PredictorStride(predictorStride)
+        : m_Level(level),
+          m_Predictor(predictor),
+          m_PredictorStride(predictorStride)
     {
     }
 

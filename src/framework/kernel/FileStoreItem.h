@@ -13,13 +13,15 @@ class InStream;
 class OutStream;
 
 /// Whether an item may lie in an archive that lies in another archive.
-enum class Nestable {
+enum class Nestable
+{
     No = 0,
     Yes = 1,
 };
 
 /// Whether an item is worth keeping in what is saved for recovery after a crash.
-enum class Recoverable {
+enum class Recoverable
+{
     No = 0,
     Yes = 1,
 };
@@ -31,7 +33,10 @@ public:
     using Creator = Counted<FileStoreItem> (*)();
 
     constexpr FileStoreItemType(ClassUID uid, Creator creator, Nestable nestable, Recoverable recoverable)
-        : m_ClassUID(uid), m_Creator(creator), m_Nestable(nestable), m_Recoverable(recoverable)
+        : m_ClassUID(uid),
+          m_Creator(creator),
+          m_Nestable(nestable),
+          m_Recoverable(recoverable)
     {
     }
 

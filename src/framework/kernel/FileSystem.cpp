@@ -180,8 +180,8 @@ bool FileSystem::CopyFile(String const & from, String const & to, IfExists ifExi
     String const written = aside ? to + ".copy" : to;
     int target = -1;
     if (DiskFault::Ask(DiskOperation::Open, written.c_str()) == 0) {
-        target = ::open(written.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | (aside ? O_TRUNC : O_EXCL),
-                        facts.st_mode & 07777);
+        target =
+            ::open(written.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | (aside ? O_TRUNC : O_EXCL), facts.st_mode & 07777);
     }
     if (target < 0) {
         CloseQuietly(source);

@@ -9,13 +9,14 @@
 namespace Kernel
 {
 
-/// Questions and operations on files and folders by path. Safe on any thread. No operation throws: they say whether they
-/// worked, and `errno` then tells why not.
+/// Questions and operations on files and folders by path. Safe on any thread. No operation throws: they say whether
+/// they worked, and `errno` then tells why not.
 class FileSystem
 {
 public:
     /// What `CopyFile` and `Rename` do with a target that exists.
-    enum class IfExists {
+    enum class IfExists
+    {
         Fail,
         Replace,
     };

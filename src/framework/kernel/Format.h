@@ -10,13 +10,14 @@ namespace Kernel
 {
 
 /// How a number shows its sign. A negative number has a minus sign in either.
-enum class SignStyle {
+enum class SignStyle
+{
     NegativeOnly = 0,
     Always = 1,
 };
 
-/// How digits are grouped: `m_Separator` before every `m_GroupSize` digits from the right. A null pointer to it means no
-/// grouping.
+/// How digits are grouped: `m_Separator` before every `m_GroupSize` digits from the right. A null pointer to it means
+/// no grouping.
 struct CharacterGrouping
 {
     char m_Separator = ',';

@@ -39,14 +39,10 @@ public:
     void Add(String const & text) { AddText(text.View()); }
     void AddText(std::string_view text);
     template <typename T>
-        requires(std::is_arithmetic_v<T> || std::is_enum_v<T>)
-    void Add(T value)
-    {
-        AddBytes(&value, sizeof(value));
-    }
+    requires(std::is_arithmetic_v<T> || std::is_enum_v<T>) void Add(T value) { AddBytes(&value, sizeof(value)); }
     /// The bytes of the elements, with their number. The type has no padding.
     template <typename T>
-        requires std::has_unique_object_representations_v<T>
+    requires std::has_unique_object_representations_v<T>
     void AddArray(std::span<T const> values)
     {
         Add(static_cast<std::uint64_t>(values.size()));

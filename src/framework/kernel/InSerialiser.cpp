@@ -21,8 +21,7 @@ String InSerialiser::Context::PlaceOf(std::uint8_t const * at) const
 void InSerialiser::Context::CheckDepth(int levels, std::uint8_t const * at) const
 {
     if (MaximumDepth <= levels) {
-        throw ArchiveCorruptionException(m_SourceName, PlaceOf(at),
-                                         "values refer to each other in too long a chain");
+        throw ArchiveCorruptionException(m_SourceName, PlaceOf(at), "values refer to each other in too long a chain");
     }
 }
 

@@ -25,7 +25,8 @@ class InSerialiser
 {
 public:
     /// What `InSerialiserFile::ParseWithChecks` checks beyond the structure.
-    enum class DelayLoadsBehaviour {
+    enum class DelayLoadsBehaviour
+    {
         /// The versions of all classes in the stream, nested ones included.
         CheckAll = 0,
         /// The version of a nested object only when it is loaded.

@@ -19,7 +19,9 @@ struct InSerialiser::Context
     };
 
     Context(Counted<RawData const> buffer, FileStore & store, String sourceName)
-        : m_Buffer(std::move(buffer)), m_Store(store), m_SourceName(std::move(sourceName))
+        : m_Buffer(std::move(buffer)),
+          m_Store(store),
+          m_SourceName(std::move(sourceName))
     {
     }
 
@@ -33,8 +35,8 @@ struct InSerialiser::Context
     String const m_SourceName;
     std::vector<Shared> m_Shared;
     /// Objects that are being made at this moment, each for the next; and the levels below the one being made, those of
-    /// shared values that were made before included. References between shared values can chain more objects than lie in
-    /// each other, and what has been read must be writable again.
+    /// shared values that were made before included. References between shared values can chain more objects than lie
+    /// in each other, and what has been read must be writable again.
     int m_Depth = 0;
     int m_Height = 0;
 };

@@ -14,7 +14,10 @@ using namespace TaggedStream;
 
 InSerialiserFile::InSerialiserFile(std::unique_ptr<Context> context, std::span<std::uint8_t const> fields,
                                    IDTag rootTag, unsigned short version)
-    : InSerialiser(*context, fields), m_OwnContext(std::move(context)), m_RootTag(rootTag), m_Version(version)
+    : InSerialiser(*context, fields),
+      m_OwnContext(std::move(context)),
+      m_RootTag(rootTag),
+      m_Version(version)
 {
 }
 

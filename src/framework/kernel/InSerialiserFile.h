@@ -12,9 +12,9 @@ namespace Kernel
 class InSerialiserFile : public virtual Countable, public InSerialiser
 {
 public:
-    /// Reads the rest of the stream and checks it. Null if it does not begin like a tagged stream, or if `progress` says
-    /// stop. Throws `ArchiveCorruptionException` for one that contradicts itself, and `FutureVersionException` for a
-    /// class version that is newer than the program's, or a newer format of the stream as such.
+    /// Reads the rest of the stream and checks it. Null if it does not begin like a tagged stream, or if `progress`
+    /// says stop. Throws `ArchiveCorruptionException` for one that contradicts itself, and `FutureVersionException` for
+    /// a class version that is newer than the program's, or a newer format of the stream as such.
     ///
     /// `progress`, which may be empty, gets the part done between 0 and 1 and returns false to stop. `unknownClass`,
     /// which may be empty, is told the uid of each object whose class nobody has registered. `store` must outlive the

@@ -23,8 +23,8 @@ public:
     /// The path of the file it comes from, for messages; empty for memory.
     [[nodiscard]] virtual String GetSourceName() const = 0;
 
-    /// The rest of the stream, from the present position to the end. The block is shared where the stream lies in memory
-    /// as a whole and nothing has been read yet, and copied otherwise.
+    /// The rest of the stream, from the present position to the end. The block is shared where the stream lies in
+    /// memory as a whole and nothing has been read yet, and copied otherwise.
     [[nodiscard]] virtual Counted<RawData const> ReadAll();
 };
 

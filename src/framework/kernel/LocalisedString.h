@@ -18,7 +18,10 @@ public:
 
     /// Lengths in bytes, without closing zeros. The texts must outlive the object: literals do.
     LocalisedString(char const * text, std::size_t textLength, char const * context, std::size_t contextLength)
-        : m_Text(text), m_TextLength(textLength), m_Context(context), m_ContextLength(contextLength)
+        : m_Text(text),
+          m_TextLength(textLength),
+          m_Context(context),
+          m_ContextLength(contextLength)
     {
     }
 

@@ -9,7 +9,8 @@ namespace Kernel
 {
 
 MemoryInStream::MemoryInStream(Counted<RawData const> data, String sourceName)
-    : m_Data(std::move(data)), m_SourceName(std::move(sourceName))
+    : m_Data(std::move(data)),
+      m_SourceName(std::move(sourceName))
 {
     KORVANE_ASSERT(m_Data);
 }

@@ -12,7 +12,9 @@ namespace Kernel
 using namespace TaggedStream;
 
 OutSerialiser::OutSerialiser(FileStoreOut & store, CompareContext const * context)
-    : m_Store(store), m_Context(context), m_PathsOnly(!store.IsFullSave())
+    : m_Store(store),
+      m_Context(context),
+      m_PathsOnly(!store.IsFullSave())
 {
 }
 

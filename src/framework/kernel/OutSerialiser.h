@@ -16,8 +16,8 @@ namespace Kernel
 
 class FileStoreOut;
 
-/// Writes the fields of objects into a tagged stream, each under its tag, in the order of the calls. A field is found by
-/// its tag on reading, so the order matters to nobody but who compares bytes. One tag is used once in an object.
+/// Writes the fields of objects into a tagged stream, each under its tag, in the order of the calls. A field is found
+/// by its tag on reading, so the order matters to nobody but who compares bytes. One tag is used once in an object.
 ///
 /// In a run that only collects paths (`IsFullSave` is false) nothing is written, and objects are walked all the same.
 class OutSerialiser
@@ -44,7 +44,8 @@ public:
     template <typename T>
     void SaveType(IDTag tag, T * value) = delete;
 
-    /// A run of elements as one block, such as a text buffer or the glyphs of a line. Its bytes start at a multiple of 8.
+    /// A run of elements as one block, such as a text buffer or the glyphs of a line. Its bytes start at a multiple
+    /// of 8.
     template <SerialisableElement T>
     void SaveArray(IDTag tag, std::span<T const> values)
     {
@@ -70,8 +71,8 @@ public:
             }
         }
     }
-    /// The same by hand: `StartObjectArrayTestI` says whether the array is to be written, `StartObjectArrayBeginI` begins
-    /// it, and exactly `count` calls of `SaveObjectI` with the same tag follow.
+    /// The same by hand: `StartObjectArrayTestI` says whether the array is to be written, `StartObjectArrayBeginI`
+    /// begins it, and exactly `count` calls of `SaveObjectI` with the same tag follow.
     [[nodiscard]] bool StartObjectArrayTestI(IDTag tag, unsigned long long count) const;
     void StartObjectArrayBeginI(IDTag tag, unsigned long long count);
     void SaveObjectI(IDTag tag, NonCounted<Serialisable const> object, bool writeNull);

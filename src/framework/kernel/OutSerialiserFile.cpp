@@ -9,7 +9,10 @@ namespace Kernel
 using namespace TaggedStream;
 
 OutSerialiserFile::OutSerialiserFile(OutStream & stream, FileStoreOut & store, IDTag rootTag, unsigned short version)
-    : OutSerialiser(store, nullptr), m_Stream(stream), m_RootTag(rootTag), m_Version(version)
+    : OutSerialiser(store, nullptr),
+      m_Stream(stream),
+      m_RootTag(rootTag),
+      m_Version(version)
 {
 }
 

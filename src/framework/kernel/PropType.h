@@ -7,7 +7,8 @@ namespace Kernel
 
 /// How a field of a tagged stream is written. The numbers are part of the file format. All numbers lie in the file with
 /// the least significant byte first.
-enum class PropType : std::uint8_t {
+enum class PropType : std::uint8_t
+{
     Bool = 1,
     /// UTF-8, without a closing zero.
     String = 2,

@@ -17,13 +17,13 @@ static_assert(std::endian::native == std::endian::little);
 /// A type that one field of fixed size holds as it lies in memory.
 template <typename T>
 concept SerialisableScalar = std::is_arithmetic_v<T> || std::is_enum_v<T> || std::same_as<T, IDTag> ||
-                             std::same_as<T, ClassUID> || std::same_as<T, TimeStamp>;
+    std::same_as<T, ClassUID> || std::same_as<T, TimeStamp>;
 
 /// A type whose elements may lie in a file one after the other: no pointers, no padding bytes of unknown content.
 template <typename T>
-concept SerialisableElement = std::is_trivially_copyable_v<T> && !std::is_pointer_v<T> && alignof(T) <= 8 &&
-                              (std::has_unique_object_representations_v<T> || std::is_floating_point_v<T> ||
-                               T::IsSerialisableElement);
+concept SerialisableElement =
+    std::is_trivially_copyable_v<T> && !std::is_pointer_v<T> && alignof(T) <= 8 &&
+    (std::has_unique_object_representations_v<T> || std::is_floating_point_v<T> || T::IsSerialisableElement);
 
 /// The property type of a scalar.
 template <SerialisableScalar T>

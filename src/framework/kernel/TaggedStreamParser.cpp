@@ -11,7 +11,10 @@ using namespace TaggedStream;
 TaggedStreamParser::TaggedStreamParser(Bytes whole, String sourceName, bool checkVersions,
                                        std::function<bool(float)> const & progress,
                                        std::function<void(ClassUID)> const & unknownClass)
-    : m_Whole(whole), m_SourceName(std::move(sourceName)), m_CheckVersions(checkVersions), m_Progress(progress),
+    : m_Whole(whole),
+      m_SourceName(std::move(sourceName)),
+      m_CheckVersions(checkVersions),
+      m_Progress(progress),
       m_UnknownClass(unknownClass)
 {
 }

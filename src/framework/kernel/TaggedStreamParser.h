@@ -12,15 +12,14 @@ namespace Kernel
 {
 
 /// Walks a whole tagged stream once and checks all that the readers later rely on: every length lies within what holds
-/// it, fixed-size fields have their size, arrays hold whole elements, strings fill their array, objects nest to a bounded
-/// depth, each shared value is defined once before it is referred to. Nothing is allocated but the table of shared
-/// values. Throws `ArchiveCorruptionException` or `FutureVersionException`.
+/// it, fixed-size fields have their size, arrays hold whole elements, strings fill their array, objects nest to a
+/// bounded depth, each shared value is defined once before it is referred to. Nothing is allocated but the table of
+/// shared values. Throws `ArchiveCorruptionException` or `FutureVersionException`.
 class TaggedStreamParser
 {
 public:
     TaggedStreamParser(std::span<std::uint8_t const> whole, String sourceName, bool checkVersions,
-                       std::function<bool(float)> const & progress,
-                       std::function<void(ClassUID)> const & unknownClass);
+                       std::function<bool(float)> const & progress, std::function<void(ClassUID)> const & unknownClass);
 
     /// False if `progress` said stop.
     bool ParseFields(std::span<std::uint8_t const> fields);

@@ -17,8 +17,7 @@ Counted<FileOutStream> TempFile::GenerateTempOutFile(String & path, String const
     for (int attempt = 0; attempt < 100; ++attempt) {
         String const name = ConcatString({"korvane-", Uuid().ToString(), dotted ? "" : ".", extension});
         String const wanted = PathTraitsDos::Append(FileSystem::GetTemporaryFolder(), name);
-        auto const result =
-            file->OpenEx(wanted.c_str(), "w+bx", File::ShareMode::Shared, File::VisibilityMode::Normal);
+        auto const result = file->OpenEx(wanted.c_str(), "w+bx", File::ShareMode::Shared, File::VisibilityMode::Normal);
         if (result == File::OpenUnmanagedResult::Success) {
             ::fchmod(file->GetDescriptor(), 0600);
             path = wanted;

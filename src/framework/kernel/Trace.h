@@ -7,8 +7,8 @@
 namespace Kernel
 {
 
-/// Writes a diagnostic line, which the user never sees. It goes to the standard error stream if the environment variable
-/// KORVANE_TRACE is set, and nowhere otherwise. Safe on any thread; lines do not mix.
+/// Writes a diagnostic line, which the user never sees. It goes to the standard error stream if the environment
+/// variable KORVANE_TRACE is set, and nowhere otherwise. Safe on any thread; lines do not mix.
 void Trace(char const * line);
 void Trace(String const & line);
 

@@ -7,7 +7,8 @@ namespace Kernel
 class UnitValue
 {
 public:
-    enum class UnitType {
+    enum class UnitType
+    {
         Points = 0,
         Picas = 1,
         Inches = 2,

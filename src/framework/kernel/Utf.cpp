@@ -44,7 +44,8 @@ bool Decode(std::string_view text, char32_t & character, std::size_t & length)
         return false;
     }
     std::size_t const wanted = first < 0xE0 ? 2 : first < 0xF0 ? 3 : 4;
-    // Only the second byte's range depends on the first: that shuts out overlong forms, surrogates and what is too high.
+    // Only the second byte's range depends on the first: that shuts out overlong forms, surrogates and what is too
+    // high.
     unsigned lowest = first == 0xE0 ? 0xA0 : first == 0xF0 ? 0x90 : 0x80;
     unsigned highest = first == 0xED ? 0x9F : first == 0xF4 ? 0x8F : 0xBF;
     character = first & (0xFFu >> (wanted + 1));

@@ -18,9 +18,7 @@ constexpr std::size_t WindowLimit = 256 * 1024;
 
 }
 
-ZipFileSource::ZipFileSource(std::shared_ptr<File> file) : m_File(std::move(file))
-{
-}
+ZipFileSource::ZipFileSource(std::shared_ptr<File> file) : m_File(std::move(file)) {}
 
 ZipFileSource::~ZipFileSource() = default;
 
@@ -112,8 +110,8 @@ struct ZipFileSourceCallback
         case ZIP_SOURCE_SEEK: {
             zip_error_t error;
             zip_error_init(&error);
-            zip_int64_t const to = zip_source_seek_compute_offset(source.m_ReadPosition, source.m_File->GetSize(),
-                                                                  data, length, &error);
+            zip_int64_t const to =
+                zip_source_seek_compute_offset(source.m_ReadPosition, source.m_File->GetSize(), data, length, &error);
             if (to < 0) {
                 return -1;
             }
@@ -128,8 +126,8 @@ struct ZipFileSourceCallback
         case ZIP_SOURCE_SEEK_WRITE: {
             zip_error_t error;
             zip_error_init(&error);
-            zip_int64_t const to = zip_source_seek_compute_offset(source.m_WritePosition, source.m_WriteEnd, data,
-                                                                  length, &error);
+            zip_int64_t const to =
+                zip_source_seek_compute_offset(source.m_WritePosition, source.m_WriteEnd, data, length, &error);
             if (to < 0) {
                 return -1;
             }

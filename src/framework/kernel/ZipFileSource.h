@@ -38,8 +38,8 @@ private:
 
     std::shared_ptr<File> const m_File;
     std::uint64_t m_ReadPosition = 0;
-    // What was written last, not yet in the file: it begins at m_WindowStart. libzip goes back to fill in headers, mostly
-    // within it.
+    // What was written last, not yet in the file: it begins at m_WindowStart. libzip goes back to fill in headers,
+    // mostly within it.
     std::vector<std::uint8_t> m_Window;
     std::uint64_t m_WindowStart = 0;
     std::uint64_t m_WritePosition = 0;
