@@ -1,0 +1,27 @@
+#pragma once
+
+#include "app/BookSession.h"
+
+#include <filesystem>
+#include <string>
+
+namespace App
+{
+
+/// What the user wants of the PDF.
+struct PdfWishes
+{
+    bool m_HasMarks = false;
+    bool m_IncludesBleed = false;
+    bool m_EmbedsMetadata = true;
+    std::string m_Language;
+    /// Seconds since 1970 that stand for now in the file; negative for the clock.
+    long long m_FixedTime = -1;
+};
+
+/// Writes all chapters of a book into one PDF, page by page. False, with the reason in `messages`, if it failed or was
+/// interrupted; the target is then as it was before.
+bool ExportBook(BookSession & session, Listener & listener, std::filesystem::path const & target, PdfWishes const & wishes,
+                Import::MessageList & messages);
+
+}

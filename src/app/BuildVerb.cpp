@@ -1,0 +1,276 @@
+#include "app/BookExport.h"
+#include "app/BookFileLock.h"
+#include "app/Interruption.h"
+#include "app/Json.h"
+#include "app/Verbs.h"
+#include "import/SourceText.h"
+
+#include <algorithm>
+
+namespace App
+{
+
+namespace fs = std::filesystem;
+
+namespace
+{
+
+constexpr char const * g_BookName = "book.kvbook";
+constexpr char const * g_DefaultTemplate = "novel";
+
+/// One run of `korvane build`: the plan, the import, the book and its PDF, in that order.
+class Build
+{
+public:
+    Build(VerbContext & context, BuildOptions const & options) : m_Context(context), m_Options(options) {}
+
+    int Run()
+    {
+        bool const isGood = ReadPlan() && MakeWorkFolder() && RunLocked();
+        if (Interruption::IsRaised() && !m_Messages.HasErrors()) {
+            m_Messages.Error("interrupted", {}, "Interrupted; what was finished before stays.");
+        }
+        return Report(isGood && !m_Messages.HasErrors());
+    }
+
+private:
+    bool ReadPlan()
+    {
+        m_Plan = Import::ReadBookPlan(m_Options.m_Folder, m_Messages);
+        if (!m_Plan) {
+            return false;
+        }
+        std::string const wanted = !m_Options.m_Template.empty() ? m_Options.m_Template : m_Plan->m_Template;
+        // A path on the command line starts from here, one in the manifest from its folder.
+        fs::path const base = m_Options.m_Template.empty() ? m_Plan->m_Folder : fs::current_path();
+        auto const path = Import::FindTemplate(wanted.empty() ? g_DefaultTemplate : wanted, base, m_Messages);
+        m_Look = path ? Import::ReadTemplate(*path, m_Messages) : std::nullopt;
+        if (!m_Look) {
+            return false;
+        }
+        m_Target = FindTarget();
+        std::error_code error;
+        if (fs::is_directory(m_Target, error)) {
+            m_Messages.Error("output", {m_Target.string()}, "The output is a folder; name a file.");
+            return false;
+        }
+        if (fs::path const parent = m_Target.parent_path(); !fs::is_directory(parent, error)) {
+            m_Messages.Error("output", {m_Target.string()}, "The folder " + parent.string() + " for the output does not exist.");
+            return false;
+        }
+        return true;
+    }
+
+    fs::path FindTarget() const
+    {
+        std::error_code error;
+        if (!m_Options.m_Output.empty()) {
+            return fs::absolute(m_Options.m_Output, error).lexically_normal();
+        }
+        if (!m_Plan->m_OutputFile.empty()) {
+            return (m_Plan->m_Folder / m_Plan->m_OutputFile).lexically_normal();
+        }
+        fs::path folder = m_Plan->m_Folder;
+        folder = folder.filename().empty() ? folder.parent_path() : folder;
+        return m_Plan->m_Folder / (folder.filename().string() + ".pdf");
+    }
+
+    bool MakeWorkFolder()
+    {
+        std::error_code error;
+        m_Work = m_Options.m_Work.empty() ? m_Plan->m_Folder / ".korvane" : fs::absolute(m_Options.m_Work, error).lexically_normal();
+        m_Book = m_Work / g_BookName;
+        fs::create_directories(m_Work, error);
+        if (!fs::is_directory(m_Work, error)) {
+            m_Messages.Error("work-folder", {m_Work.string()}, "The work folder cannot be made; name another with --work.");
+            return false;
+        }
+        return true;
+    }
+
+    /// Hash of what the PDF depends on beside its chapters.
+    std::uint64_t OutputFacts() const
+    {
+        std::string facts = m_Plan->m_Title + '\0' + m_Plan->m_Subtitle + '\0' + m_Plan->AuthorsAsText() + '\0' + m_Plan->m_Language;
+        for (auto const & chapter : m_Plan->m_Chapters) {
+            facts += '\0' + chapter.m_Name + '\0' + chapter.m_Title + '\0' + chapter.m_Part + '\0' + chapter.m_Number;
+        }
+        facts += m_Plan->m_HasMarks ? 'm' : '-';
+        facts += m_Plan->m_IncludesBleed ? 'b' : '-';
+        facts += m_Plan->m_EmbedsMetadata ? 'x' : '-';
+        facts += m_Plan->m_HasTitlePage ? 't' : '-';
+        facts += m_Plan->m_Smart ? 's' : '-';
+        facts += std::to_string(m_Options.m_FixedTime);
+        return Import::HashBytes(facts, m_Look->m_Hash);
+    }
+
+    bool RunLocked()
+    {
+        std::string problem;
+        if (!m_Lock.Take(m_Book, problem)) {
+            m_Messages.Error("book-locked", {m_Book.string()}, problem);
+            return false;
+        }
+        Import::Importer importer(*m_Plan, *m_Look, m_Work, Interruption::Flag());
+        if (!m_Options.m_IsForced && !m_Messages.HasErrors() && importer.IsEverythingCurrent(m_Messages) && IsOutputCurrent(importer.State())) {
+            m_IsUpToDate = true;
+            m_Pages = importer.State().m_Pages;
+            return true;
+        }
+        bool const isImported = importer.Run(m_Chapters, m_Messages, [this](int done, int all) {
+            m_Context.m_Console.Progress("Importing chapters", static_cast<double>(done) / all);
+        });
+        if (!isImported || Interruption::IsRaised()) {
+            return false;
+        }
+        if (std::none_of(m_Chapters.begin(), m_Chapters.end(), [](auto const & chapter) { return !chapter.m_Name.empty(); })) {
+            return false;
+        }
+        return SetBook(importer);
+    }
+
+    bool IsOutputCurrent(Import::WorkState const & state) const
+    {
+        return state.m_OutputFacts == OutputFacts() && state.m_OutputFile == m_Target.string() && state.m_OutputStamp.Exists() &&
+               state.m_OutputStamp == Import::FileStamp::Of(m_Target) && state.m_BookStamp == Import::FileStamp::Of(m_Book);
+    }
+
+    bool SetBook(Import::Importer & importer)
+    {
+        bool isGood = false;
+        {
+            Listener listener(m_Context.m_Console, m_Context.m_Ask, m_Context.m_Answers);
+            {
+                BookSession session(m_Context.m_Console, listener);
+                isGood = OpenBook(session) && MakeOutput(session, listener);
+                if (session.IsOpen()) {
+                    Count(session);
+                }
+            }
+            m_Messages.Append(listener.TakeMessages());
+        }
+        if (isGood && !m_Messages.HasErrors()) {
+            Remember(importer.State());
+        }
+        return isGood;
+    }
+
+    bool OpenBook(BookSession & session)
+    {
+        std::error_code error;
+        if (fs::exists(m_Book, error)) {
+            Import::MessageList trouble;
+            if (session.Open(m_Book.string(), trouble)) {
+                return true;
+            }
+            // The book of a work folder holds nothing that the sources do not say.
+            for (Import::Message const & message : trouble.All()) {
+                m_Messages.Warn(message.m_Kind, message.m_Place, message.m_Text + " The book is made anew.");
+            }
+            if (!fs::remove(m_Book, error)) {
+                m_Messages.Error("book-unreadable", {m_Book.string()}, "The damaged book cannot be removed: " + error.message() + ".");
+                return false;
+            }
+        }
+        session.Create();
+        return session.IsOpen();
+    }
+
+    bool MakeOutput(BookSession & session, Listener & listener)
+    {
+        session.MatchChapters(m_Chapters, m_Plan->m_HasTitlePage);
+        session.RefreshChapters();
+        if (Interruption::IsRaised()) {
+            return false;
+        }
+        m_Context.m_Console.Progress("Updating numbers", 0);
+        m_Passes = session.Update(m_Messages);
+        m_Messages.Append(listener.TakeMessages());
+        if (Interruption::IsRaised() || !session.Save(m_Book.string(), m_Messages)) {
+            return false;
+        }
+        PdfWishes wishes;
+        wishes.m_HasMarks = m_Plan->m_HasMarks;
+        wishes.m_IncludesBleed = m_Plan->m_IncludesBleed;
+        wishes.m_EmbedsMetadata = m_Plan->m_EmbedsMetadata;
+        wishes.m_Language = m_Plan->m_Language;
+        wishes.m_FixedTime = m_Options.m_FixedTime;
+        m_IsWritten = ExportBook(session, listener, m_Target, wishes, m_Messages);
+        return m_IsWritten;
+    }
+
+    void Count(BookSession const & session)
+    {
+        m_Pages = 0;
+        for (auto const & chapter : session.GetChapters()) {
+            m_Pages += chapter->GetPageCount();
+            m_PageCounts[chapter->GetPath().ToStd()] = {chapter->GetCachedStartPage(), chapter->GetPageCount()};
+        }
+    }
+
+    void Remember(Import::WorkState & state)
+    {
+        state.m_OutputFacts = OutputFacts();
+        state.m_OutputFile = m_Target.string();
+        state.m_OutputStamp = Import::FileStamp::Of(m_Target);
+        state.m_BookStamp = Import::FileStamp::Of(m_Book);
+        state.m_Pages = m_Pages;
+        for (auto & [name, chapter] : state.m_Chapters) {
+            chapter.m_DocumentStamp = Import::FileStamp::Of(m_Work / chapter.m_Document);
+        }
+        std::string problem;
+        if (!state.Save(m_Work, problem)) {
+            m_Messages.Warn("work-folder", {m_Work.string()}, "The work folder's memory could not be written (" + problem + "); the next run takes longer.");
+        }
+    }
+
+    int Report(bool isGood)
+    {
+        Console & console = m_Context.m_Console;
+        console.EndProgress();
+        if (console.Settings().m_IsJson) {
+            Json chapters = Json::array();
+            for (Import::ImportedChapter const & chapter : m_Chapters) {
+                auto const & [start, count] = m_PageCounts[chapter.m_Document.string()];
+                chapters.push_back({{"source", chapter.m_Name}, {"title", chapter.m_Title}, {"document", chapter.m_Document.string()},
+                                    {"imported", chapter.m_IsFresh}, {"startPage", start}, {"pageCount", count}});
+            }
+            console.SayResult(Print({{"ok", isGood}, {"upToDate", m_IsUpToDate}, {"output", m_Target.string()}, {"book", m_Book.string()},
+                                     {"pages", m_Pages}, {"passes", m_Passes}, {"chapters", chapters}, {"messages", ToJson(m_Messages)}}));
+        }
+        console.Tell(m_Messages);
+        if (m_IsUpToDate) {
+            console.Say(m_Target.string() + " is up to date (" + std::to_string(m_Pages) + " pages)");
+        } else if (m_IsWritten) {
+            auto const fresh = std::count_if(m_Chapters.begin(), m_Chapters.end(), [](auto const & chapter) { return chapter.m_IsFresh; });
+            console.Say("Wrote " + m_Target.string() + ": " + std::to_string(m_Pages) + " pages, " + std::to_string(fresh) + " of " +
+                        std::to_string(m_Chapters.size()) + " documents made anew");
+        }
+        return isGood ? ExitFine : ExitFailed;
+    }
+
+    VerbContext & m_Context;
+    BuildOptions const & m_Options;
+    Import::MessageList m_Messages;
+    std::optional<Import::BookPlan> m_Plan;
+    std::optional<Import::Template> m_Look;
+    fs::path m_Target;
+    fs::path m_Work;
+    fs::path m_Book;
+    BookFileLock m_Lock;
+    std::vector<Import::ImportedChapter> m_Chapters;
+    std::map<std::string, std::pair<int, int>> m_PageCounts;
+    int m_Pages = 0;
+    int m_Passes = 0;
+    bool m_IsUpToDate = false;
+    bool m_IsWritten = false;
+};
+
+}
+
+int RunBuild(VerbContext & context, BuildOptions const & options)
+{
+    return Build(context, options).Run();
+}
+
+}

@@ -1,0 +1,129 @@
+#include "app/Console.h"
+
+#include <algorithm>
+#include <ostream>
+#include <tuple>
+
+namespace App
+{
+
+namespace
+{
+
+constexpr int g_MessagesOfOneKind = 5;
+constexpr int g_BarWidth = 30;
+
+}
+
+Console::Console(std::ostream & out, std::ostream & err, ConsoleSettings settings) :
+    m_Out(out), m_Err(err), m_Settings(settings)
+{
+}
+
+Console::~Console()
+{
+    EndProgress();
+}
+
+void Console::EraseBar()
+{
+    if (m_HasBar) {
+        m_Err << "\r\x1b[K" << std::flush;
+        m_HasBar = false;
+    }
+}
+
+void Console::Say(std::string const & line)
+{
+    std::lock_guard const lock(m_Lock);
+    if (!m_Settings.m_IsQuiet && !m_Settings.m_IsJson) {
+        EraseBar();
+        m_Out << line << '\n' << std::flush;
+    }
+}
+
+void Console::SayResult(std::string const & text)
+{
+    std::lock_guard const lock(m_Lock);
+    EraseBar();
+    m_Out << text;
+    if (!text.ends_with('\n')) {
+        m_Out << '\n';
+    }
+    m_Out << std::flush;
+}
+
+void Console::Tell(Import::Message const & message)
+{
+    std::lock_guard const lock(m_Lock);
+    bool const isError = Import::Severity::Error == message.m_Severity;
+    if (isError || !m_Settings.m_IsQuiet) {
+        EraseBar();
+        m_Err << Import::ToText(message) << '\n' << std::flush;
+    }
+}
+
+void Console::Tell(Import::MessageList const & messages)
+{
+    if (m_Settings.m_IsJson) {
+        return;
+    }
+    using Key = std::tuple<std::string, std::string>;
+    std::map<Key, int> counts;
+    std::vector<Key> order;
+    for (Import::Message const & message : messages.All()) {
+        Key const key{message.m_Place.m_File, message.m_Kind};
+        int const count = ++counts[key];
+        if (count <= g_MessagesOfOneKind || Import::Severity::Error == message.m_Severity) {
+            Tell(message);
+        } else if (g_MessagesOfOneKind + 1 == count) {
+            order.push_back(key);
+        }
+    }
+    for (Key const & key : order) {
+        int const more = counts[key] - g_MessagesOfOneKind;
+        Tell({Import::Severity::Note, std::get<1>(key), {std::get<0>(key)},
+              std::to_string(more) + " more of this kind (" + std::get<1>(key) + "); --json lists them all."});
+    }
+}
+
+void Console::Error(std::string const & text)
+{
+    Tell({Import::Severity::Error, "", {"korvane"}, text});
+}
+
+void Console::Progress(std::string const & step, double fraction)
+{
+    std::lock_guard const lock(m_Lock);
+    if (m_Settings.m_IsQuiet || m_Settings.m_IsJson) {
+        return;
+    }
+    int const percent = static_cast<int>(std::clamp(fraction, 0.0, 1.0) * 100);
+    if (!m_Settings.m_IsTerminal) {
+        // Lines for logs: each step once.
+        if (step != m_Step) {
+            m_Step = step;
+            m_Err << step << "...\n" << std::flush;
+        }
+        return;
+    }
+    if (step == m_Step && percent == m_Percent && m_HasBar) {
+        return;
+    }
+    m_Step = step;
+    m_Percent = percent;
+    m_HasBar = true;
+    int const filled = percent * g_BarWidth / 100;
+    m_Err << "\r\x1b[K" << step << " [" << std::string(static_cast<std::size_t>(filled), '#')
+          << std::string(static_cast<std::size_t>(g_BarWidth - filled), ' ') << "] " << percent << '%' << std::flush;
+}
+
+void Console::EndProgress()
+{
+    std::lock_guard const lock(m_Lock);
+    EraseBar();
+    m_Step.clear();
+    m_Percent = -1;
+}
+
+}

@@ -1,0 +1,60 @@
+#pragma once
+
+#include "import/Message.h"
+
+#include <iosfwd>
+#include <map>
+#include <mutex>
+#include <string>
+
+namespace App
+{
+
+/// How much the program says, and in what form.
+struct ConsoleSettings
+{
+    bool m_IsQuiet = false;
+    /// The result is one JSON document on the output; nothing else goes there.
+    bool m_IsJson = false;
+    /// The error stream is a terminal: progress is a bar that redraws itself.
+    bool m_IsTerminal = false;
+};
+
+/// What the program says to its user. Results go to the output, messages and progress to the error stream. Safe on any
+/// thread.
+class Console
+{
+public:
+    Console(std::ostream & out, std::ostream & err, ConsoleSettings settings);
+    ~Console();
+
+    [[nodiscard]] ConsoleSettings const & Settings() const { return m_Settings; }
+
+    /// A line of the result; nothing when the result is JSON or quiet.
+    void Say(std::string const & line);
+    /// The result itself, whatever the settings.
+    void SayResult(std::string const & text);
+    /// An error or warning; warnings are left out when quiet.
+    void Tell(Import::Message const & message);
+    /// Messages of one kind about one file beyond the first few are counted instead, unless the result is JSON, where
+    /// the whole list stands in it and none is printed.
+    void Tell(Import::MessageList const & messages);
+    void Error(std::string const & text);
+    /// Progress of a step: `fraction` from 0 to 1.
+    void Progress(std::string const & step, double fraction);
+    /// Takes the progress bar away, before other output and at the end.
+    void EndProgress();
+
+private:
+    void EraseBar();
+
+    std::mutex m_Lock;
+    std::ostream & m_Out;
+    std::ostream & m_Err;
+    ConsoleSettings m_Settings;
+    std::string m_Step;
+    int m_Percent = -1;
+    bool m_HasBar = false;
+};
+
+}

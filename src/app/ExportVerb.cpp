@@ -1,0 +1,92 @@
+#include "app/BookExport.h"
+#include "app/BookFileLock.h"
+#include "app/Interruption.h"
+#include "app/Json.h"
+#include "app/Verbs.h"
+#include "core/BookChapter.h"
+#include "framework/document/DocumentMetadata.h"
+
+namespace App
+{
+
+namespace fs = std::filesystem;
+
+namespace
+{
+
+/// The language of the first chapter that names one.
+std::string LanguageOf(BookSession const & session)
+{
+    for (auto const & chapter : session.GetChapters()) {
+        auto const metadata = chapter->GetMetadata();
+        if (metadata && !metadata->GetLanguage().Empty()) {
+            return metadata->GetLanguage().ToStd();
+        }
+    }
+    return {};
+}
+
+}
+
+int RunExport(VerbContext & context, ExportOptions const & options)
+{
+    Import::MessageList messages;
+    std::error_code error;
+    fs::path const book = fs::absolute(options.m_Book, error).lexically_normal();
+    fs::path const target = fs::absolute(options.m_Output, error).lexically_normal();
+    BookFileLock lock;
+    std::string problem;
+    int pages = 0;
+    bool isGood = false;
+    if (!fs::is_regular_file(book, error)) {
+        messages.Error("book-missing", {options.m_Book}, "There is no such book file.");
+    } else if (!fs::is_directory(target.parent_path(), error)) {
+        messages.Error("output", {target.string()}, "The folder for the output does not exist.");
+    } else if (!lock.Take(book, problem)) {
+        messages.Error("book-locked", {options.m_Book}, problem);
+    } else {
+        Listener listener(context.m_Console, context.m_Ask, context.m_Answers);
+        BookSession session(context.m_Console, listener);
+        isGood = session.Open(book.string(), messages);
+        if (isGood) {
+            session.RefreshChapters();
+            if (session.GetChapters().empty()) {
+                messages.Error("book-empty", {options.m_Book}, "The book has no chapters, so there is nothing to write.");
+                isGood = false;
+            }
+        }
+        if (isGood && !options.m_SkipsUpdates) {
+            session.Update(messages);
+            isGood = session.Save(book.string(), messages);
+        }
+        if (isGood && !Interruption::IsRaised()) {
+            PdfWishes wishes;
+            wishes.m_HasMarks = options.m_HasMarks;
+            wishes.m_IncludesBleed = options.m_IncludesBleed;
+            wishes.m_Language = LanguageOf(session);
+            wishes.m_FixedTime = options.m_FixedTime;
+            isGood = ExportBook(session, listener, target, wishes, messages);
+            for (auto const & chapter : session.GetChapters()) {
+                pages += chapter->GetExportingPageCount();
+            }
+        }
+        messages.Append(listener.TakeMessages());
+    }
+    if (Interruption::IsRaised() && !messages.HasErrors()) {
+        messages.Error("interrupted", {}, "Interrupted; the PDF was not written.");
+    }
+    isGood = isGood && !messages.HasErrors();
+
+    Console & console = context.m_Console;
+    console.EndProgress();
+    if (console.Settings().m_IsJson) {
+        console.SayResult(Print({{"ok", isGood}, {"output", target.string()}, {"book", book.string()}, {"pages", pages}, {"messages", ToJson(messages)}}));
+    }
+    console.Tell(messages);
+    if (isGood) {
+        console.Say("Wrote " + target.string() + ": " + std::to_string(pages) + " pages");
+    }
+    return isGood ? ExitFine : ExitFailed;
+}
+
+}

@@ -1,0 +1,88 @@
+#include "app/BookFileLock.h"
+#include "app/Interruption.h"
+#include "app/Json.h"
+#include "app/Verbs.h"
+#include "import/Importer.h"
+
+namespace App
+{
+
+namespace fs = std::filesystem;
+
+namespace
+{
+
+/// A plan of single files, in the order in which they were named.
+std::optional<Import::BookPlan> PlanFiles(std::vector<std::string> const & sources, Import::MessageList & messages)
+{
+    Import::BookPlan plan;
+    plan.m_HasTitlePage = false;
+    std::error_code error;
+    plan.m_Folder = fs::absolute(sources.front(), error).lexically_normal().parent_path();
+    for (std::string const & source : sources) {
+        fs::path const path = fs::absolute(source, error).lexically_normal();
+        if (fs::is_directory(path, error)) {
+            messages.Error("source", {source}, "A folder has to be the only source; name files otherwise.");
+        } else {
+            Import::AddChapter(plan, path.string(), {source}, messages);
+        }
+    }
+    if (plan.m_Chapters.empty()) {
+        return std::nullopt;
+    }
+    return plan;
+}
+
+}
+
+int RunImport(VerbContext & context, ImportOptions const & options)
+{
+    Import::MessageList messages;
+    std::error_code error;
+    bool const isFolder = 1 == options.m_Sources.size() && fs::is_directory(options.m_Sources.front(), error);
+    auto const plan = isFolder ? Import::ReadBookPlan(options.m_Sources.front(), messages) : PlanFiles(options.m_Sources, messages);
+    std::optional<Import::Template> look;
+    if (plan) {
+        std::string const name = !options.m_Template.empty() ? options.m_Template : plan->m_Template.empty() ? "novel" : plan->m_Template;
+        auto const path = Import::FindTemplate(name, options.m_Template.empty() ? plan->m_Folder : fs::current_path(), messages);
+        look = path ? Import::ReadTemplate(*path, messages) : std::nullopt;
+    }
+
+    std::vector<Import::ImportedChapter> chapters;
+    bool isGood = plan && look;
+    if (isGood) {
+        fs::path const work = options.m_Output.empty() ? plan->m_Folder / ".korvane" : fs::absolute(options.m_Output, error).lexically_normal();
+        fs::create_directories(work, error);
+        BookFileLock lock;
+        std::string problem;
+        if (lock.Take(work / "book.kvbook", problem)) {
+            Import::Importer importer(*plan, *look, work, Interruption::Flag());
+            isGood = importer.Run(chapters, messages, [&](int done, int all) {
+                context.m_Console.Progress("Importing chapters", static_cast<double>(done) / all);
+            });
+        } else {
+            messages.Error("work-folder", {work.string()}, problem);
+        }
+    }
+    if (Interruption::IsRaised()) {
+        messages.Error("interrupted", {}, "Interrupted; documents that were finished stay.");
+    }
+    isGood = isGood && !messages.HasErrors();
+
+    Console & console = context.m_Console;
+    console.EndProgress();
+    if (console.Settings().m_IsJson) {
+        Json list = Json::array();
+        for (Import::ImportedChapter const & chapter : chapters) {
+            list.push_back({{"source", chapter.m_Name}, {"title", chapter.m_Title}, {"document", chapter.m_Document.string()}, {"imported", chapter.m_IsFresh}});
+        }
+        console.SayResult(Print({{"ok", isGood}, {"chapters", list}, {"messages", ToJson(messages)}}));
+    }
+    console.Tell(messages);
+    for (Import::ImportedChapter const & chapter : chapters) {
+        console.Say(chapter.m_Document.string() + (chapter.m_IsFresh ? "" : " (unchanged)"));
+    }
+    return isGood ? ExitFine : ExitFailed;
+}
+
+}

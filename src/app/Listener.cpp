@@ -1,0 +1,159 @@
+#include "app/Listener.h"
+
+#include "core/BookCollection.h"
+#include "core/BookNotification.h"
+#include "core/BookSavedNotification.h"
+#include "core/ChapterFileNotifications.h"
+#include "framework/document/DocumentNotifications.h"
+#include "framework/document/DocumentPromptNotification.h"
+#include "framework/document/OpenDocumentFailedNotification.h"
+#include "framework/document/RequestPdfPasswordsNotification.h"
+#include "framework/kernel/CommandNotifications.h"
+#include "import/SaveFailure.h"
+#include "output/ExportBookCompleteNotification.h"
+
+#include <algorithm>
+
+namespace App
+{
+
+namespace
+{
+
+bool IsYes(std::string const & answer)
+{
+    return "y" == answer || "Y" == answer || "yes" == answer;
+}
+
+}
+
+Listener::Listener(Console & console, AskUser ask, StandingAnswers answers) :
+    m_Console(console), m_Ask(std::move(ask)), m_Answers(answers)
+{
+    BroadcastNotification::RegisterBroadcastSink(this);
+}
+
+Listener::~Listener()
+{
+    BroadcastNotification::UnregisterBroadcastSink(this);
+}
+
+void Listener::Add(Import::Severity severity, char const * kind, std::string const & file, std::string const & text)
+{
+    std::lock_guard const lock(m_Lock);
+    m_Messages.Add(severity, kind, {file}, text);
+}
+
+Import::MessageList Listener::TakeMessages()
+{
+    std::lock_guard const lock(m_Lock);
+    return std::exchange(m_Messages, {});
+}
+
+Kernel::Counted<Book::ExportBookCompleteNotification const> Listener::GetExport() const
+{
+    std::lock_guard const lock(m_Lock);
+    return m_Export;
+}
+
+bool Listener::WasSaved() const
+{
+    std::lock_guard const lock(m_Lock);
+    return m_WasSaved;
+}
+
+void Listener::Forget()
+{
+    std::lock_guard const lock(m_Lock);
+    m_Export.Reset();
+    m_WasSaved = false;
+}
+
+void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
+{
+    using Import::Severity;
+    Kernel::Notification const * const heard = notification.Get();
+    if (auto const * progress = dynamic_cast<CommandProgressNotification const *>(heard)) {
+        m_Console.Progress(progress->GetDescription().ToStd(), progress->GetFraction());
+    } else if (auto const * closed = dynamic_cast<Book::BookClosedNotification const *>(heard)) {
+        Book::BookCollection::GetInstance().RemoveBookController(closed->GetBookController());
+    } else if (auto const * saved = dynamic_cast<Book::BookSavedNotification const *>(heard)) {
+        if (!saved->GetResult().IsSuccess()) {
+            Add(Severity::Error, "book-unsaved", saved->GetPath().ToStd(),
+                Import::DescribeSaveFailure(saved->GetResult(), saved->GetPath().ToStd()));
+        }
+        std::lock_guard const lock(m_Lock);
+        m_WasSaved = saved->GetResult().IsSuccess();
+    } else if (auto const * exported = dynamic_cast<Book::ExportBookCompleteNotification const *>(heard)) {
+        std::lock_guard const lock(m_Lock);
+        m_Export = Kernel::Counted<Book::ExportBookCompleteNotification const>(exported);
+    } else if (auto const * failed = dynamic_cast<OpenDocumentFailedNotification const *>(heard)) {
+        for (String const & warning : failed->GetWarnings()) {
+            Add(Severity::Warning, "document-warning", failed->GetPath().ToStd(), warning.ToStd());
+        }
+        if (OpenDocumentFailedNotification::Success != failed->GetResult()) {
+            Add(Severity::Error, "document-unreadable", failed->GetPath().ToStd(), failed->GetReason().ToStd());
+        }
+    } else if (auto const * broken = dynamic_cast<CommandFailedNotification const *>(heard)) {
+        Add(Severity::Error, "command-failed", "", broken->GetDescription().ToStd() + " failed: " + broken->GetReason().ToStd());
+    } else if (auto const * lost = dynamic_cast<DocumentSaveFailedNotification const *>(heard)) {
+        std::string const kept = lost->GetKeptPath().Empty() ? std::string() : " Its content is kept in " + lost->GetKeptPath().ToStd() + ".";
+        Add(Severity::Error, "document-unsaved", lost->GetPath().ToStd(), lost->GetReason().ToStd() + kept);
+    } else if (auto const * permission = dynamic_cast<Book::PromptFixBookPermissionsNotification const *>(heard)) {
+        AnswerPermission(*permission);
+    } else if (auto const * file = dynamic_cast<Book::ChooseChapterFileNotification const *>(heard)) {
+        AnswerFile(*file);
+    } else if (auto const * prompt = dynamic_cast<DocumentPromptNotification const *>(heard)) {
+        AnswerPrompt(*prompt);
+    } else if (auto const * passwords = dynamic_cast<RequestPdfPasswordsNotification const *>(heard)) {
+        Add(Severity::Warning, "password", "", "A placed PDF is protected by a password and stays closed.");
+        passwords->Answer({});
+    }
+}
+
+bool Listener::Ask(std::string const & question, char const * option, std::string & answer)
+{
+    m_Console.EndProgress();
+    if (m_Ask && m_Ask(question, answer)) {
+        return true;
+    }
+    Add(Import::Severity::Warning, "unanswered", "",
+        question + " Nobody can be asked here, so the answer is no; " + option + " answers it beforehand.");
+    return false;
+}
+
+void Listener::AnswerPrompt(DocumentPromptNotification const & prompt)
+{
+    bool const isMissing = nullptr != dynamic_cast<Book::PromptMissingChapterFileNotification const *>(&prompt);
+    StandingAnswers::Choice const standing = isMissing ? m_Answers.m_Locate : m_Answers.m_Upgrade;
+    bool isYes = StandingAnswers::Choice::Yes == standing;
+    if (StandingAnswers::Choice::Ask == standing) {
+        std::string answer;
+        std::string const title = prompt.GetTitle().Empty() ? std::string() : prompt.GetTitle().ToStd() + ": ";
+        isYes = Ask(title + prompt.GetMessage().ToStd() + " [y/N]", isMissing ? "--locate or --no-locate" : "--upgrade or --no-upgrade", answer) && IsYes(answer);
+    }
+    auto const choices = static_cast<unsigned>(prompt.GetChoices());
+    auto const pick = [choices](DocumentPromptChoice first, DocumentPromptChoice second) {
+        return 0 != (choices & first) ? first : 0 != (choices & second) ? second : PromptNothing;
+    };
+    prompt.Answer(isYes ? pick(PromptYes, PromptOk) : pick(PromptNo, PromptCancel));
+}
+
+void Listener::AnswerFile(Book::ChooseChapterFileNotification const & prompt)
+{
+    std::string answer;
+    std::string const question = prompt.GetTitle().ToStd() + " (" + prompt.GetCurrentPath().ToStd() + "):";
+    if (!m_Ask || !m_Ask(question, answer)) {
+        answer.clear();
+    }
+    prompt.ProcessResponse(String(answer));
+}
+
+void Listener::AnswerPermission(Book::PromptFixBookPermissionsNotification const & prompt)
+{
+    Add(Import::Severity::Error, "chapter-denied", prompt.GetChapterPath().ToStd(),
+        "The chapter's file may not be read; give yourself the right to read it and try again.");
+    prompt.IgnoreAll();
+}
+
+}

@@ -1,0 +1,155 @@
+#include "app/BookSession.h"
+#include "app/DescribeDocument.h"
+#include "app/Verbs.h"
+#include "core/BookChapter.h"
+#include "framework/document/DocumentController.h"
+#include "framework/document/OpenDocumentFailedNotification.h"
+#include "framework/kernel/FileSystem.h"
+
+#include <fstream>
+
+namespace App
+{
+
+namespace fs = std::filesystem;
+
+namespace
+{
+
+enum class FileKind
+{
+    Missing,
+    Book,
+    Document,
+    Other
+};
+
+/// The kind of a file by its first bytes, whatever its name says.
+FileKind KindOf(fs::path const & path)
+{
+    std::error_code error;
+    if (!fs::is_regular_file(path, error)) {
+        return FileKind::Missing;
+    }
+    char head[128] = {};
+    std::ifstream(path, std::ios::binary).read(head, sizeof head);
+    std::string_view const view(head, sizeof head);
+    return std::string_view::npos != view.find("KvBk")   ? FileKind::Book
+           : std::string_view::npos != view.find("KvDc") ? FileKind::Document
+                                                         : FileKind::Other;
+}
+
+Json DescribeBook(BookSession const & session, fs::path const & path)
+{
+    auto const & book = session.GetBook();
+    auto const settings = book->GetSynchroniseSettings();
+    Json chapters = Json::array();
+    int index = 0;
+    for (auto const & chapter : session.GetChapters()) {
+        chapters.push_back({{"index", index++},
+                            {"name", chapter->GetName().ToStd()},
+                            {"path", chapter->GetPath().ToStd()},
+                            {"key", chapter->IsKey()},
+                            {"pages", chapter->DescribePages().ToStd()},
+                            {"startFromPage", chapter->GetStartFromPage()}});
+    }
+    return {{"kind", "book"},
+            {"path", path.string()},
+            {"name", book->GetName(1, false).ToStd()},
+            {"padStrays", book->IsPadStrays()},
+            {"mergeStrays", book->IsMergeStrays()},
+            {"synchronise",
+             {{"swatches", settings.m_Swatches}, {"textStyles", settings.m_TextStyles}, {"tableStyles", settings.m_TableStyles}, {"masterPages", settings.m_MasterPages}}},
+            {"chapters", chapters}};
+}
+
+/// A few lines for people; the whole is in the JSON.
+std::vector<std::string> Summarise(Json const & json)
+{
+    std::vector<std::string> lines;
+    if ("book" == json.at("kind")) {
+        lines.push_back("Book " + json.at("name").get<std::string>() + ", " + std::to_string(json.at("chapters").size()) + " chapters");
+        for (Json const & chapter : json.at("chapters")) {
+            lines.push_back("  " + std::to_string(chapter.at("index").get<int>() + 1) + "  " + chapter.at("name").get<std::string>() +
+                            (chapter.at("key").get<bool>() ? " (style source)" : ""));
+        }
+        return lines;
+    }
+    Json const & metadata = json.at("metadata");
+    lines.push_back("Document \"" + metadata.at("title").get<std::string>() + "\", language " + metadata.at("language").get<std::string>());
+    lines.push_back("  " + std::to_string(json.at("pageCount").get<int>()) + " pages on " + std::to_string(json.at("spreads").size()) + " spreads, " +
+                    std::to_string(json.at("sections").size()) + " sections, " + std::to_string(json.at("styles").at("paragraph").size()) + " paragraph styles");
+    for (Json const & section : json.at("sections")) {
+        lines.push_back("  section at page index " + std::to_string(section.at("startPageIndex").get<int>()) + ", number " +
+                        std::to_string(section.at("startNumber").get<int>()) + (section.at("restart").get<bool>() ? ", restarts" : "") +
+                        (section.at("included").get<bool>() ? "" : ", left out of output"));
+    }
+    for (Json const & story : json.at("stories")) {
+        lines.push_back("  story of " + std::to_string(story.at("paragraphs").size()) + " paragraphs in " +
+                        std::to_string(story.at("frameCount").get<int>()) + " frames, " + std::to_string(story.at("notes").size()) + " notes");
+    }
+    return lines;
+}
+
+}
+
+int RunShow(VerbContext & context, std::string const & file)
+{
+    Import::MessageList messages;
+    Console & console = context.m_Console;
+    std::error_code error;
+    fs::path const path = fs::absolute(file, error).lexically_normal();
+    Json json;
+    switch (KindOf(path)) {
+    case FileKind::Missing:
+        messages.Error("file-missing", {file}, "There is no such file.");
+        break;
+    case FileKind::Other:
+        messages.Error("file-foreign", {file}, "This is neither a book (.kvbook) nor a document (.kvdoc).");
+        break;
+    case FileKind::Book: {
+        StandingAnswers answers;
+        answers.m_Locate = StandingAnswers::Choice::No;
+        answers.m_Upgrade = StandingAnswers::Choice::No;
+        Listener listener(console, nullptr, answers);
+        BookSession session(console, listener);
+        if (session.Open(path.string(), messages)) {
+            json = DescribeBook(session, path);
+        }
+        messages.Append(listener.TakeMessages());
+        break;
+    }
+    case FileKind::Document: {
+        auto const document = Kernel::MakeCounted<DocumentController>();
+        OpenDocumentFailedNotification failure(String(path.string()), false);
+        if (document->LoadDocument(String(path.string()), false, true, LoadWhole, nullptr, failure, false)) {
+            json = DescribeDocument(*document);
+            json["path"] = path.string();
+        } else {
+            std::string const place = failure.GetPlace().Empty() ? std::string() : " (" + failure.GetPlace().ToStd() + ")";
+            messages.Error("document-unreadable", {file}, failure.GetReason().ToStd() + place);
+        }
+        break;
+    }
+    }
+
+    bool const isGood = !json.is_null() && !messages.HasErrors();
+    console.EndProgress();
+    if (console.Settings().m_IsJson) {
+        Json result{{"ok", isGood}};
+        if (!json.is_null()) {
+            result.update(json);
+        }
+        result["messages"] = ToJson(messages);
+        console.SayResult(Print(result));
+    }
+    console.Tell(messages);
+    if (!json.is_null()) {
+        for (std::string const & line : Summarise(json)) {
+            console.Say(line);
+        }
+    }
+    return isGood ? ExitFine : ExitFailed;
+}
+
+}
