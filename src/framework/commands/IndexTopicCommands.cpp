@@ -1,6 +1,9 @@
 #include "framework/commands/IndexTopicCommands.h"
 
 #include "framework/commands/CommandException.h"
+#include "framework/story/SpecialGlyphs.h"
+
+#include <map>
 
 namespace
 {
@@ -22,13 +25,49 @@ void IndexTopicCommand::Do()
 {
     Story::Index & index = *Tree().GetIndex();
     std::shared_ptr<Story::Index::Content const> before = index.GetContent();
+    std::vector<std::pair<Kernel::Counted<Story::IndexTopic const>, String>> oldNames;
+    for (Kernel::JailCounted<Story::IndexTopic> const & topic : index) {
+        oldNames.emplace_back(topic, topic->GetNameWithParents());
+    }
     Change(index);
     m_Before = std::move(before);
+    RenameMarks(oldNames);
 }
 
 void IndexTopicCommand::Undo()
 {
     Tree().GetIndex()->SetContent(m_Before);
+    for (ChangedMark const & mark : m_ChangedMarks) {
+        mark.m_Flow->GetStory()->ReplaceGlyph(mark.m_Offset, mark.m_Glyph);
+        GetDocument()->SetTextDirty();
+    }
+}
+
+void IndexTopicCommand::RenameMarks(std::vector<std::pair<Kernel::Counted<Story::IndexTopic const>, String>> const & oldNames)
+{
+    m_ChangedMarks.clear();
+    std::map<String, String> renamed;
+    for (auto const & [topic, oldName] : oldNames) {
+        if (String const name = topic->GetNameWithParents(); name != oldName) {
+            renamed.emplace(oldName, name);
+        }
+    }
+    if (renamed.empty()) {
+        return;
+    }
+    for (Kernel::Counted<TextFlow> const & flow : Tree().GetTextFlows()) {
+        Story::Story & story = *flow->GetStory();
+        for (std::size_t i = 0; i < story.GetObjects().size(); ++i) {
+            Story::Story::Object const object = story.GetObjects()[i];
+            auto const * const mark = dynamic_cast<Story::IndexMarkGlyph const *>(object.m_Glyph.Get());
+            auto const found = mark ? renamed.find(mark->GetTopicNameWithParents()) : renamed.end();
+            if (found != renamed.end()) {
+                m_ChangedMarks.push_back({flow, object.m_Offset, object.m_Glyph});
+                story.ReplaceGlyph(object.m_Offset, Kernel::MakeCounted<Story::IndexMarkGlyph>(found->second));
+                GetDocument()->SetTextDirty();
+            }
+        }
+    }
 }
 
 void IndexTopicCommand::Notify(std::vector<Kernel::Counted<Kernel::Notification>> & notifications)

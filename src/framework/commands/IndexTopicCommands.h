@@ -19,7 +19,19 @@ protected:
                                                                         Kernel::Counted<Story::IndexTopic const> const & topic);
 
 private:
+    /// Marks in the text name their topic in full: brings those that a change of names has left behind in step. Marks
+    /// within notes and tables keep the old name, which then has no topic.
+    void RenameMarks(std::vector<std::pair<Kernel::Counted<Story::IndexTopic const>, String>> const & oldNames);
+
+    struct ChangedMark
+    {
+        Kernel::Counted<TextFlow> m_Flow;
+        std::size_t m_Offset;
+        Kernel::Counted<Story::Glyph const> m_Glyph;
+    };
+
     std::shared_ptr<Story::Index::Content const> m_Before;
+    std::vector<ChangedMark> m_ChangedMarks;
 };
 
 /// Adds topics; those whose GUID is taken are left out.
@@ -65,7 +77,7 @@ protected:
     void Change(Story::Index & index) override;
 };
 
-/// Marks in the text follow: they name their topic in full.
+/// Marks in the text follow.
 class RenameIndexTopicCommand : public SetIndexTopicTextCommand
 {
 public:

@@ -94,7 +94,6 @@ Kernel::Counted<DocumentController> DocumentController::CreateDocument(DocumentS
                                                                        Kernel::Counted<Story::Story> story)
 {
     Kernel::Counted<DocumentController> document = Kernel::MakeCounted<DocumentController>();
-    document->m_Document->SetSections(settings.m_Sections);
     document->ReplaceContent(settings, std::move(story));
     document->m_Loaded = true;
     return document;
@@ -106,7 +105,11 @@ void DocumentController::ReplaceContent(DocumentSettings const & settings, Kerne
     m_History.Clear();
     // A section that is still there keeps the number that its book gave it.
     std::map<unsigned int, unsigned int> numbers;
+    bool const isNew = !m_Document->GetMainFlow();
     for (Kernel::Counted<DocumentSection const> const & section : m_Document->GetAllSections()) {
+        if (isNew) {
+            break;
+        }
         numbers.emplace(section->GetStartPageIndex(), section->GetStartNumberingAt());
     }
     std::vector<DocumentSection::Values> sections = settings.m_Sections;

@@ -2,6 +2,7 @@
 
 #include "framework/document/DocumentPictures.h"
 #include "framework/document/DocumentSection.h"
+#include "framework/document/MasterSpreadNode.h"
 #include "framework/document/Node.h"
 #include "framework/document/PageSetup.h"
 #include "framework/document/Swatches.h"
@@ -10,9 +11,6 @@
 #include "framework/story/StyleSheet.h"
 
 #include <vector>
-
-class MasterSpreadNode;
-class SpreadNode;
 
 /// Root of a document's tree: its spreads, masters, sections, styles and text flows.
 ///
