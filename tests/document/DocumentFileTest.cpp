@@ -165,7 +165,7 @@ TEST(DocumentFileTest, EachUselessFileHasItsOwnFailure)
     MakeRichBuilder().BuildFile(good);
     std::string const bytes = folder.ReadFile("good.kvdoc");
     std::string damaged = bytes;
-    for (std::size_t i = bytes.size() / 3; i < bytes.size() / 3 + 64; ++i) {
+    for (std::size_t i = 300; i < 364; ++i) {
         damaged[i] = static_cast<char>(~damaged[i]);
     }
     std::filesystem::create_directory(std::string(folder.GetPath().View()) + "/folder.kvdoc");
@@ -213,6 +213,25 @@ TEST(DocumentFileTest, EveryChangedByteIsEitherHarmlessOrRefused)
             EXPECT_NE(result, Failure::Success) << "byte " << i;
         }
     }
+}
+
+TEST(DocumentFileTest, DamagedGlyphsAreSetAnew)
+{
+    TemporaryFolder const folder;
+    DocumentBuilder builder = MakeRichBuilder();
+    builder.BuildFile(folder / "good.kvdoc");
+    std::string bytes = folder.ReadFile("good.kvdoc");
+    // The glyphs are by far the greatest part of the file.
+    for (std::size_t i = bytes.size() / 2; i < bytes.size() / 2 + 64; ++i) {
+        bytes[i] = static_cast<char>(~bytes[i]);
+    }
+    Kernel::Counted<DocumentController> const document = LoadTestDocument(folder.WriteFile("damaged.kvdoc", bytes), nullptr);
+    ASSERT_TRUE(document);
+    int const pages = document->GetDocument()->GetPageCount();
+    EXPECT_FALSE(document->GetDocument()->GetMainFlow()->EnsureGlyphData());
+    document->EnsureGlyphs();
+    EXPECT_TRUE(document->GetDocument()->GetMainFlow()->EnsureGlyphData());
+    EXPECT_EQ(document->GetDocument()->GetPageCount(), pages);
 }
 
 TEST(DocumentFileTest, LocksKeepOthersOut)

@@ -54,6 +54,10 @@ enum ExportResult ExportItemCommandBase::ExportPDFPage(Renderer::RenderTree::Pdf
         return ExportResultAborted;
     }
     ExportableInterface::ExportParams const & page = params[static_cast<std::size_t>(index)];
+    if (!m_GlyphsEnsured) {
+        GetDocument()->EnsureGlyphs();
+        m_GlyphsEnsured = true;
+    }
     std::vector<Renderer::PdfHyperlink> links;
     {
         DocumentControllerSession const session(Kernel::NonCounted<DocumentController const>(GetDocument().Get()));

@@ -59,6 +59,7 @@ private:
     Kernel::Counted<Kernel::Progress> m_Progress;
     Kernel::Counted<Raster::DynamicBitmap> m_PreviewBitmap;
     Kernel::Consolidated<Raster::ICCProfile> m_PreviewProfile;
+    bool m_GlyphsEnsured = false;
     bool const m_HasReporter;
     bool const m_IsFinal;
     bool const m_MakePreview;

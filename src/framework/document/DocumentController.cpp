@@ -133,6 +133,19 @@ ComposeOutcome DocumentController::ComposeText(bool force, bool * abort)
     return outcome;
 }
 
+void DocumentController::EnsureGlyphs()
+{
+    AcquireReaderLock();
+    auto const & flows = m_Document->GetTextFlows();
+    bool const complete = std::all_of(flows.begin(), flows.end(), [](auto const & flow) { return flow->EnsureGlyphData(); });
+    ReleaseReaderLock();
+    if (!complete) {
+        AcquireWriterLock();
+        ComposeText(true, nullptr);
+        ReleaseWriterLock();
+    }
+}
+
 void DocumentController::UpdateRunningHeads()
 {
     String title = GetMetadata()->GetTitle();

@@ -170,6 +170,9 @@ public:
     /// changed. `abort` may be null. Under the writer lock.
     ComposeOutcome ComposeText(bool force, bool * abort);
 
+    /// Makes the glyphs of all flows available for drawing; where they can't be read from the file any more, or their fonts
+    /// have gone, the text is set anew, under the writer lock, which it takes if need be. Not with the reader lock held.
+    void EnsureGlyphs();
     /// Brings what running heads show in step with the title and, for a document without one, its first heading. Under the
     /// writer lock.
     void UpdateRunningHeads();
