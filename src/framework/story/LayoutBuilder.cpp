@@ -1,6 +1,7 @@
 #include "framework/story/LayoutBuilder.h"
 
 #include "framework/kernel/Assert.h"
+#include "framework/story/Glyph.h"
 
 #include <algorithm>
 
@@ -13,6 +14,11 @@ namespace
 std::uint32_t SizeOf(auto const & elements)
 {
     return static_cast<std::uint32_t>(elements.size());
+}
+
+bool IsLeftOut(char16_t unit)
+{
+    return unit == ObjectCharacter || unit == LineSeparator;
 }
 
 std::uint16_t FlagsOf(Typeset::PlacedGlyph const & glyph)
@@ -71,6 +77,21 @@ void LayoutBuilder::AddRun(Typeset::LineArena const & arena, Typeset::GlyphRun c
     auto & layoutText = m_Layout->m_Text.Own();
     KORVANE_ASSERT(!lines.empty());
 
+    // Marks without width and line ends are no text that a reader would copy.
+    bool const isPlain = std::none_of(text.begin(), text.end(), IsLeftOut);
+    if (!isPlain) {
+        m_PlainText.clear();
+        m_PlainOffsets.clear();
+        for (char16_t const unit : text) {
+            m_PlainOffsets.push_back(SizeOf(m_PlainText));
+            if (!IsLeftOut(unit)) {
+                m_PlainText.push_back(unit);
+            }
+        }
+        m_PlainOffsets.push_back(SizeOf(m_PlainText));
+        text = m_PlainText;
+    }
+
     auto const source = arena.GlyphsOf(run);
     std::uint16_t const font = AddFont(arena.m_Faces[run.m_Face]);
     bool const isRightToLeft = (run.m_Level & 1) != 0;
@@ -86,7 +107,9 @@ void LayoutBuilder::AddRun(Typeset::LineArena const & arena, Typeset::GlyphRun c
         if (clusterBase == LayoutItem::None) {
             return isOneToOne ? static_cast<std::uint32_t>(&glyph - source.data()) : 0U;
         }
-        return std::clamp<std::uint32_t>(glyph.m_Cluster, clusterBase, clusterBase + SizeOf(text)) - clusterBase;
+        std::uint32_t const length = isPlain ? SizeOf(text) : SizeOf(m_PlainOffsets) - 1;
+        std::uint32_t const cluster = std::clamp(glyph.m_Cluster, clusterBase, clusterBase + length) - clusterBase;
+        return isPlain ? cluster : m_PlainOffsets[cluster];
     };
     for (std::size_t first = 0; first < source.size();) {
         std::uint32_t low = clusterOf(source[first]);

@@ -3,6 +3,7 @@
 #include "framework/story/Layout.h"
 #include "framework/typeset/LineArena.h"
 
+#include <string>
 #include <unordered_map>
 
 namespace Story
@@ -67,6 +68,9 @@ private:
     std::unordered_map<Typeset::FontFace const *, std::uint16_t> m_Fonts;
     std::unordered_map<HyperlinkData const *, std::uint32_t> m_Hyperlinks;
     std::unordered_map<String, std::uint32_t> m_Strings;
+    // The text of the run that is added, without what is left out, and where each unit of the whole went.
+    std::u16string m_PlainText;
+    std::vector<std::uint32_t> m_PlainOffsets;
 };
 
 }

@@ -20,6 +20,46 @@ float Sum(std::vector<float> const & values)
     return std::accumulate(values.begin(), values.end(), 0.0F);
 }
 
+/// Brings the wanted widths down to `available` in all: narrow columns keep what they want, and the wide ones share
+/// the rest equally, none below its least. If not even the least widths fit, all shrink alike.
+void ShareOut(std::vector<float> & wanted, std::vector<float> const & least, float available)
+{
+    if (Sum(wanted) <= available) {
+        return;
+    }
+    if (float const leastSum = Sum(least); leastSum >= available) {
+        for (std::size_t i = 0; i < wanted.size(); ++i) {
+            wanted[i] = least[i] * available / leastSum;
+        }
+        return;
+    }
+    std::vector<bool> isSettled(wanted.size(), false);
+    std::size_t open = wanted.size();
+    float rest = available;
+    // Columns that need more than an equal share come first: they make the others' share smaller.
+    for (bool const settlesNarrow : {false, true}) {
+        for (bool goesOn = true; goesOn && open > 0;) {
+            goesOn = false;
+            float const share = rest / static_cast<float>(open);
+            for (std::size_t i = 0; i < wanted.size(); ++i) {
+                bool const settles = settlesNarrow ? wanted[i] <= share : least[i] > share;
+                if (!isSettled[i] && settles) {
+                    wanted[i] = settlesNarrow ? wanted[i] : least[i];
+                    rest -= wanted[i];
+                    isSettled[i] = true;
+                    --open;
+                    goesOn = true;
+                }
+            }
+        }
+    }
+    for (std::size_t i = 0; i < wanted.size(); ++i) {
+        if (!isSettled[i]) {
+            wanted[i] = rest / static_cast<float>(open);
+        }
+    }
+}
+
 }
 
 float RowHeight(Row const & row, FlowSegments const & segments)
@@ -98,16 +138,7 @@ void PieceMaker::FitColumns(Table & table, TableGlyph const & source, Context co
             widths = MeasureColumns(table, source, cell, UnlimitedWidth);
             least = MeasureColumns(table, source, cell, 0);
         }
-        float const leastSum = Sum(least);
-        if (leastSum >= available) {
-            for (std::size_t i = 0; i < widths.size(); ++i) {
-                widths[i] = least[i] * available / leastSum;
-            }
-        } else if (float const wish = Sum(widths) - leastSum; Sum(widths) > available && wish > 0) {
-            for (std::size_t i = 0; i < widths.size(); ++i) {
-                widths[i] = least[i] + (widths[i] - least[i]) * (available - leastSum) / wish;
-            }
-        }
+        ShareOut(widths, least, available);
     }
     float left = table.m_Left;
     for (float const width : widths) {
