@@ -6,13 +6,13 @@
 #include <utility>
 
 DomainWriterUnlockSession::DomainWriterUnlockSession(Kernel::Counted<DomainController> controller)
-    : m_Controller(std::move(controller)), m_Hold(m_Controller ? m_Controller->m_Lock->SetAside() : nullptr)
+    : m_Controller(std::move(controller)), m_Depth(m_Controller ? m_Controller->m_Lock->SetAside() : 0)
 {
 }
 
 DomainWriterUnlockSession::~DomainWriterUnlockSession()
 {
-    if (m_Hold) {
-        m_Controller->m_Lock->TakeBack(std::move(m_Hold));
+    if (m_Depth > 0) {
+        m_Controller->m_Lock->TakeBack(m_Depth);
     }
 }

@@ -2,14 +2,7 @@
 
 #include "framework/kernel/Counted.h"
 
-#include <memory>
-
 class DomainController;
-
-namespace Kernel
-{
-struct WriterHold;
-}
 
 /// Gives up a domain's writer lock, however often the thread has taken it, for its own lifetime, and takes it back as it
 /// was. For a command that waits for other commands, for an answer, or does long work that readers may overlap. Nothing
@@ -24,5 +17,6 @@ public:
 
 private:
     Kernel::Counted<DomainController> const m_Controller;
-    std::unique_ptr<Kernel::WriterHold> m_Hold;
+    /// How often the thread had taken the lock; 0: it does not hold it.
+    int const m_Depth;
 };

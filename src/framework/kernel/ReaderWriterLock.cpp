@@ -188,8 +188,23 @@ void ReaderWriterLock::AwaitReturn()
     Waiter waiter{thread, {}};
     {
         WaitGraph::Step step;
+        std::vector<ThreadNode const *> holders;
+        AddHolders(*thread, holders);
+        bool const blocked = std::any_of(holders.begin(), holders.end(), [&](ThreadNode const * holder) {
+            return step.IsBlockedOn(holder, *thread);
+        });
         std::lock_guard const lock(m_Lock);
-        if (IsReturnedTo(*thread)) {
+        auto const own = std::find_if(m_Levels.begin(), m_Levels.end(),
+                                      [&](Level const & level) { return level.m_Thread == thread; });
+        if (own == m_Levels.end() || IsReturnedTo(*thread)) {
+            return;
+        }
+        if (blocked) {
+            // The borrower sleeps, and waits for this thread in its turn: now this one borrows.
+            if (!IsWriter(*thread)) {
+                step.EnterLoan(*m_Levels.back().m_Thread, *this);
+                std::rotate(own, own + 1, m_Levels.end());
+            }
             return;
         }
         m_WaitingOwners.push_back(&waiter);
@@ -207,42 +222,35 @@ void ReaderWriterLock::ReleaseWriter()
     if (--m_Levels.back().m_Depth > 0) {
         return;
     }
+    PopLevel();
+}
+
+int ReaderWriterLock::SetAside()
+{
+    std::lock_guard const lock(m_Lock);
+    if (!IsWriter(*ThreadNode::CurrentPointer())) {
+        return 0;
+    }
+    int const depth = m_Levels.back().m_Depth;
+    PopLevel();
+    return depth;
+}
+
+void ReaderWriterLock::TakeBack(int depth)
+{
+    AcquireWriter(nullptr);
+    std::lock_guard const lock(m_Lock);
+    m_Levels.back().m_Depth += depth - 1;
+}
+
+void ReaderWriterLock::PopLevel()
+{
     m_Levels.pop_back();
     if (m_Levels.empty()) {
         LetNextIn(true);
     } else {
         WakeOwners();
     }
-}
-
-std::unique_ptr<WriterHold> ReaderWriterLock::SetAside()
-{
-    std::lock_guard const lock(m_Lock);
-    if (!IsWriter(*ThreadNode::CurrentPointer())) {
-        return nullptr;
-    }
-    auto hold = std::make_unique<WriterHold>();
-    hold->m_Levels.swap(m_Levels);
-    LetNextIn(true);
-    return hold;
-}
-
-void ReaderWriterLock::TakeBack(std::unique_ptr<WriterHold> hold)
-{
-    if (!hold) {
-        return;
-    }
-    AcquireWriter(nullptr);
-    std::lock_guard const lock(m_Lock);
-    if (m_Levels.back().m_Depth > 1) {
-        --m_Levels.back().m_Depth;
-        m_Levels.back().m_Depth += hold->m_Levels.back().m_Depth;
-        return;
-    }
-    // What the lock itself was borrowed from meanwhile stays below.
-    m_Levels.pop_back();
-    m_Levels.insert(m_Levels.end(), std::make_move_iterator(hold->m_Levels.begin()),
-                    std::make_move_iterator(hold->m_Levels.end()));
 }
 
 void ReaderWriterLock::LetReadersIn()

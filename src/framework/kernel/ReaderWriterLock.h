@@ -10,18 +10,6 @@
 namespace Kernel
 {
 
-/// A writer's whole hold of a lock, set aside while the lock is given up.
-struct WriterHold
-{
-    struct Level
-    {
-        std::shared_ptr<ThreadNode> m_Thread;
-        int m_Depth = 0;
-    };
-    /// The holder last; below it those whose lock it has borrowed.
-    std::vector<Level> m_Levels;
-};
-
 /// Many readers or one writer.
 ///
 /// Fair both ways: a reader that comes while a writer waits lets it go first; a writer that leaves lets in all readers
@@ -48,9 +36,10 @@ public:
     void AcquireWriter(Periodic const & periodic);
     void ReleaseWriter();
 
-    /// Gives the lock up whole; null if the thread does not hold it for writing.
-    [[nodiscard]] std::unique_ptr<WriterHold> SetAside();
-    void TakeBack(std::unique_ptr<WriterHold> hold);
+    /// Gives the thread's hold up, however deep it is; a lock that it has borrowed goes back to the lender. The result
+    /// is for `TakeBack`; 0 if the thread does not hold it for writing.
+    [[nodiscard]] int SetAside();
+    void TakeBack(int depth);
 
     [[nodiscard]] bool IsHeldForWriting() const;
     [[nodiscard]] bool IsWriterWaiting() const;
@@ -64,6 +53,11 @@ public:
     void AddHolders(ThreadNode const & waiting, std::vector<ThreadNode const *> & holders) const;
 
 private:
+    struct Level
+    {
+        std::shared_ptr<ThreadNode> m_Thread;
+        int m_Depth = 0;
+    };
     struct Reader
     {
         std::shared_ptr<ThreadNode> m_Thread;
@@ -86,6 +80,7 @@ private:
     /// The thread is the writer, and nobody else has borrowed the lock from it.
     [[nodiscard]] bool IsReturnedTo(ThreadNode const & thread) const;
     void WakeOwners();
+    void PopLevel();
     /// The thread's entry of one kind, or null.
     [[nodiscard]] Reader * FindReader(ThreadNode const & thread, bool underWriter);
     void AddReader(std::shared_ptr<ThreadNode> const & thread, bool underWriter);
@@ -98,7 +93,7 @@ private:
 
     mutable std::mutex m_Lock;
     /// The writer, and below it those whose lock it has borrowed; empty if nobody writes.
-    std::vector<WriterHold::Level> m_Levels;
+    std::vector<Level> m_Levels;
     std::vector<Reader> m_Readers;
     /// Entries of `m_Readers` that keep writers out.
     int m_PlainReaders = 0;
