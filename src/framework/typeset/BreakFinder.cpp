@@ -64,6 +64,9 @@ void BreakFinder::FindByRules(std::u16string_view text, CharacterTable & charact
     std::size_t const length = text.size();
     for (std::size_t i = 0; i < length; ++i) {
         std::uint8_t after = characters.Get(text[i]).m_LineClass;
+        if (after == U_LB_ALPHABETIC && before == U_LB_ALPHABETIC && !spaces) { // LB28, which is most of any text.
+            continue;
+        }
         if (text[i] == u'\u2028') {
             if (i + 1 < length) {
                 places.push_back({static_cast<std::uint32_t>(i + 1), BreakPlace::Kind::Mandatory});
@@ -83,8 +86,8 @@ void BreakFinder::FindByRules(std::u16string_view text, CharacterTable & charact
             after = U_LB_ALPHABETIC;
         }
         bool allowed = false;
-        if (before == start) {
-            allowed = spaces; // Spaces that open a line end like others.
+        if (before == start && !spaces) {
+            allowed = false; // LB2
         } else if (after == U_LB_ZWSPACE) { // LB7
             allowed = false;
         } else if (before == U_LB_ZWSPACE) { // LB8

@@ -14,6 +14,7 @@ namespace
 
 constexpr float lastResortPenalty = 5000;
 constexpr float dashBeforePenalty = 500;
+constexpr float dashAfterSpacePenalty = 60;
 constexpr std::size_t longestExactWord = 64;
 // Flexibility of a gap between two ideographs, in ems.
 constexpr double ideographicStretch = 0.12;
@@ -24,40 +25,63 @@ bool IsDash(char16_t unit) { return unit == u'\u2014' || unit == u'\u2E3A' || un
 
 struct Hanging
 {
-    char16_t m_Unit;
-    double m_Start;
-    double m_End;
+    float m_Start = 0;
+    float m_End = 0;
 };
 
-constexpr std::array<Hanging, 25> hanging{{{u'-', 0, 0.55},      {u'\u2010', 0, 0.55}, {u'.', 0, 0.7},
-                                           {u',', 0, 0.7},       {u';', 0, 0.4},       {u':', 0, 0.4},
-                                           {u'!', 0, 0.15},      {u'?', 0, 0.15},      {u'\'', 0.6, 0.6},
-                                           {u'"', 0.5, 0.5},     {u'\u2018', 0.6, 0.6}, {u'\u2019', 0.6, 0.6},
-                                           {u'\u201C', 0.5, 0.5}, {u'\u201D', 0.5, 0.5}, {u'\u201A', 0.6, 0.6},
-                                           {u'\u201E', 0.5, 0.5}, {u'\u00AB', 0.3, 0.3}, {u'\u00BB', 0.3, 0.3},
-                                           {u'\u2039', 0.3, 0.3}, {u'\u203A', 0.3, 0.3}, {u'\u2013', 0.2, 0.3},
-                                           {u'\u2014', 0.1, 0.2}, {u'(', 0.1, 0},        {u')', 0, 0.1},
-                                           {u'*', 0.3, 0.3}}};
+constexpr std::array<Hanging, 128> asciiHanging = [] {
+    std::array<Hanging, 128> table{};
+    table['-'] = {0, 0.55F};
+    table['.'] = table[','] = {0, 0.7F};
+    table[';'] = table[':'] = {0, 0.4F};
+    table['!'] = table['?'] = {0, 0.15F};
+    table['\''] = {0.6F, 0.6F};
+    table['"'] = {0.5F, 0.5F};
+    table['('] = {0.1F, 0};
+    table[')'] = {0, 0.1F};
+    table['*'] = {0.3F, 0.3F};
+    for (char const letter : {'A', 'T', 'V', 'W', 'Y'}) {
+        table[static_cast<std::size_t>(letter)] = {0.05F, 0.05F};
+    }
+    return table;
+}();
+
+constexpr Hanging HangingOf(char16_t unit)
+{
+    if (unit < 0x80) {
+        return asciiHanging[unit];
+    }
+    switch (unit) {
+    case u'\u2018':
+    case u'\u2019':
+    case u'\u201A':
+        return {0.6F, 0.6F};
+    case u'\u201C':
+    case u'\u201D':
+    case u'\u201E':
+        return {0.5F, 0.5F};
+    case u'\u00AB':
+    case u'\u00BB':
+    case u'\u2039':
+    case u'\u203A':
+        return {0.3F, 0.3F};
+    case u'\u2010':
+        return {0, 0.55F};
+    case u'\u2013':
+        return {0.2F, 0.3F};
+    case u'\u2014':
+        return {0.1F, 0.2F};
+    default:
+        return {};
+    }
+}
 
 }
 
 double ProtrusionShare(char16_t unit, bool atEnd)
 {
-    for (Hanging const & entry : hanging) {
-        if (entry.m_Unit == unit) {
-            return atEnd ? entry.m_End : entry.m_Start;
-        }
-    }
-    switch (unit) {
-    case u'A':
-    case u'T':
-    case u'V':
-    case u'W':
-    case u'Y':
-        return 0.05;
-    default:
-        return 0;
-    }
+    Hanging const found = HangingOf(unit);
+    return atEnd ? found.m_End : found.m_Start;
 }
 
 double NodeMaker::Protrusion(std::uint32_t position, TextItem const & item, bool atEnd) const
@@ -81,8 +105,8 @@ float NodeMaker::PenaltyAt(std::uint32_t position, std::uint8_t & flags) const
         flags |= BreakNode::Flagged;
         return static_cast<float>(m_Settings.m_HyphenPenalty);
     }
-    if (IsDash(after) && !IsWordSpace(before)) {
-        return dashBeforePenalty;
+    if (IsDash(after)) {
+        return IsWordSpace(before) ? dashAfterSpacePenalty : dashBeforePenalty;
     }
     return before == u'/' ? 20.0F : 0.0F;
 }
@@ -283,7 +307,7 @@ void NodeMaker::FindHyphens(Piece const & piece, std::uint32_t index)
         return;
     }
     Shape & shape = *piece.m_Shape;
-    bool const isCacheable = piece.m_IsWhole && shape.m_Text;
+    bool const isCacheable = piece.m_IsWhole && shape.m_Cached;
     if (isCacheable && shape.m_Hyphenated) {
         for (std::size_t i = 0; i < shape.m_HyphenCount; ++i) {
             m_Inside.push_back({piece.m_Start + shape.m_Hyphens[i], static_cast<float>(m_Settings.m_HyphenPenalty),

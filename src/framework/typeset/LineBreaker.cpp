@@ -80,36 +80,28 @@ double TabWidth(TabTarget const & target, double position, double following)
     return std::max(gap, 0.0);
 }
 
-void LineBreaker::AddCandidate(Active const & candidate, std::uint32_t previous)
-{
-    // Lines past the last special room are all alike, so how many came before no longer matters.
-    std::uint32_t const alike = m_Rooms.GetFirstAlike();
-    for (Active & known : m_Candidates) {
-        if (known.m_Fitness == candidate.m_Fitness &&
-            std::min(known.m_Line, alike) == std::min(candidate.m_Line, alike)) {
-            if (candidate.m_Demerits < known.m_Demerits) {
-                known = candidate;
-                known.m_Record = previous;
-            }
-            return;
-        }
-    }
-    m_Candidates.push_back(candidate);
-    m_Candidates.back().m_Record = previous;
-}
-
 bool LineBreaker::BreakTotalFit(Pass const & pass, std::vector<std::uint32_t> & breaks)
 {
-    m_Active.clear();
-    m_Records.clear();
-    m_Records.push_back({0, 0});
-    m_Active.push_back({});
     bool const justified = m_Settings.m_Alignment == Alignment::Justified;
     std::uint32_t const alike = m_Rooms.GetFirstAlike();
     double const commonWidth = m_Rooms.Get(alike).m_Width;
     std::size_t const hyphenLimit =
         m_Settings.m_HyphenLimit > 0 ? static_cast<std::size_t>(m_Settings.m_HyphenLimit) : 255;
 
+    double const greatestRatio = std::cbrt(std::min(pass.m_Tolerance, 1e9) / 100);
+    double const stretches = justified ? 1 : 0;
+    auto const threshold = [&](BreakNode const & start, std::uint32_t line) {
+        double const width = line >= alike ? commonWidth : m_Rooms.Get(line).m_Width;
+        double const fixed = pass.m_Emergency + (justified ? 0 : width * raggedShare);
+        return width + start.m_NextWidth + greatestRatio * (start.m_NextStretch * stretches - fixed);
+    };
+
+    m_Active.clear();
+    m_Records.clear();
+    m_Records.push_back({0, 0});
+    m_Active.push_back({});
+    m_Active.back().m_Threshold = threshold(m_Nodes.front(), 0);
+    double leastThreshold = m_Active.back().m_Threshold;
     std::uint32_t const count = static_cast<std::uint32_t>(m_Nodes.size());
     for (std::uint32_t index = 1; index < count; ++index) {
         BreakNode const & node = m_Nodes[index];
@@ -119,9 +111,21 @@ bool LineBreaker::BreakTotalFit(Pass const & pass, std::vector<std::uint32_t> & 
         bool const forced = (node.m_Flags & BreakNode::Forced) != 0;
         bool const flagged = (node.m_Flags & BreakNode::Flagged) != 0;
         m_Candidates.clear();
+        // A line that reaches less far than this is too loose for the tolerance.
+        double const reach = node.m_EndWidth + greatestRatio * node.m_EndStretch * stretches;
+        if (!forced && reach < leastThreshold) {
+            continue;
+        }
         std::size_t kept = 0;
         for (std::size_t i = 0; i < m_Active.size(); ++i) {
-            Active const active = m_Active[i];
+            Active const & active = m_Active[i];
+            if (!forced && reach < active.m_Threshold) {
+                if (kept != i) {
+                    m_Active[kept] = active;
+                }
+                ++kept;
+                continue;
+            }
             BreakNode const & start = m_Nodes[active.m_Node];
             double const width = active.m_Line >= alike ? commonWidth : m_Rooms.Get(active.m_Line).m_Width;
             double const natural = node.m_EndWidth - start.m_NextWidth;
@@ -143,7 +147,10 @@ bool LineBreaker::BreakTotalFit(Pass const & pass, std::vector<std::uint32_t> & 
             bool const overfull = ratio < -1 && missing < -0.001;
             bool const stays = !overfull && !forced;
             if (stays) {
-                m_Active[kept++] = active;
+                if (kept != i) {
+                    m_Active[kept] = active;
+                }
+                ++kept;
             }
             if (overfull || badness > pass.m_Tolerance) {
                 continue;
@@ -151,7 +158,8 @@ bool LineBreaker::BreakTotalFit(Pass const & pass, std::vector<std::uint32_t> & 
             if (flagged && active.m_HyphenRun >= hyphenLimit) {
                 continue;
             }
-            double demerits = (linePenalty + badness) * (linePenalty + badness) + static_cast<double>(node.m_Penalty) * node.m_Penalty;
+            double const penalty = node.m_Penalty;
+            double demerits = (linePenalty + badness) * (linePenalty + badness) + penalty * penalty;
             bool const startFlagged = (start.m_Flags & BreakNode::Flagged) != 0;
             if (flagged && startFlagged) {
                 demerits += doubleHyphenDemerits;
@@ -173,20 +181,39 @@ bool LineBreaker::BreakTotalFit(Pass const & pass, std::vector<std::uint32_t> & 
             if (std::abs(fitness - active.m_Fitness) > 1) {
                 demerits += adjacentFitnessDemerits;
             }
-            Active candidate;
-            candidate.m_Node = index;
-            candidate.m_Line = active.m_Line + 1;
-            candidate.m_Fitness = fitness;
-            candidate.m_HyphenRun =
+            demerits += active.m_Demerits;
+            // Lines past the last special room are all alike, so how many came before no longer matters.
+            std::uint32_t const line = std::min(active.m_Line + 1, alike);
+            Active * candidate = nullptr;
+            for (Active & known : m_Candidates) {
+                if (known.m_Fitness == fitness && known.m_Line == line) {
+                    candidate = &known;
+                    break;
+                }
+            }
+            if (!candidate) {
+                candidate = &m_Candidates.emplace_back();
+            } else if (candidate->m_Demerits <= demerits) {
+                continue;
+            }
+            candidate->m_Node = index;
+            candidate->m_Line = line;
+            candidate->m_Record = active.m_Record;
+            candidate->m_Fitness = fitness;
+            candidate->m_HyphenRun =
                 flagged ? static_cast<std::uint8_t>(std::min(active.m_HyphenRun + 1, 255)) : std::uint8_t{0};
-            candidate.m_Demerits = active.m_Demerits + demerits;
-            AddCandidate(candidate, active.m_Record);
+            candidate->m_Demerits = demerits;
         }
         m_Active.resize(kept);
         for (Active & candidate : m_Candidates) {
             m_Records.push_back({candidate.m_Node, candidate.m_Record});
             candidate.m_Record = static_cast<std::uint32_t>(m_Records.size() - 1);
+            candidate.m_Threshold = threshold(node, candidate.m_Line);
             m_Active.push_back(candidate);
+        }
+        leastThreshold = std::numeric_limits<double>::infinity();
+        for (Active const & active : m_Active) {
+            leastThreshold = std::min(leastThreshold, active.m_Threshold);
         }
         if (m_Active.empty() || m_Active.size() > mostActive) {
             return false;

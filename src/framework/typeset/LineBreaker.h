@@ -75,14 +75,13 @@ private:
         std::uint8_t m_Fitness = 1; ///< 0 tight, 1 decent, 2 loose, 3 very loose.
         std::uint8_t m_HyphenRun = 0;
         double m_Demerits = 0;
+        double m_Threshold = 0; ///< Lines from here that reach less far are too loose.
     };
     struct Record
     {
         std::uint32_t m_Node = 0;
         std::uint32_t m_Previous = 0;
     };
-
-    void AddCandidate(Active const & candidate, std::uint32_t previous);
 
     std::vector<BreakNode> const & m_Nodes;
     std::vector<TabMark> const & m_Tabs;

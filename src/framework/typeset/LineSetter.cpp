@@ -197,7 +197,7 @@ void LineSetter::Collect(BreakNode const & from, BreakNode const & to)
             Piece & last = m_Placed.back().m_Piece;
             TextItem const & item = m_Items[last.m_Item];
             if (last.m_Kind == Piece::Kind::Text && last.m_IsWhole && item.m_Context && last.m_Shape &&
-                last.m_Shape->m_Text && item.m_Context->GetMode() == ShapingMode::SpacedWords) {
+                last.m_Shape->m_Cached && item.m_Context->GetMode() == ShapingMode::SpacedWords) {
                 last.m_Shape = m_Maker.MakeBare(last);
                 last.m_LastGlyph = last.m_Shape->m_GlyphCount;
                 last.m_Width = last.m_Shape->m_Width * item.m_Scale + last.m_Clusters * item.m_Tracking;

@@ -45,6 +45,8 @@ namespace
 
 // Longer paragraphs are broken line by line: weighing all their breaks against each other gains nothing.
 constexpr std::size_t longestTotalFit = 200'000;
+// Shorter ones are tried without hyphenation first; of longer ones, hardly any does without.
+constexpr std::size_t longestWithoutHyphens = 400;
 constexpr double widest = 1e7;
 
 double Sane(double value, double least, double most)
@@ -229,27 +231,34 @@ ParagraphLines ParagraphBuilder::Build(ParagraphInput const & input, LineArena &
     bool const hyphenates = settings.m_Hyphenate && settings.m_Mode != BreakMode::Code;
     bool const totalFit = settings.m_Mode == BreakMode::TotalFit && text.size() <= longestTotalFit;
 
-    nodes.Make(work.m_Places, hyphenates && !totalFit, narrowest, work.m_Nodes, work.m_Tabs);
+    bool const triesWithout = hyphenates && totalFit && text.size() < longestWithoutHyphens;
+    nodes.Make(work.m_Places, hyphenates && !triesWithout, narrowest, work.m_Nodes, work.m_Tabs);
     bool done = false;
     if (totalFit && work.m_Tabs.empty()) {
         LineBreaker breaker(work.m_Nodes, work.m_Tabs, rooms, settings);
         LineBreaker::Pass pass;
-        pass.m_Tolerance = std::min(100.0, settings.m_Tolerance);
-        done = breaker.BreakTotalFit(pass, work.m_Breaks);
-        if (!done && hyphenates) {
-            nodes.Make(work.m_Places, true, narrowest, work.m_Nodes, work.m_Tabs);
+        if (triesWithout) {
+            pass.m_Tolerance = std::min(100.0, settings.m_Tolerance);
+            done = breaker.BreakTotalFit(pass, work.m_Breaks);
+            if (!done) {
+                nodes.Make(work.m_Places, true, narrowest, work.m_Nodes, work.m_Tabs);
+            }
         }
         if (!done) {
             pass.m_Tolerance = settings.m_Tolerance;
             done = breaker.BreakTotalFit(pass, work.m_Breaks);
         }
         if (!done) {
-            pass.m_Tolerance = 1e6;
-            pass.m_Emergency = rooms.Get(rooms.GetFirstAlike()).m_Width * 0.05;
+            pass.m_Tolerance = std::max(settings.m_Tolerance, 1000.0);
+            pass.m_Emergency = rooms.Get(rooms.GetFirstAlike()).m_Width * 0.02;
+            done = breaker.BreakTotalFit(pass, work.m_Breaks);
+        }
+        if (!done) {
+            pass.m_Tolerance = 1e9;
             pass.m_LastResorts = true;
             done = breaker.BreakTotalFit(pass, work.m_Breaks);
         }
-    } else if (totalFit && hyphenates) {
+    } else if (triesWithout) {
         nodes.Make(work.m_Places, true, narrowest, work.m_Nodes, work.m_Tabs);
     }
 

@@ -85,7 +85,7 @@ struct ParagraphSettings
     bool m_Hyphenate = true;
     int m_HyphenLimit = 3;           ///< Hyphenated lines in a row; 0 = no limit.
     double m_HyphenPenalty = 50;     ///< 0 = as good as a space, 10,000 = never.
-    double m_Tolerance = 200;        ///< Badness that a line may have before an emergency pass (Knuth and Plass).
+    double m_Tolerance = 400;        ///< Badness that a line may have before an emergency pass (Knuth and Plass).
     double m_MinimumLastLine = 18;   ///< A last line shorter than this is avoided.
     double m_Protrusion = 0;         ///< Share of optical margin alignment: 0 none, 1 full.
     double m_DefaultTab = 36;        ///< Distance of the stops after the last of m_Tabs.

@@ -59,7 +59,6 @@ struct ShapeGlyph
 struct Shape
 {
     ShapeGlyph const * m_Glyphs = nullptr;
-    char16_t const * m_Text = nullptr;   ///< Of a cached word.
     std::uint16_t const * m_Hyphens = nullptr;
     std::uint32_t m_GlyphCount = 0;
     std::uint32_t m_Length = 0; ///< Of the text, in code units.
@@ -67,9 +66,11 @@ struct Shape
     std::int32_t m_Width = 0;
     std::int32_t m_LeadKern = 0;  ///< Added to the space before it, where there is one.
     std::int32_t m_TrailKern = 0; ///< Added to the space after it.
-    std::uint32_t m_Hash = 0;
     std::uint8_t m_HyphenCount = 0;
+    bool m_Cached = false;     ///< A word of the cache. Its text stands behind this.
     bool m_Hyphenated = false; ///< m_Hyphens is known.
+
+    [[nodiscard]] char16_t * GetText() noexcept { return reinterpret_cast<char16_t *>(this + 1); }
 };
 
 }

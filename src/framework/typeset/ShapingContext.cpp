@@ -73,23 +73,23 @@ ShapingContext::~ShapingContext() { hb_shape_plan_destroy(m_Plan); }
 
 void ShapingContext::ClearCache()
 {
-    std::fill(m_Slots.begin(), m_Slots.end(), nullptr);
+    std::fill(m_Slots.begin(), m_Slots.end(), Slot());
     m_Used = 0;
     m_Arena.Clear();
 }
 
 void ShapingContext::GrowTable()
 {
-    std::vector<Shape *> old(m_Slots.size() * 2);
+    std::vector<Slot> old(m_Slots.size() * 2);
     old.swap(m_Slots);
     std::size_t const mask = m_Slots.size() - 1;
-    for (Shape * shape : old) {
-        if (shape) {
-            std::size_t at = (shape->m_Hash >> 2) & mask;
-            while (m_Slots[at]) {
+    for (Slot const & slot : old) {
+        if (slot.m_Shape) {
+            std::size_t at = (slot.m_Hash >> 2) & mask;
+            while (m_Slots[at].m_Shape) {
                 at = (at + 1) & mask;
             }
-            m_Slots[at] = shape;
+            m_Slots[at] = slot;
         }
     }
 }
@@ -120,21 +120,19 @@ Shape * ShapingContext::GetWord(std::u16string_view word, bool spaceBefore, bool
     unsigned const variant = (lead ? 1U : 0U) | (trail ? 2U : 0U);
     // The variant is part of the hash in whole, so that words that differ in it alone are told apart by the hash.
     std::uint32_t const hash = (HashWord(word, variant) & ~3U) | variant;
-    std::size_t mask = m_Slots.size() - 1;
+    std::size_t const mask = m_Slots.size() - 1;
     std::size_t at = (hash >> 2) & mask;
-    while (Shape * known = m_Slots[at]) {
-        if (known->m_Hash == hash && known->m_Length == word.size() &&
-            std::memcmp(known->m_Text, word.data(), word.size() * 2) == 0) {
+    while (Shape * known = m_Slots[at].m_Shape) {
+        if (m_Slots[at].m_Hash == hash && known->m_Length == word.size() &&
+            std::memcmp(known->GetText(), word.data(), word.size() * 2) == 0) {
             return known;
         }
         at = (at + 1) & mask;
     }
     Shape * made = shapeInto(m_Arena);
-    auto * text = m_Arena.Allocate<char16_t>(word.size());
-    std::memcpy(text, word.data(), word.size() * 2);
-    made->m_Text = text;
-    made->m_Hash = hash;
-    m_Slots[at] = made;
+    std::memcpy(made->GetText(), word.data(), word.size() * 2);
+    made->m_Cached = true;
+    m_Slots[at] = {hash, made};
     if (++m_Used * 3 > m_Slots.size() * 2) {
         GrowTable();
     }
@@ -164,7 +162,9 @@ Shape * ShapingContext::Execute(std::u16string_view text, std::size_t start, std
     hb_glyph_info_t const * infos = hb_buffer_get_glyph_infos(m_Buffer, &count);
     hb_glyph_position_t const * positions = hb_buffer_get_glyph_positions(m_Buffer, &count);
 
-    auto * shape = new (arena.Allocate<Shape>(1)) Shape;
+    // Room for the text behind the shape: a look-up in the cache then touches one place.
+    std::size_t const textShapes = (wordLength <= longestCachedWord ? wordLength * 2 : 0) / sizeof(Shape) + 1;
+    auto * shape = new (arena.Allocate<Shape>(1 + textShapes)) Shape;
     auto * glyphs = arena.Allocate<ShapeGlyph>(count);
     std::uint32_t kept = 0;
     std::uint32_t lastCluster = 0xFFFFFFFF;

@@ -51,7 +51,7 @@ public:
                                        BumpArena & scratch);
 
     /// Memory of the cached words.
-    [[nodiscard]] std::size_t GetCacheSize() const noexcept { return m_Arena.GetSize() + m_Slots.size() * 8; }
+    [[nodiscard]] std::size_t GetCacheSize() const noexcept { return m_Arena.GetSize() + m_Slots.size() * sizeof(Slot); }
     [[nodiscard]] BumpArena & GetArena() noexcept { return m_Arena; }
     void ClearCache();
 
@@ -73,7 +73,12 @@ private:
     char16_t m_Hyphen = u'-';
 
     BumpArena m_Arena;
-    std::vector<Shape *> m_Slots; ///< Open addressing, a power of two.
+    struct Slot
+    {
+        std::uint32_t m_Hash = 0;
+        Shape * m_Shape = nullptr;
+    };
+    std::vector<Slot> m_Slots; ///< Open addressing, a power of two.
     std::size_t m_Used = 0;
     std::vector<char16_t> m_Spaced;
 };
