@@ -145,6 +145,7 @@ void Itemiser::CutText(WorkRun const & run, std::size_t start, std::size_t end, 
     char32_t base = 0;
     std::size_t clusterStart = start;
     std::size_t itemStart = start;
+    bool fallbackScript = false; // The last letter was one of a script that the main face lacks.
     for (std::size_t i = start; i < end;) {
         std::size_t const at = i;
         char32_t character = 0;
@@ -180,21 +181,24 @@ void Itemiser::CutText(WorkRun const & run, std::size_t start, std::size_t end, 
         }
         base = character;
         clusterStart = at;
-        if (mainCoverage.Has(character)) {
+        bool const isWeak = IsWeakScript(info.m_Script);
+        if (isWeak && fallbackScript && m_Cache.GetCoverage(counted).Has(character)) {
+            newFace = face; // Spaces and punctuation among text in a fallback font come from that font.
+        } else if (mainCoverage.Has(character)) {
             newFace = mainFace.Get();
         } else if (info.m_Flags & CharacterInfo::Ignorable) {
             newFace = face ? face : mainFace.Get();
         } else if (character == u'\u00A0' || (character >= 0x2000 && character <= 0x200A)) {
             newFace = face ? face : mainFace.Get(); // HarfBuzz makes these from the space.
-        } else if (face && face != mainFace.Get() && m_Cache.GetCoverage(counted).Has(character) &&
-                   IsWeakScript(info.m_Script)) {
-            newFace = face; // Punctuation beside fallback text comes from the same font.
         } else {
             Kernel::Counted<FontFace const> const & found = style.FindFace(character);
             newFace = found ? found.Get() : mainFace.Get();
             if (!found) {
                 ReportMissing(character, at, run.m_Style);
             }
+        }
+        if (!isWeak) {
+            fallbackScript = newFace != mainFace.Get();
         }
         bool const isFirst = !face;
         if (!isFirst && (newFace != face || newScript != script)) {

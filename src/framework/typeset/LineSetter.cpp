@@ -206,6 +206,10 @@ void LineSetter::Collect(BreakNode const & from, BreakNode const & to)
     }
     for (Placed & placed : m_Placed) {
         placed.m_Width = placed.m_Piece.m_Width;
+        placed.m_Gaps = placed.m_Piece.m_Clusters;
+    }
+    if (!m_Placed.empty() && m_Placed.back().m_Gaps > 0 && ItemOf(m_Placed.back()).m_Level == 0) {
+        --m_Placed.back().m_Gaps; // A gap after the line's last cluster would stand in the margin.
     }
 }
 
@@ -248,7 +252,7 @@ void LineSetter::Justify(double missing, Line & line)
             spaces += placed.m_Width;
         }
         if (IsGlyphPiece(placed.m_Piece)) {
-            double const ems = placed.m_Piece.m_Clusters * ItemOf(placed).m_Size;
+            double const ems = placed.m_Gaps * ItemOf(placed).m_Size;
             letters += ems;
             gaps += placed.m_Piece.m_Kind == Piece::Kind::Text && ItemOf(placed).m_Ideographic ? ems : 0;
         }
@@ -288,24 +292,7 @@ void LineSetter::Justify(double missing, Line & line)
             placed.m_Width += sign * placed.m_Piece.m_Width * spaceShare * ratio;
         }
         placed.m_ClusterGap = sign * gap * item.m_Size;
-        placed.m_Width += placed.m_ClusterGap * placed.m_Piece.m_Clusters;
-    }
-    // The gap after the line's last cluster would stand in the margin: give it back to the others' account.
-    if (opens && !m_Placed.empty() && m_Placed.back().m_ClusterGap > 0) {
-        double const surplus = m_Placed.back().m_ClusterGap;
-        double clusters = 0;
-        for (Placed const & placed : m_Placed) {
-            clusters += placed.m_ClusterGap > 0 ? placed.m_Piece.m_Clusters : 0;
-        }
-        if (clusters > 1) {
-            double const share = surplus / (clusters - 1);
-            for (Placed & placed : m_Placed) {
-                if (placed.m_ClusterGap > 0) {
-                    placed.m_ClusterGap += share;
-                    placed.m_Width += share * placed.m_Piece.m_Clusters;
-                }
-            }
-        }
+        placed.m_Width += placed.m_ClusterGap * placed.m_Gaps;
     }
 }
 
@@ -429,12 +416,12 @@ void LineSetter::EmitText(Placed const & placed, GlyphRun & run)
     std::uint32_t const count = piece.m_LastGlyph - piece.m_FirstGlyph;
     // Of spaces shaped with their words, each takes its part of what justification has added.
     double const spaceExtra = isSpace && count ? (placed.m_Width - piece.m_Width) / count : 0;
-    double const clusterExtra = isSpace ? 0 : item.m_Tracking + placed.m_ClusterGap;
     std::size_t const first = m_Arena.m_Glyphs.size();
     m_Arena.m_Glyphs.resize(first + count);
     PlacedGlyph * out = m_Arena.m_Glyphs.data() + first;
     ShapeGlyph const * glyphs = piece.m_Shape->m_Glyphs + piece.m_FirstGlyph;
     std::uint32_t const hyphenFrom = piece.m_End;
+    std::uint32_t clusters = 0;
     for (std::uint32_t i = 0; i < count; ++i) {
         ShapeGlyph const & glyph = glyphs[i];
         PlacedGlyph & placedGlyph = out[i];
@@ -448,7 +435,11 @@ void LineSetter::EmitText(Placed const & placed, GlyphRun & run)
         } else if (glyph.m_Glyph == 0) {
             placedGlyph.m_Flags |= PlacedGlyph::Missing;
         }
-        double const extra = (endsCluster ? clusterExtra : 0) + spaceExtra + (isSpace && endsCluster ? item.m_Tracking : 0);
+        double extra = spaceExtra;
+        if (endsCluster) {
+            extra += item.m_Tracking + (!isSpace && clusters < placed.m_Gaps ? placed.m_ClusterGap : 0);
+            ++clusters;
+        }
         placedGlyph.m_Advance = static_cast<float>(glyph.m_Advance * item.m_Scale + extra);
         placedGlyph.m_OffsetX = static_cast<float>(glyph.m_OffsetX * item.m_Scale);
         placedGlyph.m_OffsetY = static_cast<float>(-glyph.m_OffsetY * item.m_Scale);

@@ -32,7 +32,8 @@ private:
     {
         Piece m_Piece;
         double m_Width = 0;      ///< As set.
-        double m_ClusterGap = 0; ///< Added to every cluster's advance.
+        double m_ClusterGap = 0; ///< Added to the advances of the first m_Gaps clusters.
+        std::uint32_t m_Gaps = 0;
         char32_t m_Leader = 0;
     };
 

@@ -253,9 +253,12 @@ ParagraphLines ParagraphBuilder::Build(ParagraphInput const & input, LineArena &
             pass.m_Emergency = rooms.Get(rooms.GetFirstAlike()).m_Width * 0.02;
             done = breaker.BreakTotalFit(pass, work.m_Breaks);
         }
-        if (!done) {
+        for (bool const lastResorts : {false, true}) {
+            if (done) {
+                break;
+            }
             pass.m_Tolerance = 1e9;
-            pass.m_LastResorts = true;
+            pass.m_LastResorts = lastResorts;
             done = breaker.BreakTotalFit(pass, work.m_Breaks);
         }
     } else if (triesWithout) {
