@@ -161,7 +161,9 @@ std::string FindFault(LineArena const & arena, ParagraphLines const & lines, std
                     fault << "cluster " << glyph.m_Cluster << " in run " << run.m_TextStart << " to " << run.m_TextEnd;
                     return fault.str();
                 }
-                if (standsForText && (glyph.m_Cluster < line.m_TextStart || glyph.m_Cluster >= line.m_TextEnd)) {
+                // What stands for one character of the text may be broken over two lines.
+                bool const isWhole = run.m_Object == GlyphRun::NoObject && glyph.m_Cluster != line.m_TextEnd;
+                if (standsForText && isWhole && (glyph.m_Cluster < line.m_TextStart || glyph.m_Cluster >= line.m_TextEnd)) {
                     return "cluster outside its line";
                 }
                 if (standsForText && glyph.m_Glyph >= arena.m_Faces[run.m_Face]->GetGlyphCount()) {

@@ -358,6 +358,7 @@ void LineSetter::Emit(double x)
 {
     GlyphRun * run = nullptr;
     std::uint32_t runItem = 0;
+    double runStart = 0;
     for (Placed const & placed : m_Placed) {
         Piece const & piece = placed.m_Piece;
         TextItem const & item = ItemOf(placed);
@@ -370,7 +371,7 @@ void LineSetter::Emit(double x)
                 run = &m_Arena.m_Runs.emplace_back();
                 run->m_FirstGlyph = static_cast<std::uint32_t>(m_Arena.m_Glyphs.size());
                 run->m_TextStart = m_Work.ToSource(piece.m_Start);
-                run->m_TextEnd = m_Work.ToSource(piece.m_End);
+                run->m_TextEnd = m_Work.ToSourceEnd(piece.m_End);
                 run->m_Style = item.m_Style;
                 run->m_Object = item.m_Object;
                 run->m_Level = item.m_Level;
@@ -379,6 +380,7 @@ void LineSetter::Emit(double x)
                 run->m_X = static_cast<float>(x);
                 run->m_IsBox = isBox;
                 runItem = piece.m_Item;
+                runStart = x;
                 if (isGlyphs) {
                     run->m_Face = FaceIndex(item.m_Context->GetCountedFace());
                 }
@@ -387,10 +389,10 @@ void LineSetter::Emit(double x)
                 EmitLeader(placed, *run);
             }
         }
-        if (run) {
+        if (run && piece.m_Kind != Piece::Kind::Tab) {
             run->m_TextStart = std::min(run->m_TextStart, m_Work.ToSource(piece.m_Start));
-            run->m_TextEnd = std::max(run->m_TextEnd, m_Work.ToSource(piece.m_End));
-            run->m_Width = static_cast<float>(x + placed.m_Width - run->m_X);
+            run->m_TextEnd = std::max(run->m_TextEnd, m_Work.ToSourceEnd(piece.m_End));
+            run->m_Width = static_cast<float>(x + placed.m_Width - runStart);
         }
         if (isGlyphs) {
             if (piece.m_Kind == Piece::Kind::Space && !piece.m_Shape) {
@@ -489,6 +491,7 @@ void LineSetter::EmitLeader(Placed const & placed, GlyphRun & run)
     glyph.m_Cluster = run.m_TextStart;
     glyph.m_Advance = static_cast<float>(advance);
     run.m_X += static_cast<float>(rest / 2);
+    run.m_Width = static_cast<float>(count * advance);
     m_Arena.m_Glyphs.insert(m_Arena.m_Glyphs.end(), run.m_GlyphCount, glyph);
 }
 

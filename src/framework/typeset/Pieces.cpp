@@ -13,7 +13,7 @@ namespace
 {
 
 // Longer stretches are shaped in parts, so that no buffer grows without bound.
-constexpr std::size_t longestStretch = 8192;
+constexpr std::size_t longestStretch = 2048;
 // Up to here, a part at a line's edge is looked up among the words.
 constexpr std::size_t longestWord = 40;
 
@@ -188,7 +188,7 @@ Piece PieceMaker::MakePart(Piece const & piece, std::uint32_t from, std::uint32_
     } else {
         // The shape as it is, where nothing reaches over the edges.
         ClusterWalk walk(piece, context.IsRightToLeft());
-        walk.StepTo(from);
+        walk.Seek(from);
         std::uint32_t const firstBefore = walk.GetFirst();
         std::uint32_t const lastBefore = walk.GetLast();
         std::int64_t const advanceBefore = walk.GetAdvance();

@@ -96,6 +96,22 @@ public:
         }
         ++m_Clusters;
     }
+    /// Goes to the first cluster at or after the position without counting what is passed over.
+    void Seek(std::uint32_t position)
+    {
+        // Clusters ascend from left to right, or descend in right-to-left text.
+        std::uint32_t low = m_First;
+        std::uint32_t high = m_Last;
+        while (low < high) {
+            std::uint32_t const middle = low + (high - low) / 2;
+            if ((m_Base + m_Glyphs[middle].m_Cluster < position) != m_RightToLeft) {
+                low = middle + 1;
+            } else {
+                high = middle;
+            }
+        }
+        (m_RightToLeft ? m_Last : m_First) = low;
+    }
     /// Takes all clusters that start before the position.
     void StepTo(std::uint32_t position)
     {

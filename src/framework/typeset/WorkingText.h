@@ -3,6 +3,7 @@
 #include "framework/typeset/ParagraphInput.h"
 #include "framework/typeset/ShapeCache.h"
 
+#include <algorithm>
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -36,6 +37,14 @@ public:
     [[nodiscard]] std::uint32_t ToSource(std::size_t position) const noexcept
     {
         return m_Map.empty() ? static_cast<std::uint32_t>(position) : m_Map[position];
+    }
+
+    /// Offset in the paragraph's text after what the code unit before the position stands for. (Several may stand for
+    /// one: an object's text, "SS" for a capital sharp s.)
+    [[nodiscard]] std::uint32_t ToSourceEnd(std::size_t position) const noexcept
+    {
+        return m_Map.empty() || position == 0 ? ToSource(position)
+                                              : std::max(m_Map[position], m_Map[position - 1] + 1);
     }
 
     /// Places for a hyphen that the text itself gives (U+00AD), ascending.
