@@ -33,25 +33,25 @@ TEST(FileLinkTest, OnlySmallLettersMakeAPdf)
 
 TEST(FileLinkTest, AnIncludedFileIsCopiedOnceAndLinkedByName)
 {
-    Support::TemporaryFolder const source;
-    Support::TemporaryFolder const target;
-    std::ofstream(source.Path("data.txt").c_str()) << "new";
-    std::ofstream(source.Path("plain").c_str()) << "plain";
+    TemporaryFolder const source;
+    TemporaryFolder const target;
+    std::ofstream((source / "data.txt").c_str()) << "new";
+    std::ofstream((source / "plain").c_str()) << "plain";
 
     String relative;
-    EXPECT_TRUE(CopyBeside(source.Path("plain"), target.Path("book.pdf"), relative));
+    EXPECT_TRUE(CopyBeside((source / "plain"), (target / "book.pdf"), relative));
     EXPECT_EQ(relative, "plain");
-    EXPECT_TRUE(CopyBeside(source.Path("data.txt"), target.Path("book.pdf"), relative));
+    EXPECT_TRUE(CopyBeside((source / "data.txt"), (target / "book.pdf"), relative));
     EXPECT_EQ(relative, "data.txt");
 
-    std::ofstream(target.Path("data.txt").c_str()) << "there already";
-    EXPECT_TRUE(CopyBeside(source.Path("data.txt"), target.Path("book.pdf"), relative));
-    std::ifstream kept(target.Path("data.txt").c_str());
+    std::ofstream((target / "data.txt").c_str()) << "there already";
+    EXPECT_TRUE(CopyBeside((source / "data.txt"), (target / "book.pdf"), relative));
+    std::ifstream kept((target / "data.txt").c_str());
     std::string text;
     std::getline(kept, text);
     EXPECT_EQ(text, "there already");
 
-    EXPECT_FALSE(CopyBeside(source.Path("missing.txt"), target.Path("book.pdf"), relative));
+    EXPECT_FALSE(CopyBeside((source / "missing.txt"), (target / "book.pdf"), relative));
 }
 
 }

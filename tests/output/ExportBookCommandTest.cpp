@@ -1,0 +1,140 @@
+#include "output/ExportBookCommand.h"
+
+#include "core/BookCollection.h"
+#include "framework/document/DocumentController.h"
+#include "framework/kernel/FileSystem.h"
+#include "framework/render/FileExportOptions.h"
+#include "output/ExportBookCompleteNotification.h"
+#include "support/BookBuilder.h"
+#include "support/NotificationRecorder.h"
+#include "support/PdfProbe.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+
+namespace Book
+{
+namespace
+{
+
+class ExportBookCommandTest : public testing::Test
+{
+protected:
+    Kernel::Counted<ExportBookCommand> Command(Kernel::Counted<BookController> const & book, String const & target, bool temp)
+    {
+        std::vector<Kernel::Counted<BookChapter const>> chapters;
+        book->GetChapters(chapters);
+        auto const options = Kernel::MakeCounted<Renderer::FileExportOptionsPDF>();
+        Renderer::FileExportOptionsPDF::Settings settings;
+        settings.m_FixedTime = 1;
+        options->SetSettings(settings);
+        return Kernel::MakeCounted<ExportBookCommand>(
+            chapters, target, Kernel::Consolidated<Renderer::FileExportOptions>(Kernel::Counted<Renderer::FileExportOptionsPDF const>(options)),
+            Kernel::Size{}, temp, false, false, true, nullptr);
+    }
+
+    /// Exports and gives the results of the one notification that tells of it.
+    std::vector<ExportBookCompleteNotification::Rec> Export(Kernel::Counted<BookController> const & book, String const & target)
+    {
+        NotificationRecorder recorder;
+        BookBuilder::Run(book, Command(book, target, false));
+        auto const told = recorder.All<ExportBookCompleteNotification>();
+        EXPECT_EQ(told.size(), 1u);
+        return told.empty() ? std::vector<ExportBookCompleteNotification::Rec>() : told.front()->GetRecs();
+    }
+
+    Kernel::Counted<BookController> TwoChapters()
+    {
+        auto const book = m_Builder.NewBook({m_Builder.WriteChapter("First things.kvdoc", {.m_Pages = 3, .m_Title = "The whole"}),
+                                             m_Builder.WriteChapter("Last things.kvdoc", {.m_Pages = 2})});
+        BookCollection::GetInstance().PreOutput(book, {book->GetChapterAtIndex(0), book->GetChapterAtIndex(1)});
+        BookBuilder::Rest();
+        return book;
+    }
+
+    BookBuilder m_Builder;
+};
+
+TEST_F(ExportBookCommandTest, AllChaptersComeOutAsOneFile)
+{
+    auto const book = TwoChapters();
+    String const target = m_Builder.GetFolder() / "book.pdf";
+    auto const records = Export(book, target);
+    ASSERT_EQ(records.size(), 1u);
+    EXPECT_EQ(records[0].m_Result, ExportResultOk);
+    EXPECT_EQ(records[0].m_Path, target);
+    EXPECT_TRUE(book->IsDirty());
+
+    PdfProbe const pdf(target);
+    EXPECT_EQ(pdf.Check(), "");
+    EXPECT_EQ(pdf.PageCount(), 5);
+    EXPECT_EQ(pdf.Labels(), (std::vector<std::string>{"1", "2", "3", "4", "5"}));
+    EXPECT_NE(pdf.Text(4).find("Page 1"), std::string::npos) << "the second chapter's own first page";
+    EXPECT_NE(pdf.Outline().find("First things -> page 1"), std::string::npos) << pdf.Outline();
+    EXPECT_NE(pdf.Outline().find("Last things -> page 4"), std::string::npos) << pdf.Outline();
+    EXPECT_NE(pdf.Stream("Metadata").find("The whole"), std::string::npos) << "the key chapter's metadata";
+}
+
+TEST_F(ExportBookCommandTest, AChapterThatIsGoneIsLeftOutOfTheFile)
+{
+    auto const book = TwoChapters();
+    std::remove(book->GetChapterAtIndex(1)->GetPath().c_str());
+    String const target = m_Builder.GetFolder() / "book.pdf";
+    auto const records = Export(book, target);
+    ASSERT_EQ(records.size(), 1u);
+    EXPECT_EQ(records[0].m_Result, ExportResultOk);
+    EXPECT_EQ(PdfProbe(target).PageCount(), 3);
+}
+
+TEST_F(ExportBookCommandTest, ATargetThatCannotBeMadeIsNamed)
+{
+    auto const book = TwoChapters();
+    String const target = m_Builder.GetFolder() / "no such folder/book.pdf";
+    NotificationRecorder recorder;
+    BookBuilder::Run(book, Command(book, target, false));
+    auto const told = recorder.All<ExportBookCompleteNotification>();
+    ASSERT_EQ(told.size(), 1u);
+    EXPECT_EQ(told[0]->GetRecs()[0].m_Result, ExportResultFileNotCreated);
+    String message;
+    String title;
+    ASSERT_TRUE(told[0]->GetErrorStrings(message, title));
+    EXPECT_EQ(title, "Errors occurred while exporting");
+    EXPECT_EQ(message, String("The file could not be created:\n") + target + "\n");
+}
+
+TEST_F(ExportBookCommandTest, AnAbortLeavesTheTargetAlone)
+{
+    auto const book = TwoChapters();
+    String const target = m_Builder.GetFolder().WriteFile("book.pdf", "the one before");
+    auto const command = Command(book, target, false);
+    command->Abort();
+    NotificationRecorder recorder;
+    BookBuilder::Run(book, command);
+    EXPECT_TRUE(recorder.All<ExportBookCompleteNotification>().empty()) << "it stopped before the writer";
+    EXPECT_EQ(m_Builder.GetFolder().ReadFile("book.pdf"), "the one before");
+}
+
+TEST(ExportBookCompleteNotificationTest, TextsStandInTheOrderOfTheFilesWithABlankLineBetween)
+{
+    ExportBookCompleteNotification notification(nullptr, "book.pdf", false, nullptr, nullptr);
+    auto const add = [&](bool isSave, char const * path, ExportResult result) {
+        notification.AddResult(isSave, path, nullptr, result, nullptr, nullptr);
+    };
+    String message;
+    String title = "as it was";
+    add(false, "a", ExportResultOk);
+    add(false, "b", ExportResultAborted);
+    add(false, "c", ExportResultFailed);
+    EXPECT_FALSE(notification.GetErrorStrings(message, title));
+    EXPECT_EQ(title, "as it was");
+
+    add(false, "d", ExportResultAccessDenied);
+    add(false, "e", ExportResultOutOfSpace);
+    EXPECT_TRUE(notification.GetErrorStrings(message, title));
+    EXPECT_EQ(message, "Access was denied:\nd\n\nThe destination device is out of space:\ne\n");
+    EXPECT_EQ(title, "Errors occurred while exporting");
+}
+
+}
+}
