@@ -196,4 +196,9 @@ void UpdateNumbersCommand::InvestigateNotes(Kernel::Counted<DocumentController c
     }
 }
 
+void BookController::InvestigateEndnotes(Kernel::Counted<DocumentController const> document, int & next)
+{
+    UpdateNumbersCommand::InvestigateNotes(document, next);
+}
+
 }

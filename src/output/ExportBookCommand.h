@@ -5,6 +5,7 @@
 #include "framework/kernel/Abortable.h"
 #include "framework/kernel/Counted.h"
 #include "framework/kernel/Geometry.h"
+#include "framework/kernel/Progress.h"
 #include "framework/render/Warning.h"
 #include "output/ExportPageRef.h"
 
@@ -17,7 +18,6 @@ class SpreadNode;
 
 namespace Kernel
 {
-class Progress;
 class SequenceProgressReporter;
 }
 namespace Raster
