@@ -1,3 +1,4 @@
+#include "framework/commands/ExportItemCommandBase.h"
 #include "framework/document/AnchorVisitor.h"
 #include "framework/document/BookEndnoteVisitor.h"
 #include "framework/document/DocumentControllerSession.h"
@@ -8,10 +9,15 @@
 #include "framework/document/PagePainter.h"
 #include "framework/document/Selection.h"
 #include "framework/document/UpdateCrossReferencesCommandHelper.h"
+#include "framework/document/VantraController.h"
+#include "framework/kernel/DomainWriterUnlockSession.h"
+#include "framework/kernel/MemoryStreams.h"
 #include "framework/kernel/Utf.h"
 #include "framework/render/RasterSink.h"
 #include "framework/story/NoteAtt.h"
 #include "support/DocumentBuilder.h"
+#include "support/PdfProbe.h"
+#include "support/TemporaryFolder.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -248,6 +254,84 @@ TEST(DocumentExportTest, APictureThatIsLostShowsAsAMarkedBoxAndAWarning)
         stroked |= Renderer::RenderTree::DisplayList::Kind::Stroke == operation.m_Kind;
     }
     EXPECT_TRUE(stroked);
+}
+
+namespace
+{
+
+/// Writes all pages of its document, with the links to the web.
+class ExportAllCommand : public ExportItemCommandBase
+{
+public:
+    explicit ExportAllCommand(Renderer::RenderTree::PdfExport & pdf)
+        : ExportItemCommandBase(false, true, nullptr, true), m_Pdf(pdf)
+    {
+    }
+    Kernel::LocalisedString GetDescription() const override { return {"Export", "Test"}; }
+    void Do() override
+    {
+        DomainWriterUnlockSession const unlocked(Kernel::Counted<DomainController>(GetDocument().Get()));
+        std::vector<Params> const pages = PagesOf(*GetDocument());
+        for (std::size_t i = 0; i < pages.size(); ++i) {
+            EXPECT_EQ(ExportResultOk, ExportPDFPage(m_Pdf, pages, i, 0, Kernel::MakeCounted<Renderer::FileExportOptionsPDF>(),
+                                                    {}, nullptr, nullptr));
+        }
+    }
+    void Notify(std::vector<Kernel::Counted<Kernel::Notification>> &) override {}
+
+protected:
+    void CollatePageHyperlinks(Params const & page, std::vector<Renderer::PdfHyperlink> & links) override
+    {
+        std::vector<Kernel::Counted<HyperlinkData>> found;
+        HyperlinkVisitor::CollateForExport(Self(), page.m_Nodes[0]->GetSpreadNode().Get(), found);
+        for (Kernel::Counted<HyperlinkData> const & link : found) {
+            Renderer::PdfHyperlink out;
+            out.m_Kind = Renderer::PdfHyperlink::Resource;
+            out.m_Target = link->GetPath();
+            out.m_Rect = page.TransformOf(0).MapBounds(link->m_Rects[0]);
+            if (!out.m_Rect.Intersected(page.m_Rect).IsEmpty()) {
+                links.push_back(out);
+            }
+        }
+    }
+
+private:
+    Renderer::RenderTree::PdfExport & m_Pdf;
+};
+
+}
+
+TEST(DocumentExportTest, AChapterComesOutAsPdf)
+{
+    TemporaryFolder const folder;
+    DocumentBuilder builder;
+    builder.Settings().m_Sections = {{0, 8, true, true, PageNumberFormat::RomanLower, ""}};
+    builder.Title("On Foxes").Link("the web", Story::HyperlinkData::ToWeb("https://example.org")).Paragraphs(20);
+    builder.BuildFile(folder / "chapter.kvdoc");
+    // From the file, so that the glyphs are those that were saved.
+    Kernel::Counted<DocumentController> const document = LoadTestDocument(folder / "chapter.kvdoc", nullptr);
+
+    Kernel::Counted<Renderer::RenderTree::PdfSchema> const schema = Kernel::MakeCounted<Renderer::RenderTree::PdfSchema>(
+        Kernel::MakeCounted<Renderer::FileExportOptionsPDF>(), nullptr);
+    Renderer::RenderTree::PdfExport pdf(schema, document->GetUnitConverter());
+    Kernel::Counted<Kernel::MemoryOutStream> const stream = Kernel::MakeCounted<Kernel::MemoryOutStream>();
+    ASSERT_TRUE(pdf.Create("chapter.pdf", stream, "", "On Foxes", "", ""));
+    Kernel::Counted<ExportAllCommand> const command = Kernel::MakeCounted<ExportAllCommand>(pdf);
+    VantraController::GetInstance().EnqueueCommandAndWait(command, document, false);
+    ASSERT_TRUE(pdf.Close()) << pdf.GetError();
+    auto const & bytes = stream->GetBytes();
+    PdfProbe const probe(folder.WriteFile("chapter.pdf", {reinterpret_cast<char const *>(bytes.data()), bytes.size()}));
+
+    EXPECT_EQ(probe.Check(), "");
+    EXPECT_EQ(probe.PageCount(), document->GetDocument()->GetPageCount());
+    EXPECT_THAT(probe.Labels(), testing::Contains("viii"));
+    EXPECT_THAT(probe.Text(1), HasSubstr("See the web there."));
+    EXPECT_THAT(probe.Text(1), HasSubstr("the quick brown fox jumps over lazy"));
+    EXPECT_THAT(probe.Text(2), HasSubstr("On Foxes"));
+    EXPECT_THAT(probe.Links(1), HasSubstr("https://example.org"));
+    EXPECT_EQ(probe.Links(2), "");
+    EXPECT_TRUE(command->GetPreviewBitmap());
+    EXPECT_FALSE(document->IsDirty());
 }
 
 TEST(DocumentExportTest, APageCanBeSeen)
