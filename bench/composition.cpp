@@ -44,7 +44,7 @@ std::string Plain(std::string_view text)
     return plain;
 }
 
-Counted<Story::Story> ReadChapter(std::filesystem::path const & path)
+Counted<::Story::Story> ReadChapter(std::filesystem::path const & path)
 {
     std::vector<std::string> blocks;
     std::unordered_map<std::string, std::string> notes;
@@ -83,12 +83,12 @@ Counted<Story::Story> ReadChapter(std::filesystem::path const & path)
     return builder.Finish();
 }
 
-std::vector<Counted<Story::Story>> const & Chapters()
+std::vector<Counted<::Story::Story>> const & Chapters()
 {
     static auto const chapters = [] {
         char const * named = std::getenv("KORVANE_PROSE");
         std::filesystem::path const folder = named ? named : "/work/shared/corpus/prose-variation";
-        std::vector<Counted<Story::Story>> list;
+        std::vector<Counted<::Story::Story>> list;
         if (std::filesystem::is_directory(folder)) {
             for (auto const & entry : std::filesystem::directory_iterator(folder)) {
                 if (entry.path().extension() == ".md") {
@@ -170,7 +170,7 @@ BENCHMARK(Compose)->ArgName("cold")->Arg(1)->Arg(0)->Unit(benchmark::kMillisecon
 /// The longest chapter from bytes, as opening a document does it.
 void LoadStory(benchmark::State & state)
 {
-    Story::Story const * longest = nullptr;
+    ::Story::Story const * longest = nullptr;
     for (auto const & chapter : Chapters()) {
         if (!longest || chapter->GetLength() > longest->GetLength()) {
             longest = chapter.Get();
@@ -184,7 +184,7 @@ void LoadStory(benchmark::State & state)
     longest->SaveBytes(out);
     for (auto _ : state) {
         ByteReader in(out.GetBytes());
-        Story::Story story;
+        ::Story::Story story;
         benchmark::DoNotOptimize(story.LoadBytes(in));
     }
     state.counters["units"] = static_cast<double>(longest->GetLength());

@@ -1,3 +1,4 @@
+#include "framework/kernel/Geometry.h"
 #include "framework/story/ByteStream.h"
 #include "story/FlowFixture.h"
 
@@ -12,7 +13,7 @@ namespace
 using namespace FlowTest;
 using namespace Story;
 
-Counted<Story::Story> MakeMixedStory()
+Counted<::Story::Story> MakeMixedStory()
 {
     StoryBuilder builder;
     auto const prose = [&](int count) {
@@ -63,12 +64,12 @@ TEST(FlowTerminationTest, EveryGeometryEndsAndLosesNoText)
     ASSERT_GT(expected, 300u);
     double const nan = std::numeric_limits<double>::quiet_NaN();
     double const infinite = std::numeric_limits<double>::infinity();
-    for (auto const & [width, height] : std::vector<std::pair<double, double>>{
-             {300, 20}, {300, 1}, {300, 0}, {300, -5}, {12, 500}, {1, 30}, {0, 0}, {-10, 50}, {nan, nan},
-             {infinite, infinite}, {300, 1e9}, {1e9, 100}}) {
-        SCOPED_TRACE(testing::Message() << width << " x " << height);
+    for (auto const & size : std::vector<Kernel::Size>{{300, 20}, {300, 1}, {300, 0}, {300, -5}, {12, 500}, {1, 30},
+                                                       {0, 0}, {-10, 50}, {nan, nan}, {infinite, infinite},
+                                                       {300, 1e9}, {1e9, 100}}) {
+        SCOPED_TRACE(testing::Message() << size.width << " x " << size.height);
         for (double const grid : {0.0, 12.0, 1e6, nan}) {
-            FrameSource const frames = [&](std::uint32_t) { return FrameGeometry{width, height, grid, 10}; };
+            FrameSource const frames = [&](std::uint32_t) { return FrameGeometry{size.width, size.height, grid, 10}; };
             auto const layout = Compose(*story, frames, {});
             EXPECT_FALSE(layout->IsOverset());
             EXPECT_EQ(CountLetters(*layout, u'w'), expected);
@@ -125,7 +126,7 @@ TEST(FlowTerminationTest, TextBehindTheLastFrameIsOverset)
 
 TEST(FlowTerminationTest, AnEmptyStoryHasOneEmptyFrame)
 {
-    auto const layout = Compose(Story::Story(), Frames(200, 36), {});
+    auto const layout = Compose(::Story::Story(), Frames(200, 36), {});
     ASSERT_EQ(layout->GetFrames().size(), 1u);
     EXPECT_EQ(layout->GetFrames()[0].m_LineCount, 0u);
 }

@@ -20,7 +20,7 @@ using Kernel::Counted;
 using Kernel::MakeCounted;
 
 /// "[Body]One two|[Heading]Three": paragraph styles and their text, for comparing whole stories at once.
-std::string Describe(Story::Story const & story)
+std::string Describe(::Story::Story const & story)
 {
     std::ostringstream out;
     for (std::size_t i = 0; i < story.GetParagraphs().size(); ++i) {
@@ -36,7 +36,7 @@ std::string Describe(Story::Story const & story)
     return out.str();
 }
 
-std::string DescribeRuns(Story::Story const & story)
+std::string DescribeRuns(::Story::Story const & story)
 {
     std::ostringstream out;
     std::size_t begin = 0;
@@ -47,14 +47,14 @@ std::string DescribeRuns(Story::Story const & story)
     return out.str();
 }
 
-Kernel::Hash128 HashOf(Story::Story const & story)
+Kernel::Hash128 HashOf(::Story::Story const & story)
 {
     Kernel::HashAccumulator hash;
     story.AccumulateHash(hash);
     return hash.Get128();
 }
 
-Counted<Story::Story> MakeText(std::vector<std::pair<std::string, std::string>> const & paragraphs)
+Counted<::Story::Story> MakeText(std::vector<std::pair<std::string, std::string>> const & paragraphs)
 {
     StoryBuilder builder;
     for (auto const & [style, text] : paragraphs) {
@@ -65,7 +65,7 @@ Counted<Story::Story> MakeText(std::vector<std::pair<std::string, std::string>> 
 }
 
 /// A story with one of everything, two notes deep.
-Counted<Story::Story> MakeRichStory()
+Counted<::Story::Story> MakeRichStory()
 {
     auto const strong = GlyphAtts::FromStyle("Strong");
     auto const link = MakeCounted<GlyphAtts const>(AttSet(), HyperlinkData::ToAnchor("uid-7", "other.md#seven"));
@@ -158,7 +158,7 @@ TEST(StoryTest, ReplacingTextKeepsTheAttributesOfThePartWithTheParagraphEnd)
 TEST(StoryTest, AppendingAStretchOfItselfOrOfAnotherStoryCopiesElementsThroughTheContext)
 {
     auto const story = MakeRichStory();
-    auto const anchorOf = [](Story::Story const & text, std::size_t i) {
+    auto const anchorOf = [](::Story::Story const & text, std::size_t i) {
         return dynamic_cast<AnchorGlyph const &>(*text.GetObjects()[i].m_Glyph).GetAnchorData();
     };
     for (bool const newIdentities : {false, true}) {
@@ -176,7 +176,7 @@ TEST(StoryTest, AppendingAStretchOfItselfOrOfAnotherStoryCopiesElementsThroughTh
 
     GlyphString end;
     end.AddChar32('\n');
-    Story::Story collated;
+    ::Story::Story collated;
     collated.AppendText(end, nullptr, nullptr);
     EXPECT_EQ(Describe(collated), "[]");
 }
@@ -248,7 +248,7 @@ TEST(StorySerialisationTest, ComesBackWithEverything)
     ByteWriter out;
     story->SaveBytes(out);
     ByteReader in(out.GetBytes());
-    Story::Story loaded;
+    ::Story::Story loaded;
     ASSERT_TRUE(loaded.LoadBytes(in));
     EXPECT_TRUE(in.IsComplete());
     EXPECT_EQ(Describe(loaded), Describe(*story));
@@ -280,7 +280,7 @@ TEST(StorySerialisationTest, DamagedBytesAreRefusedAndNeverHarm)
             }
         }
         ByteReader in(bad);
-        Story::Story loaded;
+        ::Story::Story loaded;
         if (!loaded.LoadBytes(in)) {
             ++refused;
             EXPECT_TRUE(loaded.Empty());
@@ -301,10 +301,10 @@ TEST(StoryTest, HashFollowsContentAndNotSharing)
         return HashOf(*copy);
     };
     GlyphCloneContext context(false);
-    EXPECT_NE(HashOf(*base), changed([&](Story::Story & s) { s.ReplaceText(3, 4, *MakeText({}), context); }));
+    EXPECT_NE(HashOf(*base), changed([&](::Story::Story & s) { s.ReplaceText(3, 4, *MakeText({}), context); }));
     EXPECT_NE(HashOf(*base),
-              changed([&](Story::Story & s) { s.FormatText(MakeDelta(ParagraphAtt::KeepWithNext, 1, false), 0, 1); }));
-    EXPECT_EQ(HashOf(*base), changed([&](Story::Story & s) {
+              changed([&](::Story::Story & s) { s.FormatText(MakeDelta(ParagraphAtt::KeepWithNext, 1, false), 0, 1); }));
+    EXPECT_EQ(HashOf(*base), changed([&](::Story::Story & s) {
                   dynamic_cast<AnchorGlyph const &>(*s.GetObjects()[0].m_Glyph).GetAnchorData()->SetUid("new");
               }))
         << "a uid that is given later moves nothing";

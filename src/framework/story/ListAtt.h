@@ -32,7 +32,8 @@ enum class ListAttFields : std::uint32_t
     All = 0xFFFFFFFFu
 };
 
-/// What makes a paragraph an item of a list. A paragraph that goes on inside an item has none, only its indents.
+/// What makes a paragraph an item of a list. A paragraph that goes on inside an item has the kind `None`: it stands
+/// under the item's text, without a marker.
 ///
 /// Items of one name and level count on from each other through a story; `IsRestartNumbering` begins again at
 /// `StartNumberingAt`. Levels count apart. A list whose global flag is set runs on through the chapters of a book.
