@@ -75,6 +75,8 @@ TEST(IndexTopicTest, RefusesRings)
     EXPECT_FALSE(a->AddCrossReference(b));
     EXPECT_TRUE(a->IsDirectlyRelatedTo(b));
     EXPECT_FALSE(b->IsDirectlyRelatedTo(a));
+    EXPECT_TRUE(a->RemoveCrossReference(b));
+    EXPECT_FALSE(a->RemoveCrossReference(b));
 }
 
 TEST(IndexTest, RemovingATopicLiftsWhatIsBelowAndUntiesReferencesAndContentBringsItBack)

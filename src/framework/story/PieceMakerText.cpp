@@ -14,6 +14,7 @@ constexpr double AscentPart = 0.75;
 constexpr double DescentPart = 0.25;
 // Between a list marker or note number and the text, in ems.
 constexpr double MarkerGap = 0.45;
+constexpr double LeastMarkerGap = 0.25;
 constexpr double UnlimitedWidth = 100000;
 constexpr double SmallestMeasure = 4;
 
@@ -214,8 +215,11 @@ void PieceMaker::SetMarker(Segment & segment, Edges & edges, std::size_t paragra
     auto const lines = m_Builder.Build(input, m_Arena);
     segment.m_MarkerLine = lines.m_FirstLine;
     segment.m_MarkerWidth = m_Arena.m_Lines[lines.m_FirstLine].m_SetWidth;
-    segment.m_MarkerGap = AsFloat(style.m_Glyph.m_Size * MarkerGap);
-    // A marker wider than its room starts at the room's edge and pushes the first line.
+    // A marker that is wide for its room moves closer to the text; one that is wider than its room starts at the room's
+    // edge and pushes the first line.
+    segment.m_MarkerGap = std::clamp(edges.m_MarkerRoom - segment.m_MarkerWidth,
+                                     AsFloat(style.m_Glyph.m_Size * LeastMarkerGap),
+                                     AsFloat(style.m_Glyph.m_Size * MarkerGap));
     edges.m_First = std::max(edges.m_First, segment.m_MarkerWidth + segment.m_MarkerGap - edges.m_MarkerRoom);
 }
 
