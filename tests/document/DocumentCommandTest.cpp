@@ -1,6 +1,6 @@
 #include "framework/commands/CommandException.h"
-#include "framework/commands/CompoundCommand.h"
 #include "framework/commands/ComposeTextCommand.h"
+#include "framework/commands/CompoundCommand.h"
 #include "framework/commands/ConvertFormatOrProfileCommand.h"
 #include "framework/commands/IndexTopicCommands.h"
 #include "framework/commands/ModifySectionCommand.h"
@@ -199,7 +199,8 @@ TEST_F(DocumentCommandTest, WhatOnlyServesOutputLeavesTheDocumentClean)
     Run(Kernel::MakeCounted<SetMetadataTimestampCommand>(SetMetadataTimestampCommand::Output, String()));
     Run(Kernel::MakeCounted<ComposeTextCommand>(true, nullptr));
     Run(Kernel::MakeCounted<UpdateRunningHeadersCommand>());
-    Run(Kernel::MakeCounted<ConvertFormatOrProfileCommand>(Raster::Format::Cmyka8, Raster::ICCManager::ICCProfileSet()));
+    Run(Kernel::MakeCounted<ConvertFormatOrProfileCommand>(Raster::Format::Cmyka8,
+                                                           Raster::ICCManager::ICCProfileSet()));
     EXPECT_FALSE(m_Document->IsDirty());
     EXPECT_FALSE(m_Document->GetMetadata()->GetValues().m_Output.Empty());
     EXPECT_EQ(m_Document->GetFormat(), Raster::Format::Cmyka8);
@@ -208,7 +209,8 @@ TEST_F(DocumentCommandTest, WhatOnlyServesOutputLeavesTheDocumentClean)
 TEST_F(DocumentCommandTest, UndoTakesAConversionOffAndNothingElse)
 {
     Open(DocumentBuilder().Paragraph("Words."));
-    Run(Kernel::MakeCounted<ConvertFormatOrProfileCommand>(Raster::Format::Cmyka8, Raster::ICCManager::ICCProfileSet()));
+    Run(Kernel::MakeCounted<ConvertFormatOrProfileCommand>(Raster::Format::Cmyka8,
+                                                           Raster::ICCManager::ICCProfileSet()));
     Run(Kernel::MakeCounted<InsertTextCommand>("Late ", Select(0, 0)));
     Run(Kernel::MakeCounted<UndoCommand>());
     EXPECT_EQ(m_Document->GetFormat(), Raster::Format::Rgba8);
@@ -222,8 +224,9 @@ TEST_F(DocumentCommandTest, TextCommandsChangeTheTextAndItsPages)
     Open(DocumentBuilder().Paragraphs(20));
     int const pages = Node().GetPageCount();
     std::size_t const length = Node().GetMainFlow()->GetStory()->GetLength();
-    Run(Kernel::MakeCounted<PasteStoryCommand>(Kernel::NonCounted<Story::Story const>(DocumentBuilder().Paragraphs(40).Text().Get()),
-                                               nullptr, nullptr, false, Select(length, length)));
+    Run(Kernel::MakeCounted<PasteStoryCommand>(
+        Kernel::NonCounted<Story::Story const>(DocumentBuilder().Paragraphs(40).Text().Get()), nullptr, nullptr, false,
+        Select(length, length)));
     EXPECT_LT(pages, Node().GetPageCount());
     EXPECT_EQ(static_cast<std::size_t>(Node().GetPageCount()), Node().GetMainFlow()->GetFrames().size());
     Run(Kernel::MakeCounted<UndoCommand>());
@@ -238,7 +241,8 @@ TEST_F(DocumentCommandTest, ANotesStartNumberIsChangedInPlace)
     att->SetStartNumberingAt(12);
     att->SetNumberingMode(Story::NoteAtt::InDocument);
     Run(Kernel::MakeCounted<ChangeNoteCommand>(att, 8ULL, Select(5, 5)));
-    Kernel::Counted<Story::NoteAtt const> const changed = Story::GetNoteAtt(Node().GetMainFlow()->GetStory()->GetGlyph(5));
+    Kernel::Counted<Story::NoteAtt const> const changed =
+        Story::GetNoteAtt(Node().GetMainFlow()->GetStory()->GetGlyph(5));
     ASSERT_TRUE(changed);
     EXPECT_EQ(changed->GetStartNumberingAt(), 12);
     // Only the named field.
@@ -301,7 +305,8 @@ TEST_F(DocumentCommandTest, EachChangeTellsWhatItChanged)
     Run(Kernel::MakeCounted<InsertTextCommand>("X", Select(0, 0)));
     EXPECT_THAT(recorder.Take(), ElementsAre("story", "anchors", "(story)", "(anchors)"));
 
-    Run(Kernel::MakeCounted<Commands::RenameIndexTopicCommand>(Node().GetIndex()->FindTopicByName("Animals", false), "Beasts"));
+    Run(Kernel::MakeCounted<Commands::RenameIndexTopicCommand>(Node().GetIndex()->FindTopicByName("Animals", false),
+                                                               "Beasts"));
     EXPECT_THAT(recorder.Take(), testing::Contains("topics"));
 
     Run(Kernel::MakeCounted<PreflightCheckDocumentCommand>(PreflightForOperation::Check));
@@ -322,7 +327,8 @@ TEST_F(DocumentCommandTest, EachChangeTellsWhatItChanged)
 TEST_F(DocumentCommandTest, MarksFollowTheirRenamedTopic)
 {
     Open(DocumentBuilder().IndexMark("Animals"));
-    Run(Kernel::MakeCounted<Commands::RenameIndexTopicCommand>(Node().GetIndex()->FindTopicByName("Animals", false), "Beasts"));
+    Run(Kernel::MakeCounted<Commands::RenameIndexTopicCommand>(Node().GetIndex()->FindTopicByName("Animals", false),
+                                                               "Beasts"));
     auto const markedTopic = [this] {
         Kernel::Counted<Story::Glyph const> const glyph = Node().GetMainFlow()->GetStory()->GetGlyph(0);
         return dynamic_cast<Story::IndexMarkGlyph const &>(*glyph).GetTopicNameWithParents();

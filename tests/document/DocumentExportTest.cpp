@@ -217,7 +217,8 @@ TEST(DocumentExportTest, LinksCoverTheirWordsAndLeadToTheirTargets)
     EXPECT_EQ(links[2]->m_PageIndex, document->GetDocument()->GetPageCount() - 1);
     links.clear();
     HyperlinkVisitor::CollateForExport(
-        document, document->GetDocument()->GetSpreadAtIndex(document->GetDocument()->GetSpreadCount() - 1).Get(), links);
+        document, document->GetDocument()->GetSpreadAtIndex(document->GetDocument()->GetSpreadCount() - 1).Get(),
+        links);
     ASSERT_EQ(links.size(), 1U);
     EXPECT_EQ(links[0]->m_PageIndex, 0);
 }
@@ -264,7 +265,8 @@ class ExportAllCommand : public ExportItemCommandBase
 {
 public:
     explicit ExportAllCommand(Renderer::RenderTree::PdfExport & pdf)
-        : ExportItemCommandBase(false, true, nullptr, true), m_Pdf(pdf)
+        : ExportItemCommandBase(false, true, nullptr, true),
+          m_Pdf(pdf)
     {
     }
     Kernel::LocalisedString GetDescription() const override { return {"Export", "Test"}; }
@@ -273,8 +275,9 @@ public:
         DomainWriterUnlockSession const unlocked(Kernel::Counted<DomainController>(GetDocument().Get()));
         std::vector<Params> const pages = PagesOf(*GetDocument());
         for (std::size_t i = 0; i < pages.size(); ++i) {
-            EXPECT_EQ(ExportResultOk, ExportPDFPage(m_Pdf, pages, i, 0, Kernel::MakeCounted<Renderer::FileExportOptionsPDF>(),
-                                                    {}, nullptr, nullptr));
+            EXPECT_EQ(ExportResultOk,
+                      ExportPDFPage(m_Pdf, pages, i, 0, Kernel::MakeCounted<Renderer::FileExportOptionsPDF>(), {},
+                                    nullptr, nullptr));
         }
     }
     void Notify(std::vector<Kernel::Counted<Kernel::Notification>> &) override {}
@@ -311,8 +314,9 @@ TEST(DocumentExportTest, AChapterComesOutAsPdf)
     // From the file, so that the glyphs are those that were saved.
     Kernel::Counted<DocumentController> const document = LoadTestDocument(folder / "chapter.kvdoc", nullptr);
 
-    Kernel::Counted<Renderer::RenderTree::PdfSchema> const schema = Kernel::MakeCounted<Renderer::RenderTree::PdfSchema>(
-        Kernel::MakeCounted<Renderer::FileExportOptionsPDF>(), nullptr);
+    Kernel::Counted<Renderer::RenderTree::PdfSchema> const schema =
+        Kernel::MakeCounted<Renderer::RenderTree::PdfSchema>(Kernel::MakeCounted<Renderer::FileExportOptionsPDF>(),
+                                                             nullptr);
     Renderer::RenderTree::PdfExport pdf(schema, document->GetUnitConverter());
     Kernel::Counted<Kernel::MemoryOutStream> const stream = Kernel::MakeCounted<Kernel::MemoryOutStream>();
     ASSERT_TRUE(pdf.Create("chapter.pdf", stream, "", "On Foxes", "", ""));

@@ -207,7 +207,8 @@ TEST(DocumentFileTest, EveryChangedByteIsEitherHarmlessOrRefused)
         std::string changed = bytes;
         changed[i] = static_cast<char>(changed[i] ^ 0x55);
         int result = 0;
-        if (Kernel::Counted<DocumentController> const document = LoadTestDocument(folder.WriteFile("changed.kvdoc", changed), &result)) {
+        if (Kernel::Counted<DocumentController> const document =
+                LoadTestDocument(folder.WriteFile("changed.kvdoc", changed), &result)) {
             EXPECT_LT(0, document->GetDocument()->GetPageCount()) << "byte " << i;
         } else {
             EXPECT_NE(result, Failure::Success) << "byte " << i;
@@ -225,7 +226,8 @@ TEST(DocumentFileTest, DamagedGlyphsAreSetAnew)
     for (std::size_t i = bytes.size() / 2; i < bytes.size() / 2 + 64; ++i) {
         bytes[i] = static_cast<char>(~bytes[i]);
     }
-    Kernel::Counted<DocumentController> const document = LoadTestDocument(folder.WriteFile("damaged.kvdoc", bytes), nullptr);
+    Kernel::Counted<DocumentController> const document =
+        LoadTestDocument(folder.WriteFile("damaged.kvdoc", bytes), nullptr);
     ASSERT_TRUE(document);
     int const pages = document->GetDocument()->GetPageCount();
     EXPECT_FALSE(document->GetDocument()->GetMainFlow()->EnsureGlyphData());
@@ -313,7 +315,8 @@ TEST(DocumentFileTest, TwoThreadsMakeDocumentsAtOnce)
     other.join();
     // The same text gives the same pages on any thread.
     for (int i = 0; i < 4; ++i) {
-        EXPECT_EQ(LoadTestDocument(folder / std::to_string(10 + i), nullptr)->GetDocument()->GetMainFlow()->GetLayoutHash(),
-                  LoadTestDocument(folder / std::to_string(20 + i), nullptr)->GetDocument()->GetMainFlow()->GetLayoutHash());
+        EXPECT_EQ(
+            LoadTestDocument(folder / std::to_string(10 + i), nullptr)->GetDocument()->GetMainFlow()->GetLayoutHash(),
+            LoadTestDocument(folder / std::to_string(20 + i), nullptr)->GetDocument()->GetMainFlow()->GetLayoutHash());
     }
 }

@@ -108,9 +108,9 @@ TEST(PageShaperTest, PagesLieByTheirNumbers)
         {{1, 2, 3}, ChapterStart::RightPage, true, "R LR l"}, // ends on a left-hand page, so that the next begins right
         {{1, 2}, ChapterStart::RightPage, true, "R L"},
         {{4}, ChapterStart::RightPage, true, "L"},
-        {{1, 2, 8, 9}, ChapterStart::NextPage, true, "R L LR"},  // a section that breaks the row breaks the spread
+        {{1, 2, 8, 9}, ChapterStart::NextPage, true, "R L LR"}, // a section that breaks the row breaks the spread
         {{1, 3, 5}, ChapterStart::NextPage, true, "R R R"},
-        {{1, 2, 3}, ChapterStart::RightPage, false, "S S S"},    // single sheets have no sides
+        {{1, 2, 3}, ChapterStart::RightPage, false, "S S S"}, // single sheets have no sides
     };
     for (auto const & row : rows) {
         PageSetup setup;

@@ -78,9 +78,9 @@ DocumentBuilder & DocumentBuilder::Title(String const & title)
 
 DocumentBuilder & DocumentBuilder::Heading(String const & text, int level, String const & uid)
 {
-    m_Story->AppendObject(Kernel::MakeCounted<Story::AnchorGlyph>(
-                             Kernel::MakeCounted<Story::AnchorData>(text, true, true, uid, level)),
-                         nullptr);
+    m_Story->AppendObject(
+        Kernel::MakeCounted<Story::AnchorGlyph>(Kernel::MakeCounted<Story::AnchorData>(text, true, true, uid, level)),
+        nullptr);
     m_Story->AppendText(text, nullptr);
     m_Story->EndParagraph(Story::ParagraphAtts::FromStyle(Kernel::Format("Heading %1", level)));
     return *this;
@@ -107,9 +107,9 @@ DocumentBuilder & DocumentBuilder::Paragraphs(int count)
 
 DocumentBuilder & DocumentBuilder::Anchor(String const & name, String const & uid)
 {
-    m_Story->AppendObject(Kernel::MakeCounted<Story::AnchorGlyph>(
-                             Kernel::MakeCounted<Story::AnchorData>(name, false, false, uid)),
-                         nullptr);
+    m_Story->AppendObject(
+        Kernel::MakeCounted<Story::AnchorGlyph>(Kernel::MakeCounted<Story::AnchorData>(name, false, false, uid)),
+        nullptr);
     return Paragraph(String("Here is ") + name.View() + ".");
 }
 

@@ -2,8 +2,8 @@
 
 #include "framework/commands/DocumentCommandBase.h"
 
-/// Brings layouts and pages in step with the text. Next to free where nothing has changed. Not a step of the history; it
-/// makes the document dirty only if there are more or fewer pages afterwards.
+/// Brings layouts and pages in step with the text. Next to free where nothing has changed. Not a step of the history;
+/// it makes the document dirty only if there are more or fewer pages afterwards.
 class ComposeTextCommand : public PassingDocumentCommand
 {
 public:

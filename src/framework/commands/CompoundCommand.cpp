@@ -12,7 +12,9 @@ CommandRegistration const s_Compound(typeid(CompoundCommand), "CompoundCommand")
 }
 
 CompoundCommand::CompoundCommand(bool stackForUndo, bool skipFailures, bool notifyTogether)
-    : m_StackForUndo(stackForUndo), m_SkipFailures(skipFailures), m_NotifyTogether(notifyTogether)
+    : m_StackForUndo(stackForUndo),
+      m_SkipFailures(skipFailures),
+      m_NotifyTogether(notifyTogether)
 {
 }
 

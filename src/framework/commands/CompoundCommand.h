@@ -2,8 +2,8 @@
 
 #include "framework/commands/DocumentCommandBase.h"
 
-/// Several commands as one: done in order, undone in reverse, one step of the history. If one fails, those before it are
-/// undone and the failure goes on to the queue.
+/// Several commands as one: done in order, undone in reverse, one step of the history. If one fails, those before it
+/// are undone and the failure goes on to the queue.
 class CompoundCommand : public UndoableDocumentCommand
 {
 public:

@@ -8,7 +8,8 @@ class ConvertFormatOrProfileCommand : public PassingDocumentCommand
 {
 public:
     ConvertFormatOrProfileCommand(enum Raster::Format format, Raster::ICCManager::ICCProfileSet profiles)
-        : m_Profiles(std::move(profiles)), m_Format(format)
+        : m_Profiles(std::move(profiles)),
+          m_Format(format)
     {
     }
 

@@ -9,7 +9,10 @@
 class CommandRegistration
 {
 public:
-    CommandRegistration(std::type_info const & type, char const * name) { CommandCoverage::Instance().Register(type, name); }
+    CommandRegistration(std::type_info const & type, char const * name)
+    {
+        CommandCoverage::Instance().Register(type, name);
+    }
 };
 
 /// What the commands that change a document share: undo by putting back what stood there, and what they tell of it.

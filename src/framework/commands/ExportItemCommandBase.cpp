@@ -21,7 +21,10 @@ Renderer::BleedMargins BleedOf(ExportableInterface::ExportParams const & page)
 
 ExportItemCommandBase::ExportItemCommandBase(bool hasReporter, bool isFinal, Kernel::Counted<Kernel::Progress> progress,
                                              bool makePreview)
-    : m_Progress(std::move(progress)), m_HasReporter(hasReporter), m_IsFinal(isFinal), m_MakePreview(makePreview)
+    : m_Progress(std::move(progress)),
+      m_HasReporter(hasReporter),
+      m_IsFinal(isFinal),
+      m_MakePreview(makePreview)
 {
 }
 
@@ -81,7 +84,8 @@ enum ExportResult ExportItemCommandBase::ExportPDFPage(Renderer::RenderTree::Pdf
     }
     if (m_MakePreview && !m_PreviewBitmap && 0 < page.m_Rect.Width() && 0 < page.m_Rect.Height()) {
         double const scale = PreviewSide / std::max(page.m_Rect.Width(), page.m_Rect.Height());
-        Kernel::Counted<Renderer::RenderTree::Schema> const schema = Kernel::MakeCounted<Renderer::RenderTree::Schema>();
+        Kernel::Counted<Renderer::RenderTree::Schema> const schema =
+            Kernel::MakeCounted<Renderer::RenderTree::Schema>();
         schema->SetColourFormatAndProfiles(Raster::Format::Rgba8, GetDocument()->GetProfiles());
         auto const toPixels = Raster::AffineTransform::Params::Translation(-page.m_Rect.left, -page.m_Rect.top)
                                   .Then(Raster::AffineTransform::Params::Scale(scale, scale));

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "framework/commands/DocumentCommandBase.h"
-#include "framework/document/ExportResult.h"
 #include "framework/document/ExportableInterface.h"
+#include "framework/document/ExportResult.h"
 #include "framework/document/PagePainter.h"
 #include "framework/kernel/Abortable.h"
 #include "framework/kernel/FileIOException.h"
@@ -12,8 +12,8 @@
 
 /// Base of the commands that write pages of a document to a file. It changes nothing in the document.
 ///
-/// A derived command gives up the document's writer lock while it writes; pages are read under the reader lock here, one
-/// at a time.
+/// A derived command gives up the document's writer lock while it writes; pages are read under the reader lock here,
+/// one at a time.
 class ExportItemCommandBase : public PassingDocumentCommand, public Kernel::Abortable
 {
 public:
@@ -32,7 +32,10 @@ public:
     /// What a failed write means to the user.
     [[nodiscard]] static enum ExportResult ReasonToError(enum Kernel::FileIOException::Reason reason);
 
-    [[nodiscard]] ProgressType GetProgressType() override { return m_HasReporter && m_IsFinal ? ShowProgress : NoProgress; }
+    [[nodiscard]] ProgressType GetProgressType() override
+    {
+        return m_HasReporter && m_IsFinal ? ShowProgress : NoProgress;
+    }
     [[nodiscard]] bool * GetProgressAbortPointer() const override { return GetAbortPointer(); }
 
 protected:
@@ -40,8 +43,9 @@ protected:
     /// export and is 0 for a single file. `warnings` may be null; `progress` too. The result is `ExportResultOk`,
     /// `ExportResultAborted` or `ExportResultFailed`.
     enum ExportResult ExportPDFPage(Renderer::RenderTree::PdfExport & pdfExport,
-                                    std::vector<ExportableInterface::ExportParams> const & params, unsigned long long index,
-                                    int copy, Kernel::Counted<Renderer::FileExportOptionsPDF const> options,
+                                    std::vector<ExportableInterface::ExportParams> const & params,
+                                    unsigned long long index, int copy,
+                                    Kernel::Counted<Renderer::FileExportOptionsPDF const> options,
                                     VisibilityInterface::VisibilityTestOptions const & visibility,
                                     Kernel::Counted<Kernel::Progress> progress,
                                     std::vector<Renderer::RenderTree::Warning> * warnings);

@@ -43,7 +43,8 @@ void IndexTopicCommand::Undo()
     }
 }
 
-void IndexTopicCommand::RenameMarks(std::vector<std::pair<Kernel::Counted<Story::IndexTopic const>, String>> const & oldNames)
+void IndexTopicCommand::RenameMarks(
+    std::vector<std::pair<Kernel::Counted<Story::IndexTopic const>, String>> const & oldNames)
 {
     m_ChangedMarks.clear();
     std::map<String, String> renamed;
@@ -75,12 +76,13 @@ void IndexTopicCommand::Notify(std::vector<Kernel::Counted<Kernel::Notification>
     notifications.push_back(Kernel::MakeCounted<IndexTopicsChangedNotification>(Self()));
 }
 
-Kernel::JailCounted<Story::IndexTopic> IndexTopicCommand::Require(Story::Index const & index,
-                                                                  Kernel::Counted<Story::IndexTopic const> const & topic)
+Kernel::JailCounted<Story::IndexTopic>
+IndexTopicCommand::Require(Story::Index const & index, Kernel::Counted<Story::IndexTopic const> const & topic)
 {
     Kernel::JailCounted<Story::IndexTopic> found = topic ? index.GetMutableTopic(topic) : nullptr;
     if (!found) {
-        throw CommandException(Kernel::LocalisedString("The topic is not in the document's index any more.", "Index").ToString());
+        throw CommandException(
+            Kernel::LocalisedString("The topic is not in the document's index any more.", "Index").ToString());
     }
     return found;
 }

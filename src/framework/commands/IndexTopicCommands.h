@@ -15,8 +15,8 @@ protected:
     /// Makes the change; throws `CommandException` if it can't.
     virtual void Change(Story::Index & index) = 0;
     /// The topic for changing; throws if it is null or not in the index.
-    [[nodiscard]] static Kernel::JailCounted<Story::IndexTopic> Require(Story::Index const & index,
-                                                                        Kernel::Counted<Story::IndexTopic const> const & topic);
+    [[nodiscard]] static Kernel::JailCounted<Story::IndexTopic>
+    Require(Story::Index const & index, Kernel::Counted<Story::IndexTopic const> const & topic);
 
 private:
     /// Marks in the text name their topic in full: brings those that a change of names has left behind in step. Marks
@@ -56,7 +56,8 @@ class SetIndexTopicTextCommand : public IndexTopicCommand
 {
 protected:
     SetIndexTopicTextCommand(Kernel::Counted<Story::IndexTopic const> topic, String text)
-        : m_Topic(std::move(topic)), m_Text(std::move(text))
+        : m_Topic(std::move(topic)),
+          m_Text(std::move(text))
     {
     }
 
@@ -108,8 +109,10 @@ protected:
 class IndexTopicPairCommand : public IndexTopicCommand
 {
 protected:
-    IndexTopicPairCommand(Kernel::Counted<Story::IndexTopic const> topic, Kernel::Counted<Story::IndexTopic const> other)
-        : m_Topic(std::move(topic)), m_Other(std::move(other))
+    IndexTopicPairCommand(Kernel::Counted<Story::IndexTopic const> topic,
+                          Kernel::Counted<Story::IndexTopic const> other)
+        : m_Topic(std::move(topic)),
+          m_Other(std::move(other))
     {
     }
 
@@ -121,7 +124,8 @@ protected:
 class ReparentIndexTopicCommand : public IndexTopicPairCommand
 {
 public:
-    ReparentIndexTopicCommand(Kernel::Counted<Story::IndexTopic const> topic, Kernel::Counted<Story::IndexTopic const> parent)
+    ReparentIndexTopicCommand(Kernel::Counted<Story::IndexTopic const> topic,
+                              Kernel::Counted<Story::IndexTopic const> parent)
         : IndexTopicPairCommand(std::move(topic), std::move(parent))
     {
     }
@@ -134,7 +138,8 @@ protected:
 class AddIndexCrossReferenceCommand : public IndexTopicPairCommand
 {
 public:
-    AddIndexCrossReferenceCommand(Kernel::Counted<Story::IndexTopic const> topic, Kernel::Counted<Story::IndexTopic const> other)
+    AddIndexCrossReferenceCommand(Kernel::Counted<Story::IndexTopic const> topic,
+                                  Kernel::Counted<Story::IndexTopic const> other)
         : IndexTopicPairCommand(std::move(topic), std::move(other))
     {
     }
@@ -147,7 +152,8 @@ protected:
 class DeleteIndexCrossReferenceCommand : public IndexTopicPairCommand
 {
 public:
-    DeleteIndexCrossReferenceCommand(Kernel::Counted<Story::IndexTopic const> topic, Kernel::Counted<Story::IndexTopic const> other)
+    DeleteIndexCrossReferenceCommand(Kernel::Counted<Story::IndexTopic const> topic,
+                                     Kernel::Counted<Story::IndexTopic const> other)
         : IndexTopicPairCommand(std::move(topic), std::move(other))
     {
     }
@@ -161,7 +167,10 @@ protected:
 class DeleteIndexTopicCommand : public IndexTopicCommand
 {
 public:
-    explicit DeleteIndexTopicCommand(std::vector<Kernel::Counted<Story::IndexTopic const>> topics) : m_Topics(std::move(topics)) {}
+    explicit DeleteIndexTopicCommand(std::vector<Kernel::Counted<Story::IndexTopic const>> topics)
+        : m_Topics(std::move(topics))
+    {
+    }
     [[nodiscard]] Kernel::LocalisedString GetDescription() const override;
 
 protected:

@@ -19,7 +19,8 @@ std::vector<DocumentSection::Values> ValuesOf(DocumentNode const & document)
     return values;
 }
 
-std::vector<DocumentSection::Values>::iterator Find(std::vector<DocumentSection::Values> & sections, unsigned int startPageIndex)
+std::vector<DocumentSection::Values>::iterator Find(std::vector<DocumentSection::Values> & sections,
+                                                    unsigned int startPageIndex)
 {
     return std::find_if(sections.begin(), sections.end(),
                         [startPageIndex](auto const & values) { return startPageIndex == values.m_StartPageIndex; });
@@ -34,7 +35,8 @@ void SetSections(DocumentController & controller, std::vector<DocumentSection::V
 
 String NoSection(unsigned int page)
 {
-    return Kernel::Format(Kernel::LocalisedString("No section begins at page %1 of the document.", "Sections"), page + 1);
+    return Kernel::Format(Kernel::LocalisedString("No section begins at page %1 of the document.", "Sections"),
+                          page + 1);
 }
 
 }
@@ -90,8 +92,9 @@ void InsertSectionCommand::Do()
 {
     std::vector<DocumentSection::Values> sections = ValuesOf(Tree());
     if (Find(sections, m_Values.m_StartPageIndex) != sections.end()) {
-        throw CommandException(Kernel::Format(
-            Kernel::LocalisedString("A section begins at page %1 already.", "Sections"), m_Values.m_StartPageIndex + 1));
+        throw CommandException(
+            Kernel::Format(Kernel::LocalisedString("A section begins at page %1 already.", "Sections"),
+                           m_Values.m_StartPageIndex + 1));
     }
     m_Before = sections;
     sections.push_back(m_Values);
@@ -118,9 +121,9 @@ void DeleteSectionCommand::Do()
     std::vector<DocumentSection::Values> sections = ValuesOf(Tree());
     auto const section = Find(sections, m_StartPageIndex);
     if (section == sections.end() || section == sections.begin()) {
-        throw CommandException(section == sections.end()
-                                   ? NoSection(m_StartPageIndex)
-                                   : String(Kernel::LocalisedString("A document keeps its first section.", "Sections")));
+        throw CommandException(section == sections.end() ? NoSection(m_StartPageIndex)
+                                                         : String(Kernel::LocalisedString(
+                                                               "A document keeps its first section.", "Sections")));
     }
     m_Before = sections;
     sections.erase(section);

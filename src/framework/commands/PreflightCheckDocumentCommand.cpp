@@ -24,8 +24,8 @@ private:
     {
         if (!Kernel::FileSystem::Exists(node.GetPath())) {
             Kernel::JailCounted<SpreadNode> const spread = node.GetSpreadNode();
-            m_Results.push_back({PreflightResult::Status::Error, PreflightResult::Problem::MissingPicture, node.GetPath(),
-                                 spread ? spread->GetFirstPageIndex() : -1});
+            m_Results.push_back({PreflightResult::Status::Error, PreflightResult::Problem::MissingPicture,
+                                 node.GetPath(), spread ? spread->GetFirstPageIndex() : -1});
         }
     }
 
@@ -51,7 +51,8 @@ void CheckFlow(TextFlow const & flow, std::vector<PreflightResult> & results)
             results.push_back({PreflightResult::Status::Warning, PreflightResult::Problem::MissingFont, subject, page});
             break;
         case Kind::PictureMissing:
-            results.push_back({PreflightResult::Status::Error, PreflightResult::Problem::MissingPicture, subject, page});
+            results.push_back(
+                {PreflightResult::Status::Error, PreflightResult::Problem::MissingPicture, subject, page});
             break;
         case Kind::Overset:
         case Kind::Clipped:
@@ -81,7 +82,8 @@ void PreflightCheckDocumentCommand::Do()
         Kernel::TimeStamp time;
         if (!entry.m_SourcePath.Empty() && Kernel::FileSystem::GetModifiedTime(entry.m_SourcePath, time) &&
             time != entry.m_SourceTime) {
-            results.push_back({PreflightResult::Status::Warning, PreflightResult::Problem::ChangedPicture, entry.m_SourcePath, -1});
+            results.push_back(
+                {PreflightResult::Status::Warning, PreflightResult::Problem::ChangedPicture, entry.m_SourcePath, -1});
         }
     }
     PlacedPictureCheck(results).Visit(document.GetDocument());
@@ -90,7 +92,8 @@ void PreflightCheckDocumentCommand::Do()
     }
     if (PreflightForOperation::Export == m_Operation) {
         // Output shows everything that is wrong; what merely may look better is left out.
-        std::erase_if(results, [](PreflightResult const & result) { return PreflightResult::Status::Error != result.m_Status; });
+        std::erase_if(results,
+                      [](PreflightResult const & result) { return PreflightResult::Status::Error != result.m_Status; });
     }
     document.SetPreflightResults(Kernel::MakeCounted<PreflightResults>(std::move(results)));
 }

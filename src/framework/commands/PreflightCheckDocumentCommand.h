@@ -2,8 +2,9 @@
 
 #include "framework/commands/DocumentCommandBase.h"
 
-/// Looks for what would spoil the output: pictures that are missing or have changed since they were taken in, fonts that
-/// are not installed, characters that no font has, text without a place. The results hang in the document afterwards.
+/// Looks for what would spoil the output: pictures that are missing or have changed since they were taken in, fonts
+/// that are not installed, characters that no font has, text without a place. The results hang in the document
+/// afterwards.
 class PreflightCheckDocumentCommand : public PassingDocumentCommand
 {
 public:

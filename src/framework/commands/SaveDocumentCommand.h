@@ -13,8 +13,8 @@ public:
 
     /// Shows progress, which a document that nobody has in front does not.
     bool m_ShowProgress = true;
-    /// The document's last user has let go: if its file can't be written, a `DocumentSaveFailedNotification` tells so, and
-    /// the changed document is kept beside the file under a name that it states.
+    /// The document's last user has let go: if its file can't be written, a `DocumentSaveFailedNotification` tells so,
+    /// and the changed document is kept beside the file under a name that it states.
     bool m_KeepOnFailure = false;
 
     [[nodiscard]] bool IsCloseAfterwards() const { return m_CloseAfterwards; }

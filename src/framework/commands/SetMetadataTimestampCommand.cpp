@@ -16,7 +16,9 @@ Kernel::LocalisedString SetMetadataTimestampCommand::GetDescription() const
 void SetMetadataTimestampCommand::Do()
 {
     DocumentMetadata::Values values = GetDocument()->GetMetadata()->GetValues();
-    String & stamp = Created == m_Action ? values.m_Created : Modified == m_Action ? values.m_Modified : values.m_Output;
+    String & stamp = Created == m_Action    ? values.m_Created
+                     : Modified == m_Action ? values.m_Modified
+                                            : values.m_Output;
     stamp = m_Time.Empty() ? DocumentController::GetTimeText() : m_Time;
     GetDocument()->SetMetadata(std::move(values));
     if (Output != m_Action) {

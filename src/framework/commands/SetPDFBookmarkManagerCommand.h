@@ -6,7 +6,10 @@
 class SetPDFBookmarkManagerCommand : public UndoableDocumentCommand
 {
 public:
-    explicit SetPDFBookmarkManagerCommand(Kernel::Counted<PDFBookmarkManager const> manager) : m_Manager(std::move(manager)) {}
+    explicit SetPDFBookmarkManagerCommand(Kernel::Counted<PDFBookmarkManager const> manager)
+        : m_Manager(std::move(manager))
+    {
+    }
 
     [[nodiscard]] Kernel::LocalisedString GetDescription() const override;
     void Do() override;

@@ -34,7 +34,6 @@ void StoryCommand::Do()
         story.SwapContent(*m_Other);
         throw;
     }
-    m_Selection->GetTextFlow()->SetDirty();
     GetDocument()->SetTextDirty();
     GetDocument()->SetAnchorsOutOfDate();
 }
@@ -42,7 +41,6 @@ void StoryCommand::Do()
 void StoryCommand::Exchange()
 {
     m_Selection->GetTextFlow()->GetStory()->SwapContent(*m_Other);
-    m_Selection->GetTextFlow()->SetDirty();
     GetDocument()->SetTextDirty();
     GetDocument()->SetAnchorsOutOfDate();
 }
@@ -82,7 +80,9 @@ std::size_t StoryCommand::GetEnd(Story::Story const & story) const
 
 FormatTextCommand::FormatTextCommand(Kernel::Counted<Story::Delta const> const & delta, enum TextDefault::Type, bool,
                                      bool wholeParagraphs, bool, Kernel::Counted<Selection const> selection)
-    : StoryCommand(std::move(selection)), m_Delta(delta), m_WholeParagraphs(wholeParagraphs)
+    : StoryCommand(std::move(selection)),
+      m_Delta(delta),
+      m_WholeParagraphs(wholeParagraphs)
 {
     KORVANE_ASSERT(m_Delta);
 }
@@ -127,14 +127,17 @@ void ChangeNoteCommand::Change(Story::Story & story)
         }
     }
     if (!found) {
-        throw CommandException(Kernel::LocalisedString("There is no note in the selected text.", "Text commands").ToString());
+        throw CommandException(
+            Kernel::LocalisedString("There is no note in the selected text.", "Text commands").ToString());
     }
 }
 
-PasteStoryCommand::PasteStoryCommand(Kernel::NonCounted<Story::Story const> story, Kernel::Counted<Story::TableGlyph const> table,
+PasteStoryCommand::PasteStoryCommand(Kernel::NonCounted<Story::Story const> story,
+                                     Kernel::Counted<Story::TableGlyph const> table,
                                      Kernel::Counted<Story::StyleSheet const> styles, bool asPlainText,
                                      Kernel::Counted<Selection const> selection)
-    : StoryCommand(std::move(selection)), m_Styles(std::move(styles))
+    : StoryCommand(std::move(selection)),
+      m_Styles(std::move(styles))
 {
     Story::StoryBuilder builder;
     if (table) {
@@ -268,7 +271,8 @@ void SetAnchorDataGUIDCommand::Do()
         }
     }
     if (!m_Found) {
-        throw CommandException(Kernel::LocalisedString("The anchor is not in the document any more.", "Anchors").ToString());
+        throw CommandException(
+            Kernel::LocalisedString("The anchor is not in the document any more.", "Anchors").ToString());
     }
     m_Before = m_Found->GetUid();
     m_Found->SetUid(m_Uid);

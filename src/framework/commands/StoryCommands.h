@@ -75,8 +75,11 @@ class ChangeNoteCommand : public StoryCommand
 {
 public:
     /// \param fields bits of `Story::NoteAtt::Fields`
-    ChangeNoteCommand(Kernel::Counted<Story::NoteAtt const> att, unsigned long long fields, Kernel::Counted<Selection const> selection)
-        : StoryCommand(std::move(selection)), m_Att(std::move(att)), m_Fields(fields)
+    ChangeNoteCommand(Kernel::Counted<Story::NoteAtt const> att, unsigned long long fields,
+                      Kernel::Counted<Selection const> selection)
+        : StoryCommand(std::move(selection)),
+          m_Att(std::move(att)),
+          m_Fields(fields)
     {
     }
 
@@ -99,7 +102,8 @@ public:
     /// \param styles styles that the story uses; those that the document lacks are added; may be null
     /// \param asPlainText the text comes without its attributes
     PasteStoryCommand(Kernel::NonCounted<Story::Story const> story, Kernel::Counted<Story::TableGlyph const> table,
-                      Kernel::Counted<Story::StyleSheet const> styles, bool asPlainText, Kernel::Counted<Selection const> selection);
+                      Kernel::Counted<Story::StyleSheet const> styles, bool asPlainText,
+                      Kernel::Counted<Selection const> selection);
 
     [[nodiscard]] Kernel::LocalisedString GetDescription() const override;
     void Do() override;
@@ -123,7 +127,8 @@ class InsertTextCommand : public StoryCommand
 {
 public:
     InsertTextCommand(String text, Kernel::Counted<Selection const> selection)
-        : StoryCommand(std::move(selection)), m_Text(std::move(text))
+        : StoryCommand(std::move(selection)),
+          m_Text(std::move(text))
     {
     }
 
@@ -161,7 +166,8 @@ class SetAnchorDataGUIDCommand : public UndoableDocumentCommand
 {
 public:
     SetAnchorDataGUIDCommand(Kernel::Counted<Story::AnchorData const> anchor, String uid)
-        : m_Anchor(std::move(anchor)), m_Uid(std::move(uid))
+        : m_Anchor(std::move(anchor)),
+          m_Uid(std::move(uid))
     {
     }
 

@@ -1,6 +1,5 @@
 #include "framework/commands/UndoCommand.h"
 
-
 namespace
 {
 

@@ -2,8 +2,8 @@
 
 #include "framework/commands/DocumentCommandBase.h"
 
-/// Takes back the document's last step. A conversion for output that is in force counts as the last step: it lies on top
-/// of the document, whatever was edited since, and only it is taken off then. With nothing to undo it does nothing.
+/// Takes back the document's last step. A conversion for output that is in force counts as the last step: it lies on
+/// top of the document, whatever was edited since, and only it is taken off then. With nothing to undo it does nothing.
 class UndoCommand : public PassingDocumentCommand
 {
 public:

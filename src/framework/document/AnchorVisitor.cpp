@@ -29,7 +29,11 @@ private:
 
 }
 
-AnchorVisitor::AnchorVisitor(bool bookmarksOnly) : m_Anchors(Kernel::MakeCounted<Anchors>()), m_BookmarksOnly(bookmarksOnly) {}
+AnchorVisitor::AnchorVisitor(bool bookmarksOnly)
+    : m_Anchors(Kernel::MakeCounted<Anchors>()),
+      m_BookmarksOnly(bookmarksOnly)
+{
+}
 
 AnchorVisitor::~AnchorVisitor() = default;
 
@@ -41,7 +45,8 @@ void AnchorVisitor::Visit(Kernel::JailNonCounted<Node> node)
         std::vector<Story::CollectedAnchor> const anchors = Story::CollectAnchors(*flow->GetStory());
         for (std::size_t i = 0; i < anchors.size(); ++i) {
             if (!m_BookmarksOnly || anchors[i].m_Data->IsPDFBookmark()) {
-                m_Anchors->Add(Kernel::MakeCounted<AnchorInstance>(anchors[i].m_Data, flow, i, anchors[i].m_StoryOffset));
+                m_Anchors->Add(
+                    Kernel::MakeCounted<AnchorInstance>(anchors[i].m_Data, flow, i, anchors[i].m_StoryOffset));
             }
         }
     }
@@ -58,8 +63,9 @@ void AnchorVisitor::GetSortedAndFiltered(Kernel::Counted<DocumentController cons
     }
 }
 
-Kernel::Counted<AnchorInstance const> AnchorVisitor::GetParentInstance(Kernel::Counted<DocumentController const>,
-                                                                       Kernel::Counted<AnchorInstance const> anchor) const
+Kernel::Counted<AnchorInstance const>
+AnchorVisitor::GetParentInstance(Kernel::Counted<DocumentController const>,
+                                 Kernel::Counted<AnchorInstance const> anchor) const
 {
     Kernel::Counted<AnchorInstance const> parent;
     for (Kernel::Counted<AnchorInstance const> const & candidate : *m_Anchors) {
@@ -70,8 +76,9 @@ Kernel::Counted<AnchorInstance const> AnchorVisitor::GetParentInstance(Kernel::C
             continue;
         }
         // An anchor without a level hangs under whatever heading stands before it.
-        bool const stands = 0 < candidate->GetOutlineLevel() &&
-                            (0 == anchor->GetOutlineLevel() || candidate->GetOutlineLevel() < anchor->GetOutlineLevel());
+        bool const stands =
+            0 < candidate->GetOutlineLevel() &&
+            (0 == anchor->GetOutlineLevel() || candidate->GetOutlineLevel() < anchor->GetOutlineLevel());
         if (stands) {
             parent = candidate;
         }

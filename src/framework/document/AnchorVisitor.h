@@ -23,8 +23,9 @@ public:
                               std::vector<Kernel::Counted<AnchorInstance const>> & anchors) const;
     /// The nearest anchor before it, among the bookmarks, whose heading stands higher in the outline; null at the top.
     /// The same objects as in the sorted list are returned.
-    [[nodiscard]] Kernel::Counted<AnchorInstance const> GetParentInstance(Kernel::Counted<DocumentController const> document,
-                                                                          Kernel::Counted<AnchorInstance const> anchor) const;
+    [[nodiscard]] Kernel::Counted<AnchorInstance const>
+    GetParentInstance(Kernel::Counted<DocumentController const> document,
+                      Kernel::Counted<AnchorInstance const> anchor) const;
 
 private:
     Kernel::Counted<Anchors> m_Anchors;

@@ -3,15 +3,19 @@
 #include "framework/document/Selection.h"
 #include "framework/document/SpreadNode.h"
 
-AnchorInstance::AnchorInstance(Kernel::Counted<Story::AnchorData> anchor, Kernel::Counted<TextFlow> flow, std::size_t index,
-                               std::size_t offset)
-    : m_Anchor(std::move(anchor)), m_Flow(std::move(flow)), m_Index(index), m_Offset(offset)
+AnchorInstance::AnchorInstance(Kernel::Counted<Story::AnchorData> anchor, Kernel::Counted<TextFlow> flow,
+                               std::size_t index, std::size_t offset)
+    : m_Anchor(std::move(anchor)),
+      m_Flow(std::move(flow)),
+      m_Index(index),
+      m_Offset(offset)
 {
     KORVANE_ASSERT(m_Anchor);
 }
 
 AnchorInstance::AnchorInstance(Kernel::Counted<Story::AnchorData> anchor, int chapterIndex)
-    : m_Anchor(std::move(anchor)), m_ChapterIndex(chapterIndex)
+    : m_Anchor(std::move(anchor)),
+      m_ChapterIndex(chapterIndex)
 {
     KORVANE_ASSERT(m_Anchor);
 }
@@ -50,7 +54,8 @@ Kernel::Counted<Selection> AnchorInstance::CreateSelection() const
     if (!frame) {
         return Kernel::MakeCounted<Selection>(Selection::Nodes());
     }
-    return Kernel::MakeCounted<Selection>(m_Flow, m_Offset, frame, Kernel::Rect{inFrame.x, inFrame.y, inFrame.x, inFrame.y});
+    return Kernel::MakeCounted<Selection>(m_Flow, m_Offset, frame,
+                                          Kernel::Rect{inFrame.x, inFrame.y, inFrame.x, inFrame.y});
 }
 
 Anchors::Anchors() = default;

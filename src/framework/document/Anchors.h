@@ -37,8 +37,8 @@ public:
     /// Position of the chapter in its book; -1 for an anchor with a place.
     [[nodiscard]] int GetChapterIndex() const { return m_ChapterIndex; }
 
-    /// The spread that shows the anchor, with the top left of its line there. Null, with `point` left alone, for a blind
-    /// anchor and for text that found no place.
+    /// The spread that shows the anchor, with the top left of its line there. Null, with `point` left alone, for a
+    /// blind anchor and for text that found no place.
     Kernel::JailCounted<SpreadNode> GetSpreadAndTargetPoint(Kernel::PointT<double> & point) const;
     /// A selection of the anchor's place; null for a blind anchor.
     [[nodiscard]] Kernel::Counted<Selection> CreateSelection() const;

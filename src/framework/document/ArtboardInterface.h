@@ -3,7 +3,8 @@
 #include "framework/kernel/Countable.h"
 #include "framework/kernel/Geometry.h"
 
-/// The pages of a spread. Page indices count within the spread, from 0; an index out of range gives the empty rectangle.
+/// The pages of a spread. Page indices count within the spread, from 0; an index out of range gives the empty
+/// rectangle.
 class ArtboardInterface : public virtual Kernel::Countable
 {
 public:

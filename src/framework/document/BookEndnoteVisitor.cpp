@@ -38,7 +38,8 @@ Kernel::Counted<Story::Story> Paragraph(String const & text, char const * style)
 
 }
 
-Kernel::Counted<Selection const> BookEndnoteVisitor::FindCollatedBookEndnotes(Kernel::Counted<DocumentController const> document)
+Kernel::Counted<Selection const>
+BookEndnoteVisitor::FindCollatedBookEndnotes(Kernel::Counted<DocumentController const> document)
 {
     for (Kernel::Counted<TextFlow> const & flow : document->GetDocument()->GetTextFlows()) {
         Story::Story const & story = *flow->GetStory();
@@ -74,7 +75,8 @@ BookEndnoteVisitor::CollateBookEndnotesForChapter(Kernel::Counted<DocumentContro
                     collated->AppendText(Paragraph(String(), Story::StyleSheet::NoteTextStyle)->GetAll(), context);
                 }
                 collated->AppendText(
-                    Paragraph(document->GetMetadata()->GetTitle(), Story::StyleSheet::NotesHeadingStyle)->GetAll(), context);
+                    Paragraph(document->GetMetadata()->GetTitle(), Story::StyleSheet::NotesHeadingStyle)->GetAll(),
+                    context);
             }
             // The note's own paragraphs, with the number ahead of the first.
             Kernel::Counted<Story::Story> const note = reference->GetNote()->Clone();

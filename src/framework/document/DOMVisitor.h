@@ -11,8 +11,8 @@ class StoryInterface;
 
 /// A walk over a node tree: depth first, each node before its children, over the five child lists in their order.
 ///
-/// Translators are asked in the order of registration; the first that takes a node ends the asking for that node, not the
-/// walk. The walk stops when the visitor is aborted. The caller holds the document's reader lock.
+/// Translators are asked in the order of registration; the first that takes a node ends the asking for that node, not
+/// the walk. The walk stops when the visitor is aborted. The caller holds the document's reader lock.
 class DOMVisitor : public virtual Kernel::Abortable
 {
 public:

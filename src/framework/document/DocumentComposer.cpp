@@ -13,8 +13,9 @@ namespace
 bool HasFields(Story::Story const & story)
 {
     auto const objects = story.GetObjects();
-    return std::any_of(objects.begin(), objects.end(),
-                       [](auto const & object) { return Story::FieldGlyph::c_classUid == object.m_Glyph->GetClassUID(); });
+    return std::any_of(objects.begin(), objects.end(), [](auto const & object) {
+        return Story::FieldGlyph::c_classUid == object.m_Glyph->GetClassUID();
+    });
 }
 
 /// Text of a field within the text, whose page is not known while it is set.
@@ -114,9 +115,12 @@ bool DocumentComposer::ComposeFlow(TextFlow & flow, bool force)
     };
     Story::ComposeOptions options;
     options.m_NotesHeading = setup.m_NotesHeading;
-    options.m_FieldText = [this](Story::FieldGlyph const & field) { return Kernel::Utf8ToUtf16(FieldText(m_Controller, field)); };
+    options.m_FieldText = [this](Story::FieldGlyph const & field) {
+        return Kernel::Utf8ToUtf16(FieldText(m_Controller, field));
+    };
     Story::FlowComposer composer;
-    Kernel::Counted<Story::Layout> layout = composer.Compose(*flow.GetStory(), *m_Document.GetStyleSheet(), frames, options);
+    Kernel::Counted<Story::Layout> layout =
+        composer.Compose(*flow.GetStory(), *m_Document.GetStyleSheet(), frames, options);
     KORVANE_ASSERT(layout);
     flow.SetLayout(std::move(layout), hash, nullptr);
     return true;

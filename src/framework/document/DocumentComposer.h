@@ -4,12 +4,16 @@
 
 /// Brings a document's layouts and pages in step with its text, styles and sections.
 ///
-/// The main flow grows and shrinks the document: each of its frames gets a page, made from the masters, and the pages are
-/// laid on spreads by their numbers. Under the document's writer lock, or before anybody else knows it.
+/// The main flow grows and shrinks the document: each of its frames gets a page, made from the masters, and the pages
+/// are laid on spreads by their numbers. Under the document's writer lock, or before anybody else knows it.
 class DocumentComposer
 {
 public:
-    explicit DocumentComposer(DocumentController & document) : m_Controller(document), m_Document(*document.GetDocument()) {}
+    explicit DocumentComposer(DocumentController & document)
+        : m_Controller(document),
+          m_Document(*document.GetDocument())
+    {
+    }
 
     ComposeOutcome Compose(bool force, bool * abort);
 

@@ -1,11 +1,11 @@
 #include "framework/document/DocumentController.h"
 
-#include "framework/document/DOMVisitor.h"
 #include "framework/document/AnchorVisitor.h"
 #include "framework/document/DocumentComposer.h"
 #include "framework/document/DocumentFile.h"
 #include "framework/document/DocumentNotifications.h"
 #include "framework/document/DocumentStore.h"
+#include "framework/document/DOMVisitor.h"
 #include "framework/kernel/Clock.h"
 #include "framework/kernel/DomainWriterUnlockSession.h"
 #include "framework/kernel/Format.h"
@@ -45,12 +45,14 @@ Kernel::Consolidated<Raster::ICCProfile> DocumentController::GetProfile() const
     return facts->GetProfiles().ForSpace(Raster::SpaceOfFormat(facts->GetFormat()));
 }
 
-void DocumentController::SetFormatAndProfiles(enum Raster::Format format, Raster::ICCManager::ICCProfileSet const & profiles)
+void DocumentController::SetFormatAndProfiles(enum Raster::Format format,
+                                              Raster::ICCManager::ICCProfileSet const & profiles)
 {
     m_Facts.Change([&](DocumentFacts & facts) { facts.m_Colours = {format, profiles}; });
 }
 
-void DocumentController::SetFormatOverride(enum Raster::Format format, Raster::ICCManager::ICCProfileSet const & profiles)
+void DocumentController::SetFormatOverride(enum Raster::Format format,
+                                           Raster::ICCManager::ICCProfileSet const & profiles)
 {
     m_Facts.Change([&](DocumentFacts & facts) { facts.m_Override = DocumentFacts::ColourSettings{format, profiles}; });
 }
@@ -94,7 +96,10 @@ namespace
 class ProtectedImageFinder : public DOMVisitorT<ProtectedImageFinder>
 {
 public:
-    ProtectedImageFinder() { AddTerminatingTranslator<EmbeddedDocumentNode>(&ProtectedImageFinder::OnEmbeddedDocument); }
+    ProtectedImageFinder()
+    {
+        AddTerminatingTranslator<EmbeddedDocumentNode>(&ProtectedImageFinder::OnEmbeddedDocument);
+    }
     std::vector<Kernel::JailCounted<EmbeddedDocumentNode>> m_Found;
 
 private:
@@ -137,7 +142,8 @@ void DocumentController::EnsureGlyphs()
 {
     AcquireReaderLock();
     auto const & flows = m_Document->GetTextFlows();
-    bool const complete = std::all_of(flows.begin(), flows.end(), [](auto const & flow) { return flow->EnsureGlyphData(); });
+    bool const complete =
+        std::all_of(flows.begin(), flows.end(), [](auto const & flow) { return flow->EnsureGlyphData(); });
     ReleaseReaderLock();
     if (!complete) {
         AcquireWriterLock();
@@ -174,8 +180,8 @@ void DocumentController::ProcessCommand(Kernel::Counted<DomainCommand> command,
     }
 }
 
-void DocumentController::AppendComposeNotifications(ComposeOutcome const & outcome,
-                                                    std::vector<Kernel::Counted<Kernel::Notification>> & notifications) const
+void DocumentController::AppendComposeNotifications(
+    ComposeOutcome const & outcome, std::vector<Kernel::Counted<Kernel::Notification>> & notifications) const
 {
     Kernel::Counted<DocumentController const> const self(this);
     if (outcome.m_PagesChanged) {
@@ -199,12 +205,12 @@ void SetFailure(OpenDocumentFailedNotification & failure, Kernel::Archive::OpenR
     {
         Opened m_Opened;
         Failure::Result m_Result;
-    } table[] = {{Opened::Missing, Failure::FileNotFound},       {Opened::IsFolder, Failure::NotADocument},
+    } table[] = {{Opened::Missing, Failure::FileNotFound},          {Opened::IsFolder, Failure::NotADocument},
                  {Opened::PermissionDenied, Failure::AccessDenied}, {Opened::AccessDenied, Failure::AccessDenied},
-                 {Opened::Locked, Failure::LockedByOther},       {Opened::TooManyOpenFiles, Failure::OutOfResources},
-                 {Opened::ReadError, Failure::CannotReadFile},   {Opened::NotAnArchive, Failure::NotADocument},
-                 {Opened::OtherType, Failure::OtherFileType},    {Opened::NewerVersion, Failure::FutureVersion},
-                 {Opened::Truncated, Failure::Truncated},        {Opened::Corrupt, Failure::Corrupt}};
+                 {Opened::Locked, Failure::LockedByOther},          {Opened::TooManyOpenFiles, Failure::OutOfResources},
+                 {Opened::ReadError, Failure::CannotReadFile},      {Opened::NotAnArchive, Failure::NotADocument},
+                 {Opened::OtherType, Failure::OtherFileType},       {Opened::NewerVersion, Failure::FutureVersion},
+                 {Opened::Truncated, Failure::Truncated},           {Opened::Corrupt, Failure::Corrupt}};
     for (auto const & row : table) {
         if (opened == row.m_Opened) {
             failure.SetResult(row.m_Result, Kernel::Archive::GetResultText(opened, failure.GetPath()), String());
@@ -215,7 +221,8 @@ void SetFailure(OpenDocumentFailedNotification & failure, Kernel::Archive::OpenR
 }
 
 bool DocumentController::LoadDocument(String const & path, bool inFront, bool asCopy, enum LoadDocumentMode,
-                                      Kernel::Counted<LoadDocumentOptions const>, OpenDocumentFailedNotification & failure, bool)
+                                      Kernel::Counted<LoadDocumentOptions const>,
+                                      OpenDocumentFailedNotification & failure, bool)
 {
     Kernel::Archive::OpenResult opened = Kernel::Archive::OpenResult::Success;
     auto const mode = asCopy    ? Kernel::Archive::OpenMode::ReadUnlocked
@@ -280,8 +287,9 @@ String ToIsoTime(Kernel::TimeStamp time)
     std::chrono::hh_mm_ss const clock(moment - day);
     char text[32];
     std::snprintf(text, sizeof(text), "%04d-%02u-%02uT%02d:%02d:%02dZ", static_cast<int>(date.year()),
-                  static_cast<unsigned>(date.month()), static_cast<unsigned>(date.day()), static_cast<int>(clock.hours().count()),
-                  static_cast<int>(clock.minutes().count()), static_cast<int>(clock.seconds().count()));
+                  static_cast<unsigned>(date.month()), static_cast<unsigned>(date.day()),
+                  static_cast<int>(clock.hours().count()), static_cast<int>(clock.minutes().count()),
+                  static_cast<int>(clock.seconds().count()));
     return text;
 }
 
@@ -301,11 +309,12 @@ bool ReportLostPictures(DocumentFile::Content const & content, String const & ta
     if (content.m_LostPictures.empty()) {
         return false;
     }
-    result.SetResult(DocumentSaveResult::SourceDamaged,
-                     Kernel::Format(Kernel::LocalisedString("The picture \"%1\" in \"%2\" can't be read any more, so the "
-                                                            "document was not written.",
-                                                            "Save document"),
-                                    content.m_LostPictures.front(), target));
+    result.SetResult(
+        DocumentSaveResult::SourceDamaged,
+        Kernel::Format(Kernel::LocalisedString("The picture \"%1\" in \"%2\" can't be read any more, so the "
+                                               "document was not written.",
+                                               "Save document"),
+                       content.m_LostPictures.front(), target));
     return true;
 }
 
@@ -331,7 +340,8 @@ void DocumentController::SaveDocument(DocumentSaveResult & result, String const 
     String const target = path.Empty() ? ownPath : path;
     result.SetSuccess(false);
     if (target.Empty()) {
-        result.SetResult(DocumentSaveResult::BadName, Kernel::LocalisedString("The document has no file yet.", "Save document"));
+        result.SetResult(DocumentSaveResult::BadName,
+                         Kernel::LocalisedString("The document has no file yet.", "Save document"));
         return;
     }
     ComposeText(false, nullptr);

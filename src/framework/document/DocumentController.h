@@ -42,9 +42,9 @@ struct ComposeOutcome
 /// One open document: a domain of its own with its node tree, history and file.
 ///
 /// Changed by commands on its queue. Its tree is read on the queue, or under the reader lock, one stretch at a time and
-/// never across a wait. The facts that this class gives out by value are snapshots, safe on any thread. A controller that
-/// nobody else knows yet belongs to the thread that makes it, which needs no lock; any number of threads may make or load
-/// different documents at once.
+/// never across a wait. The facts that this class gives out by value are snapshots, safe on any thread. A controller
+/// that nobody else knows yet belongs to the thread that makes it, which needs no lock; any number of threads may make
+/// or load different documents at once.
 ///
 /// A loaded document is composed: where its saved layout does not hold, loading composes.
 class DocumentController : public DomainController, public DocumentControllerArchive
@@ -63,20 +63,20 @@ public:
     /// A composed document that is in no file yet, dirty, with one growing flow of the story.
     [[nodiscard]] static Kernel::Counted<DocumentController> CreateDocument(DocumentSettings const & settings,
                                                                             Kernel::Counted<Story::Story> story);
-    /// Puts another text and other settings in place of all that the document had. The document keeps its GUID, the uids
-    /// of anchors whose names are still there and the start numbers of its sections; its history is emptied. Composes.
-    /// For a controller that nobody else knows, or under the writer lock.
+    /// Puts another text and other settings in place of all that the document had. The document keeps its GUID, the
+    /// uids of anchors whose names are still there and the start numbers of its sections; its history is emptied.
+    /// Composes. For a controller that nobody else knows, or under the writer lock.
     void ReplaceContent(DocumentSettings const & settings, Kernel::Counted<Story::Story> story);
 
     /// Loads on the calling thread, before anybody else knows the controller. False, with `failure` filled, if it
     /// cannot; then nothing of the file is kept open. `inFront` locks the file against all others, otherwise others may
-    /// read it. `asCopy` loads the content only: the controller has no path and holds no lock. `recovering` is for files
-    /// kept after a failed save and changes nothing about reading them.
+    /// read it. `asCopy` loads the content only: the controller has no path and holds no lock. `recovering` is for
+    /// files kept after a failed save and changes nothing about reading them.
     bool LoadDocument(String const & path, bool inFront, bool asCopy, enum LoadDocumentMode mode,
                       Kernel::Counted<LoadDocumentOptions const> options, OpenDocumentFailedNotification & failure,
                       bool recovering);
-    /// True if the file is a document of a format older than this program's. Its version goes to `version` if that is not
-    /// null. False for a file that can't be read or is none of ours.
+    /// True if the file is a document of a format older than this program's. Its version goes to `version` if that is
+    /// not null. False for a file that can't be read or is none of ours.
     [[nodiscard]] static bool CheckForOldArchiveVersion(String const & path, unsigned int * version);
 
     /// Writes the document to its file, or to another path, which becomes its own; an empty path means its own. On the
@@ -127,18 +127,24 @@ public:
     /// The profile of the format.
     [[nodiscard]] Kernel::Consolidated<Raster::ICCProfile> GetProfile() const;
     void SetFormatAndProfiles(enum Raster::Format format, Raster::ICCManager::ICCProfileSet const & profiles);
-    /// Lays a format over the document's own, or takes that off again; see `ConvertFormatOrProfileCommand`. True if there
-    /// was one to take off.
+    /// Lays a format over the document's own, or takes that off again; see `ConvertFormatOrProfileCommand`. True if
+    /// there was one to take off.
     void SetFormatOverride(enum Raster::Format format, Raster::ICCManager::ICCProfileSet const & profiles);
     bool RemoveFormatOverride();
     [[nodiscard]] Kernel::Counted<Kernel::UnitValueConverter const> GetUnitConverter() const { return m_UnitConverter; }
     [[nodiscard]] enum Kernel::UnitValue::UnitType GetUnitType() const { return Kernel::UnitValue::UnitType::Points; }
 
     /// Null before the first check.
-    [[nodiscard]] Kernel::Counted<PreflightResults const> GetPreflightResults() const { return m_Facts.Get()->m_Preflight; }
+    [[nodiscard]] Kernel::Counted<PreflightResults const> GetPreflightResults() const
+    {
+        return m_Facts.Get()->m_Preflight;
+    }
     void SetPreflightResults(Kernel::Counted<PreflightResults const> results);
     /// Null for a document that never was given one.
-    [[nodiscard]] Kernel::Counted<PDFBookmarkManager const> GetPDFBookmarkManager() const { return m_Facts.Get()->m_Bookmarks; }
+    [[nodiscard]] Kernel::Counted<PDFBookmarkManager const> GetPDFBookmarkManager() const
+    {
+        return m_Facts.Get()->m_Bookmarks;
+    }
     void SetPDFBookmarkManager(Kernel::Counted<PDFBookmarkManager const> manager);
     /// The anchors as last collected in a document in front; null if they never were.
     [[nodiscard]] Kernel::Counted<Anchors const> GetAnchors() const { return m_Facts.Get()->m_Anchors; }
@@ -170,11 +176,12 @@ public:
     /// changed. `abort` may be null. Under the writer lock.
     ComposeOutcome ComposeText(bool force, bool * abort);
 
-    /// Makes the glyphs of all flows available for drawing; where they can't be read from the file any more, or their fonts
-    /// have gone, the text is set anew, under the writer lock, which it takes if need be. Not with the reader lock held.
+    /// Makes the glyphs of all flows available for drawing; where they can't be read from the file any more, or their
+    /// fonts have gone, the text is set anew, under the writer lock, which it takes if need be. Not with the reader
+    /// lock held.
     void EnsureGlyphs();
-    /// Brings what running heads show in step with the title and, for a document without one, its first heading. Under the
-    /// writer lock.
+    /// Brings what running heads show in step with the title and, for a document without one, its first heading. Under
+    /// the writer lock.
     void UpdateRunningHeads();
 
     // History. Under the writer lock.

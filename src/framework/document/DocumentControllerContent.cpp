@@ -17,8 +17,8 @@ void FillMasterPage(MasterSpreadNode & master, MasterPageSettings const & settin
 {
     for (ShapeSettings const & shape : settings.m_Shapes) {
         master.AppendChild(shape.m_Under ? NodeChildListUnder : NodeChildListOver,
-                           Kernel::MakeCounted<ShapeNode>(shape.m_Rect.Moved(page.left, page.top), shape.m_Fill, shape.m_Stroke,
-                                                          shape.m_StrokeWidth));
+                           Kernel::MakeCounted<ShapeNode>(shape.m_Rect.Moved(page.left, page.top), shape.m_Fill,
+                                                          shape.m_Stroke, shape.m_StrokeWidth));
     }
     for (RunningTextSettings const & text : settings.m_RunningTexts) {
         master.AppendChild(NodeChildListItems,

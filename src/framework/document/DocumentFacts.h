@@ -24,7 +24,10 @@ public:
         Raster::ICCManager::ICCProfileSet m_Profiles;
     };
 
-    [[nodiscard]] enum Raster::Format GetFormat() const { return m_Override ? m_Override->m_Format : m_Colours.m_Format; }
+    [[nodiscard]] enum Raster::Format GetFormat() const
+    {
+        return m_Override ? m_Override->m_Format : m_Colours.m_Format;
+    }
     [[nodiscard]] Raster::ICCManager::ICCProfileSet const & GetProfiles() const
     {
         return m_Override ? m_Override->m_Profiles : m_Colours.m_Profiles;

@@ -90,13 +90,17 @@ public:
         }
         return m_File.Read(*in);
     }
-    [[nodiscard]] Kernel::FileStoreItemType const & GetObjectFileStoreItemType() const override { return ms_FileStoreItemType; }
+    [[nodiscard]] Kernel::FileStoreItemType const & GetObjectFileStoreItemType() const override
+    {
+        return ms_FileStoreItemType;
+    }
 
 private:
     DocumentFile & m_File;
 };
 
-Kernel::FileStoreItemType const DocumentStreamItem::ms_FileStoreItemType(Kernel::ClassUID("DcDo"), nullptr, Kernel::Nestable::No,
+Kernel::FileStoreItemType const DocumentStreamItem::ms_FileStoreItemType(Kernel::ClassUID("DcDo"), nullptr,
+                                                                         Kernel::Nestable::No,
                                                                          Kernel::Recoverable::Yes);
 
 bool DocumentFile::Load(Kernel::Archive & archive, OpenDocumentFailedNotification & failure)
@@ -104,21 +108,23 @@ bool DocumentFile::Load(Kernel::Archive & archive, OpenDocumentFailedNotificatio
     using Failure = OpenDocumentFailedNotification;
     try {
         if (!archive.HasItem(DocumentItem)) {
-            failure.SetResult(Failure::ItemMissing,
-                              Kernel::Format(Kernel::LocalisedString("The file \"%1\" holds no document.", "Open document"),
-                                             archive.GetPath()),
-                              DocumentItem);
+            failure.SetResult(
+                Failure::ItemMissing,
+                Kernel::Format(Kernel::LocalisedString("The file \"%1\" holds no document.", "Open document"),
+                               archive.GetPath()),
+                DocumentItem);
             return false;
         }
         DocumentStreamItem item(*this);
         if (!archive.LoadFile(DocumentItem, item)) {
-            failure.SetResult(Failure::Corrupt,
-                              Kernel::Format(Kernel::LocalisedString(
-                                                 "The document \"%1\" is damaged. Take it from a backup, or make it anew from "
-                                                 "its sources.",
-                                                 "Open document"),
-                                             archive.GetPath()),
-                              DocumentItem);
+            failure.SetResult(
+                Failure::Corrupt,
+                Kernel::Format(Kernel::LocalisedString(
+                                   "The document \"%1\" is damaged. Take it from a backup, or make it anew from "
+                                   "its sources.",
+                                   "Open document"),
+                               archive.GetPath()),
+                DocumentItem);
             return false;
         }
         auto const & flows = m_Document.GetDocument()->GetTextFlows();
@@ -175,7 +181,8 @@ void DocumentFile::LoadLayout(TextFlow & flow, std::size_t number, std::uint64_t
     Kernel::Counted<DocumentStore const> const store = m_Document.m_Store;
     flow.SetLayout(std::move(layout), hash, [store, glyphItem](Story::Layout & target) {
         Kernel::Counted<Kernel::RawData const> const data = store->ReadItem(glyphItem);
-        return data && target.LoadGlyphData(std::make_shared<Kernel::Counted<Kernel::RawData const>>(data), AsBytes(*data));
+        return data &&
+               target.LoadGlyphData(std::make_shared<Kernel::Counted<Kernel::RawData const>>(data), AsBytes(*data));
     });
     for (TextFlow::FontStamp const & font : flow.GetFonts()) {
         Kernel::TimeStamp time;
@@ -366,9 +373,9 @@ Kernel::Counted<Kernel::RawData const> DocumentFile::WriteDocument() const
                     }));
     out.SaveObject(IDTag("styl"), node.GetStyleSheet(), false);
     out.SaveObject(IDTag("indx"), node.GetIndex(), false);
-    out.SaveObjects(IDTag("swat"),
-                    ToRecords<SwatchRecord>(node.GetSwatches()->GetAll(),
-                                            [](SwatchRecord & record, Swatch const & swatch) { record.m_Swatch = swatch; }));
+    out.SaveObjects(IDTag("swat"), ToRecords<SwatchRecord>(
+                                       node.GetSwatches()->GetAll(),
+                                       [](SwatchRecord & record, Swatch const & swatch) { record.m_Swatch = swatch; }));
     std::vector<Kernel::Counted<PictureRecord>> pictures;
     for (auto const & [id, entry] : m_Document.GetPictures().GetEntries()) {
         pictures.push_back(Kernel::MakeCounted<PictureRecord>());
@@ -376,7 +383,8 @@ Kernel::Counted<Kernel::RawData const> DocumentFile::WriteDocument() const
         pictures.back()->m_Entry = entry;
     }
     out.SaveObjects(IDTag("pict"), pictures);
-    out.SaveObjects(IDTag("flow"), ToRecords<FlowRecord>(node.GetTextFlows(), [](FlowRecord & record, auto const & flow) {
+    out.SaveObjects(IDTag("flow"),
+                    ToRecords<FlowRecord>(node.GetTextFlows(), [](FlowRecord & record, auto const & flow) {
                         record.m_Story = flow->GetStory();
                         record.m_Growing = flow->IsGrowing();
                         record.m_Purpose = flow->GetPurpose();
@@ -450,10 +458,14 @@ void FillResult(DocumentSaveResult & result, Kernel::Archive::CreateResult const
     {
         Code m_Code;
         Result m_Result;
-    } table[] = {{Code::FolderMissing, Result::FolderMissing}, {Code::Locked, Result::LockedByOther},
-                 {Code::IsFolder, Result::BadName},            {Code::NameTooLong, Result::NameTooLong},
-                 {Code::AccessDenied, Result::AccessDenied},   {Code::PermissionDenied, Result::AccessDenied},
-                 {Code::ReadOnlyVolume, Result::ReadOnlyDevice}, {Code::QuotaExceeded, Result::QuotaExceeded},
+    } table[] = {{Code::FolderMissing, Result::FolderMissing},
+                 {Code::Locked, Result::LockedByOther},
+                 {Code::IsFolder, Result::BadName},
+                 {Code::NameTooLong, Result::NameTooLong},
+                 {Code::AccessDenied, Result::AccessDenied},
+                 {Code::PermissionDenied, Result::AccessDenied},
+                 {Code::ReadOnlyVolume, Result::ReadOnlyDevice},
+                 {Code::QuotaExceeded, Result::QuotaExceeded},
                  {Code::OutOfSpace, Result::DiskFull}};
     Result code = Result::CannotCreate;
     for (auto const & row : table) {
@@ -471,14 +483,25 @@ void FillResult(DocumentSaveResult & result, Kernel::ArchiveFileException const 
     using Result = DocumentSaveResult::Result;
     Result code = Result::WriteFailed;
     switch (exception.GetReason()) {
-    case Reason::OutOfSpace: code = Result::DiskFull; break;
-    case Reason::QuotaExceeded: code = Result::QuotaExceeded; break;
-    case Reason::FileTooLarge: code = Result::TooLarge; break;
+    case Reason::OutOfSpace:
+        code = Result::DiskFull;
+        break;
+    case Reason::QuotaExceeded:
+        code = Result::QuotaExceeded;
+        break;
+    case Reason::FileTooLarge:
+        code = Result::TooLarge;
+        break;
     case Reason::PermissionDenied:
-    case Reason::AccessDenied: code = Result::AccessDenied; break;
-    case Reason::Locked: code = Result::LockedByOther; break;
+    case Reason::AccessDenied:
+        code = Result::AccessDenied;
+        break;
+    case Reason::Locked:
+        code = Result::LockedByOther;
+        break;
     case Reason::DeviceError:
-    case Reason::Unknown: break;
+    case Reason::Unknown:
+        break;
     }
     result.SetResult(code, exception.GetMessage());
     result.SetConcernsFile(true);
@@ -505,7 +528,8 @@ Kernel::Counted<Kernel::Archive> DocumentFile::WriteArchive(Content const & cont
         Kernel::ArchiveSessionHandle session;
         if (Kernel::Archive::SessionResult::Success !=
             archive->CreateSessionAdv(session, Kernel::Archive::SessionType::Whole, nullptr, false)) {
-            result.SetResult(DocumentSaveResult::SessionFailed, Kernel::Format("The file \"%1\" can't be written.", path));
+            result.SetResult(DocumentSaveResult::SessionFailed,
+                             Kernel::Format("The file \"%1\" can't be written.", path));
             return nullptr;
         }
         session->SaveBytes(DocumentItem, deflated, content.m_Document);

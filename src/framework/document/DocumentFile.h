@@ -43,7 +43,8 @@ public:
     /// Writes the content to a file and opens it again for reading, shared or exclusive. Null, with `result` filled, if
     /// it can't; the target is untouched then. Needs no lock.
     [[nodiscard]] static Kernel::Counted<Kernel::Archive> WriteArchive(Content const & content, String const & path,
-                                                                       Kernel::FileLock * ownLock, Kernel::FileLock::Kind kind,
+                                                                       Kernel::FileLock * ownLock,
+                                                                       Kernel::FileLock::Kind kind,
                                                                        DocumentSaveResult & result);
 
 private:

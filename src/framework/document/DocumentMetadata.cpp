@@ -27,9 +27,9 @@ std::vector<String> SplitTags(std::string_view tags)
 
 }
 
-Kernel::Counted<XMPTree const>
-DocumentMetadata::GetCurrentXMPTreeForExport(Kernel::Counted<DocumentController const>,
-                                             ExportableInterface::ExportResult const *, Raster::ExportOptions const *) const
+Kernel::Counted<XMPTree const> DocumentMetadata::GetCurrentXMPTreeForExport(Kernel::Counted<DocumentController const>,
+                                                                            ExportableInterface::ExportResult const *,
+                                                                            Raster::ExportOptions const *) const
 {
     Kernel::Counted<XMPTree> const tree = Kernel::MakeCounted<XMPTree>();
     auto const add = [&tree](char const * name, XMPTree::Form form, String const & value) {

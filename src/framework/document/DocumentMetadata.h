@@ -40,11 +40,12 @@ public:
     [[nodiscard]] String const & GetTags() const { return m_Values.m_Tags; }
     [[nodiscard]] String const & GetLanguage() const { return m_Values.m_Language; }
 
-    /// The metadata as XMP (ISO 16684-1), for a file made from the document. What `result` and `options` know of the file
-    /// is put in; both may be null.
-    [[nodiscard]] Kernel::Counted<XMPTree const> GetCurrentXMPTreeForExport(Kernel::Counted<DocumentController const> document,
-                                                                            ExportableInterface::ExportResult const * result,
-                                                                            Raster::ExportOptions const * options) const;
+    /// The metadata as XMP (ISO 16684-1), for a file made from the document. What `result` and `options` know of the
+    /// file is put in; both may be null.
+    [[nodiscard]] Kernel::Counted<XMPTree const>
+    GetCurrentXMPTreeForExport(Kernel::Counted<DocumentController const> document,
+                               ExportableInterface::ExportResult const * result,
+                               Raster::ExportOptions const * options) const;
 
 private:
     Values m_Values;

@@ -9,7 +9,8 @@
 #include <algorithm>
 
 DocumentNode::DocumentNode(Kernel::Counted<DocumentPictures> pictures)
-    : m_Index(Kernel::MakeCounted<Story::Index>()), m_StyleSheet(Kernel::MakeCounted<Story::StyleSheet>()),
+    : m_Index(Kernel::MakeCounted<Story::Index>()),
+      m_StyleSheet(Kernel::MakeCounted<Story::StyleSheet>()),
       m_Swatches(Kernel::Counted<Swatches const>(Kernel::MakeCounted<Swatches>(std::vector<Swatch>()))),
       m_Pictures(std::move(pictures))
 {
@@ -35,7 +36,8 @@ int DocumentNode::GetPageCount() const
 
 Kernel::JailCounted<SpreadNode> DocumentNode::GetSpreadAtIndex(int index) const
 {
-    return Kernel::JailCounted<SpreadNode>(static_cast<SpreadNode *>(GetChildAtIndex(NodeChildListSpreads, index).Get()));
+    return Kernel::JailCounted<SpreadNode>(
+        static_cast<SpreadNode *>(GetChildAtIndex(NodeChildListSpreads, index).Get()));
 }
 
 int DocumentNode::FindSpread(Kernel::JailCounted<SpreadNode> const & spread) const
@@ -76,13 +78,15 @@ std::vector<Kernel::Counted<DocumentSection const>> DocumentNode::GetSections() 
 Kernel::Counted<DocumentSection const> DocumentNode::GetSection(int index) const
 {
     auto const sections = GetSections();
-    return 0 <= index && index < static_cast<int>(sections.size()) ? sections[static_cast<std::size_t>(index)] : nullptr;
+    return 0 <= index && index < static_cast<int>(sections.size()) ? sections[static_cast<std::size_t>(index)]
+                                                                   : nullptr;
 }
 
 Kernel::Counted<DocumentSection const> DocumentNode::GetSectionFromPageNumber(unsigned int pageIndex) const
 {
-    auto const after = std::upper_bound(m_Sections.begin(), m_Sections.end(), pageIndex,
-                                        [](unsigned int page, auto const & section) { return page < section->GetStartPageIndex(); });
+    auto const after =
+        std::upper_bound(m_Sections.begin(), m_Sections.end(), pageIndex,
+                         [](unsigned int page, auto const & section) { return page < section->GetStartPageIndex(); });
     return *std::prev(after);
 }
 
@@ -108,8 +112,8 @@ void DocumentNode::SetSections(std::vector<DocumentSection::Values> sections)
     sections.front().m_RestartPageNumbering = true;
     for (std::size_t i = 1; i < sections.size(); ++i) {
         if (!sections[i].m_RestartPageNumbering) {
-            sections[i].m_StartNumberingAt = sections[i - 1].m_StartNumberingAt +
-                                             (sections[i].m_StartPageIndex - sections[i - 1].m_StartPageIndex);
+            sections[i].m_StartNumberingAt =
+                sections[i - 1].m_StartNumberingAt + (sections[i].m_StartPageIndex - sections[i - 1].m_StartPageIndex);
         }
     }
     m_Sections.clear();

@@ -53,9 +53,12 @@ public:
     [[nodiscard]] String GetFormattedPageNumber(unsigned int pageIndex) const;
     [[nodiscard]] unsigned int GetPageNumber(unsigned int pageIndex) const;
     /// All sections, also those beyond the last page.
-    [[nodiscard]] std::vector<Kernel::Counted<DocumentSection const>> const & GetAllSections() const { return m_Sections; }
-    /// Puts the sections in page order, makes the first start at page 0 with a number of its own, and brings the numbers
-    /// of those that run on in step. A list without sections gets a default one.
+    [[nodiscard]] std::vector<Kernel::Counted<DocumentSection const>> const & GetAllSections() const
+    {
+        return m_Sections;
+    }
+    /// Puts the sections in page order, makes the first start at page 0 with a number of its own, and brings the
+    /// numbers of those that run on in step. A list without sections gets a default one.
     void SetSections(std::vector<DocumentSection::Values> sections);
 
     // Masters.

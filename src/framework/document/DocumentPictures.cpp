@@ -51,7 +51,8 @@ Raster::Picture::Bytes DocumentPictures::GetBytes(String const & id) const
         }
     }
     Kernel::Counted<Kernel::RawData const> const data = m_Store->ReadItem(ItemName(id));
-    return data ? std::make_shared<std::vector<unsigned char> const>(data->GetData(), data->GetData() + data->GetSize()) : nullptr;
+    return data ? std::make_shared<std::vector<unsigned char> const>(data->GetData(), data->GetData() + data->GetSize())
+                : nullptr;
 }
 
 std::map<String, DocumentPictures::Entry> DocumentPictures::GetEntries() const

@@ -28,8 +28,8 @@ public:
     [[nodiscard]] static String IdOf(std::vector<unsigned char> const & bytes);
     /// Takes a picture's bytes in and gives its id.
     String Add(Raster::Picture::Bytes bytes, Entry entry);
-    /// Null if there is no such picture or its bytes can't be read or are no picture; then `problem` tells why. Kept for
-    /// the next caller.
+    /// Null if there is no such picture or its bytes can't be read or are no picture; then `problem` tells why. Kept
+    /// for the next caller.
     [[nodiscard]] Kernel::Counted<Raster::Picture const> Get(String const & id, Raster::PictureProblem & problem) const;
     /// The bytes, from memory or from the file; null if they are lost.
     [[nodiscard]] Raster::Picture::Bytes GetBytes(String const & id) const;

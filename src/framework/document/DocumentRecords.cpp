@@ -11,7 +11,8 @@ using Kernel::InSerialiser;
 using Kernel::OutSerialiser;
 
 #define KORVANE_DOCUMENT_RECORD(Record, uid)                                                                           \
-    Kernel::ClassProperties const Record::ms_ClassProperties(Kernel::ClassUID(uid), &Record::CreateObject, 1, {}, nullptr); \
+    Kernel::ClassProperties const Record::ms_ClassProperties(Kernel::ClassUID(uid), &Record::CreateObject, 1, {},      \
+                                                             nullptr);                                                 \
     static Kernel::ClassPropertiesBase::Init const s_Init##Record(Record::ms_ClassProperties);
 
 KORVANE_DOCUMENT_RECORD(MetadataRecord, "DcMe")
@@ -37,8 +38,8 @@ bool IsSane(double value)
 
 bool IsSane(Kernel::Rect const & rect)
 {
-    return IsSane(rect.left) && IsSane(rect.top) && IsSane(rect.right) && IsSane(rect.bottom) && rect.left <= rect.right &&
-           rect.top <= rect.bottom;
+    return IsSane(rect.left) && IsSane(rect.top) && IsSane(rect.right) && IsSane(rect.bottom) &&
+           rect.left <= rect.right && rect.top <= rect.bottom;
 }
 
 bool AreMargins(Kernel::Rect const & margins)
@@ -50,8 +51,12 @@ bool AreMargins(Kernel::Rect const & margins)
 void SaveColour(OutSerialiser & out, IDTag tag, std::optional<Raster::Colour> const & colour)
 {
     if (colour) {
-        std::vector<float> const values{static_cast<float>(colour->m_Space), colour->m_Components[0], colour->m_Components[1],
-                                        colour->m_Components[2], colour->m_Components[3], colour->m_Alpha};
+        std::vector<float> const values{static_cast<float>(colour->m_Space),
+                                        colour->m_Components[0],
+                                        colour->m_Components[1],
+                                        colour->m_Components[2],
+                                        colour->m_Components[3],
+                                        colour->m_Alpha};
         out.SaveArray(tag, values);
     }
 }
@@ -250,7 +255,8 @@ Kernel::Counted<ItemRecord> ItemRecord::FromNode(Node const & node, DocumentNode
     return record;
 }
 
-Kernel::JailCounted<Node> ItemRecord::MakeNode(std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const
+Kernel::JailCounted<Node>
+ItemRecord::MakeNode(std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const
 {
     switch (static_cast<Node::Kind>(m_Kind)) {
     case Node::Kind::TextFrame: {
@@ -271,7 +277,8 @@ Kernel::JailCounted<Node> ItemRecord::MakeNode(std::vector<std::vector<Kernel::J
     case Node::Kind::EmbeddedDocument:
         return Kernel::MakeCounted<EmbeddedDocumentNode>(m_Rect, m_Path, m_Guid, m_Protected);
     case Node::Kind::RunningText: {
-        if (m_PartFields.size() != m_PartTexts.size() || static_cast<std::uint8_t>(RunningTextAlignment::Right) < m_Alignment) {
+        if (m_PartFields.size() != m_PartTexts.size() ||
+            static_cast<std::uint8_t>(RunningTextAlignment::Right) < m_Alignment) {
             return nullptr;
         }
         std::vector<RunningTextPart> parts;
@@ -281,11 +288,12 @@ Kernel::JailCounted<Node> ItemRecord::MakeNode(std::vector<std::vector<Kernel::J
             }
             parts.push_back({static_cast<RunningTextField>(m_PartFields[i]), m_PartTexts[i]});
         }
-        return Kernel::MakeCounted<RunningTextNode>(m_Rect, std::move(parts), static_cast<RunningTextAlignment>(m_Alignment),
-                                                    m_Style);
+        return Kernel::MakeCounted<RunningTextNode>(m_Rect, std::move(parts),
+                                                    static_cast<RunningTextAlignment>(m_Alignment), m_Style);
     }
     case Node::Kind::Shape:
-        return IsSane(m_StrokeWidth) ? Kernel::MakeCounted<ShapeNode>(m_Rect, m_Fill, m_Stroke, m_StrokeWidth) : nullptr;
+        return IsSane(m_StrokeWidth) ? Kernel::MakeCounted<ShapeNode>(m_Rect, m_Fill, m_Stroke, m_StrokeWidth)
+                                     : nullptr;
     default:
         return nullptr;
     }
@@ -328,7 +336,8 @@ bool SpreadRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned s
     in.LoadArray(IDTag("text"), textRects);
     in.LoadType(IDTag("trbg"), m_TransparentBackground);
     in.LoadObjects(IDTag("item"), m_Items);
-    if (numbers.size() != 8 * sides.size() || masters.size() != sides.size() || 0 != textRects.size() % 4 || sides.empty()) {
+    if (numbers.size() != 8 * sides.size() || masters.size() != sides.size() || 0 != textRects.size() % 4 ||
+        sides.empty()) {
         return false;
     }
     for (std::size_t i = 0; i < sides.size(); ++i) {
@@ -363,7 +372,8 @@ void SpreadRecord::FromNode(SpreadNode const & spread, DocumentNode const & docu
     }
 }
 
-void SpreadRecord::FillNode(SpreadNode & spread, std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const
+void SpreadRecord::FillNode(SpreadNode & spread,
+                            std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const
 {
     spread.SetPages(m_Pages);
     spread.SetTransparentBackground(m_TransparentBackground);

@@ -15,8 +15,8 @@
 
 #include <optional>
 
-/// The parts of a document as they stand in its file. Plain carriers: `DocumentFile` fills them from a document and makes
-/// a document of them. docs/file-format.md lists their tags.
+/// The parts of a document as they stand in its file. Plain carriers: `DocumentFile` fills them from a document and
+/// makes a document of them. docs/file-format.md lists their tags.
 
 class DocumentNode;
 
@@ -86,7 +86,8 @@ public:
 
     [[nodiscard]] static Kernel::Counted<ItemRecord> FromNode(Node const & node, DocumentNode const & document);
     /// Null for a record that makes no sense. A text frame is entered in `frames`, by flow and place in the chain.
-    [[nodiscard]] Kernel::JailCounted<Node> MakeNode(std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const;
+    [[nodiscard]] Kernel::JailCounted<Node>
+    MakeNode(std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const;
 
     [[nodiscard]] NodeChildListType GetList() const { return static_cast<NodeChildListType>(m_List); }
 

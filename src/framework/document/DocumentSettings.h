@@ -68,7 +68,8 @@ struct DocumentSettings
     std::vector<MasterSettings> m_Masters;
     Kernel::Counted<Story::StyleSheet const> m_Styles;
     std::vector<Swatch> m_Swatches;
-    /// The pictures that the text names by `DocumentPictures::IdOf` their bytes. Those that it does not name are dropped.
+    /// The pictures that the text names by `DocumentPictures::IdOf` their bytes. Those that it does not name are
+    /// dropped.
     std::vector<PictureSettings> m_Pictures;
     DocumentMetadata::Values m_Metadata;
     /// For running heads: the title of the book.

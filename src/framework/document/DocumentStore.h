@@ -4,8 +4,8 @@
 #include "framework/kernel/CriticalSection.h"
 #include "framework/kernel/ThreadSafety.h"
 
-/// The file of an open document, for what is read from it later: glyphs and pictures. Shared by all who read; closing it
-/// leaves them with nothing more to read. Safe on any thread.
+/// The file of an open document, for what is read from it later: glyphs and pictures. Shared by all who read; closing
+/// it leaves them with nothing more to read. Safe on any thread.
 class DocumentStore : public virtual Kernel::Countable
 {
 public:

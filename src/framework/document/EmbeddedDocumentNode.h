@@ -2,13 +2,14 @@
 
 #include "framework/document/PictureNode.h"
 
-/// A page of another document file, such as a PDF, placed on a page. Its password, where it needs one, is kept in memory
-/// only.
+/// A page of another document file, such as a PDF, placed on a page. Its password, where it needs one, is kept in
+/// memory only.
 class EmbeddedDocumentNode : public PictureNode
 {
 public:
     EmbeddedDocumentNode(Kernel::RectT<double> rect, String path, String guid, bool isProtected)
-        : PictureNode(rect, std::move(path), std::move(guid)), m_IsProtected(isProtected)
+        : PictureNode(rect, std::move(path), std::move(guid)),
+          m_IsProtected(isProtected)
     {
     }
 

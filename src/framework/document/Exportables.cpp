@@ -9,8 +9,8 @@ namespace
 {
 
 /// One page of a spread as a part: its own top left at the origin.
-void AddPartTo(ExportableInterface::ExportParams & params, Kernel::JailCounted<Node> const & node, Kernel::Rect const & rect,
-             Kernel::Rect const & bleedRect, Transform const & transform)
+void AddPartTo(ExportableInterface::ExportParams & params, Kernel::JailCounted<Node> const & node,
+               Kernel::Rect const & rect, Kernel::Rect const & bleedRect, Transform const & transform)
 {
     Transform const placed = Transform::Translation(-rect.left, -rect.top).Then(transform);
     params.m_Rect = params.m_Rect.United(placed.MapBounds(rect));
@@ -25,7 +25,9 @@ void AddPartTo(ExportableInterface::ExportParams & params, Kernel::JailCounted<N
 String LabelOf(DocumentController const & document, SpreadNode const & spread, int page)
 {
     int const first = spread.GetFirstPageIndex();
-    return first < 0 ? String() : document.GetDocument()->GetFormattedPageNumber(static_cast<unsigned int>(first + std::max(page, 0)));
+    return first < 0
+               ? String()
+               : document.GetDocument()->GetFormattedPageNumber(static_cast<unsigned int>(first + std::max(page, 0)));
 }
 
 Kernel::JailCounted<SpreadNode> Mutable(Kernel::Counted<SpreadNode const> const & spread)
@@ -68,14 +70,16 @@ void ExportableNodes::GetMultiPageExportParams(DocumentController const & docume
             }
         } else {
             ExportParams page = EmptyParams(IsIncludeBackground());
-            AddPartTo(page, spread, spread->GetSpreadExtents(true, false, false), spread->GetSpreadExtents(true, true, false), {});
+            AddPartTo(page, spread, spread->GetSpreadExtents(true, false, false),
+                      spread->GetSpreadExtents(true, true, false), {});
             page.m_Label = LabelOf(document, *spread, 0);
             params.push_back(std::move(page));
         }
     }
 }
 
-void ExportablePages::AddPage(Kernel::Counted<SpreadNode const> spread, int page, Raster::AffineTransform::Params transform)
+void ExportablePages::AddPage(Kernel::Counted<SpreadNode const> spread, int page,
+                              Raster::AffineTransform::Params transform)
 {
     Kernel::Rect const rect = spread->GetPageExtents(page, false);
     Kernel::Rect const bleedRect = spread->GetPageExtents(page, true);
@@ -88,14 +92,16 @@ void ExportablePages::AddPaddingRect(Kernel::RectT<double> const & rect, Kernel:
     m_Parts.push_back({nullptr, -1, rect, bleedRect, transform});
 }
 
-void ExportablePages::GetMultiPageExportParams(DocumentController const & document, std::vector<ExportParams> & params, bool) const
+void ExportablePages::GetMultiPageExportParams(DocumentController const & document, std::vector<ExportParams> & params,
+                                               bool) const
 {
     ExportParams output = EmptyParams(IsIncludeBackground());
     for (Part const & part : m_Parts) {
         if (part.m_Rect.IsEmpty()) {
             continue;
         }
-        AddPartTo(output, part.m_Spread ? Mutable(part.m_Spread) : nullptr, part.m_Rect, part.m_BleedRect, part.m_Transform);
+        AddPartTo(output, part.m_Spread ? Mutable(part.m_Spread) : nullptr, part.m_Rect, part.m_BleedRect,
+                  part.m_Transform);
         if (part.m_Spread && output.m_Label.Empty()) {
             // A page of the next chapter has its number from its own document.
             output.m_Label = LabelOf(document, *part.m_Spread, part.m_Page);

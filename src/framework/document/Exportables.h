@@ -22,8 +22,8 @@ private:
 
 /// Single pages of spreads and blank areas, put together on one output page.
 ///
-/// Each part is first moved so that its own top left comes to the origin, then by its transform. The output page is what
-/// all parts cover together.
+/// Each part is first moved so that its own top left comes to the origin, then by its transform. The output page is
+/// what all parts cover together.
 class ExportablePages : public ExportableInterface
 {
 public:

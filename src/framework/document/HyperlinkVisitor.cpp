@@ -13,7 +13,8 @@ int PageOfPlace(TextFlow const & flow, Story::LayoutItem::Place const & place)
 }
 
 /// Null for a link that leads nowhere.
-Kernel::Counted<HyperlinkData> MakeLink(TextFlow const & flow, Story::Layout const & layout, Story::LayoutItem::Link const & link)
+Kernel::Counted<HyperlinkData> MakeLink(TextFlow const & flow, Story::Layout const & layout,
+                                        Story::LayoutItem::Link const & link)
 {
     Kernel::Counted<HyperlinkData> data = Kernel::MakeCounted<HyperlinkData>();
     if (Story::LayoutItem::None != link.m_Note) {
@@ -73,7 +74,8 @@ void CollateFrame(TextFrameNode const & frame, std::vector<Kernel::Counted<Hyper
 
 }
 
-void HyperlinkVisitor::CollateForExport(Kernel::Counted<DocumentController const>, Kernel::JailNonCounted<SpreadNode> spread,
+void HyperlinkVisitor::CollateForExport(Kernel::Counted<DocumentController const>,
+                                        Kernel::JailNonCounted<SpreadNode> spread,
                                         std::vector<Kernel::Counted<HyperlinkData>> & links)
 {
     if (!spread) {

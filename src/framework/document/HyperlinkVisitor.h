@@ -31,8 +31,9 @@ public:
 class HyperlinkVisitor
 {
 public:
-    /// The hyperlinks of what the spread shows, in text order, each with its rectangles on that spread. A link that goes
-    /// over several spreads appears on each. The caller holds the document's reader lock.
-    static void CollateForExport(Kernel::Counted<DocumentController const> document, Kernel::JailNonCounted<SpreadNode> spread,
+    /// The hyperlinks of what the spread shows, in text order, each with its rectangles on that spread. A link that
+    /// goes over several spreads appears on each. The caller holds the document's reader lock.
+    static void CollateForExport(Kernel::Counted<DocumentController const> document,
+                                 Kernel::JailNonCounted<SpreadNode> spread,
                                  std::vector<Kernel::Counted<HyperlinkData>> & links);
 };

@@ -8,5 +8,6 @@
 bool IndexVisitor::ContainsIndex(Kernel::Counted<DocumentController const> document)
 {
     auto const & flows = document->GetDocument()->GetTextFlows();
-    return std::any_of(flows.begin(), flows.end(), [](auto const & flow) { return TextFlowPurpose::Index == flow->GetPurpose(); });
+    return std::any_of(flows.begin(), flows.end(),
+                       [](auto const & flow) { return TextFlowPurpose::Index == flow->GetPurpose(); });
 }

@@ -11,7 +11,9 @@ class MasterSpreadNode : public SpreadNode
 public:
     MasterSpreadNode() = default;
     MasterSpreadNode(String name, std::vector<SpreadPage> pages, std::vector<Kernel::RectT<double>> textRects)
-        : SpreadNode(std::move(pages)), m_Name(std::move(name)), m_TextRects(std::move(textRects))
+        : SpreadNode(std::move(pages)),
+          m_Name(std::move(name)),
+          m_TextRects(std::move(textRects))
     {
     }
 

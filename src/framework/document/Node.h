@@ -27,8 +27,8 @@ enum NodeChildListType
 /// One element of a document's tree: the document itself, a spread, a frame, a picture.
 ///
 /// What a node can do beyond having a place and a size it tells by the interfaces in NodeInterfaces.h, which are had by
-/// `CountedCast`. The tree belongs to its `DocumentController`: it changes under that controller's writer lock only, and
-/// is read under its reader lock, one stretch at a time. All measures are points, y down, from the top left of the
+/// `CountedCast`. The tree belongs to its `DocumentController`: it changes under that controller's writer lock only,
+/// and is read under its reader lock, one stretch at a time. All measures are points, y down, from the top left of the
 /// spread.
 class Node : public virtual Kernel::Countable, public Kernel::TreeBaseNDJailCounted<Node, 5, NodeChildListType>
 {

@@ -14,9 +14,9 @@ public:
     ~PDFBookmarkManager() override;
 
     [[nodiscard]] Kernel::Counted<PDFBookmarkManager> Clone() const;
-    /// The other lacks a bookmark that this one holds, or has it under another name. What the other holds beyond that is
-    /// no difference: once a chapter has taken in the book's bookmarks, keeping its own, the two agree, so that opening a
-    /// chapter again changes nothing. Null differs from a manager that holds any.
+    /// The other lacks a bookmark that this one holds, or has it under another name. What the other holds beyond that
+    /// is no difference: once a chapter has taken in the book's bookmarks, keeping its own, the two agree, so that
+    /// opening a chapter again changes nothing. Null differs from a manager that holds any.
     [[nodiscard]] bool IsLogicallyDifferent(Kernel::Counted<PDFBookmarkManager const> other) const;
     /// Takes in the bookmarks among the anchors: new ones are added, known ones take the anchor's name. Others stay.
     void Reconcile(Kernel::Counted<Anchors const> anchors);

@@ -2,6 +2,7 @@
 
 #include "framework/document/PictureNode.h"
 #include "framework/document/ShapeNode.h"
+#include "framework/kernel/Format.h"
 
 namespace RenderTree = Renderer::RenderTree;
 using Transform = Raster::AffineTransform::Params;
@@ -21,16 +22,23 @@ RenderTree::Role RoleOf(Story::LayoutItem::Role role, unsigned int headingLevel)
     case Of::Heading:
         return static_cast<RenderTree::Role>(static_cast<unsigned int>(RenderTree::Role::Heading1) +
                                              std::clamp(headingLevel, 1U, 6U) - 1);
-    case Of::ListMarker: return RenderTree::Role::ListItem;
+    case Of::ListMarker:
+        return RenderTree::Role::ListItem;
     case Of::NoteNumber:
-    case Of::NoteText: return RenderTree::Role::Note;
-    case Of::TableCell: return RenderTree::Role::TableCell;
-    case Of::Code: return RenderTree::Role::Code;
-    case Of::Quotation: return RenderTree::Role::Quotation;
-    case Of::Caption: return RenderTree::Role::Caption;
+    case Of::NoteText:
+        return RenderTree::Role::Note;
+    case Of::TableCell:
+        return RenderTree::Role::TableCell;
+    case Of::Code:
+        return RenderTree::Role::Code;
+    case Of::Quotation:
+        return RenderTree::Role::Quotation;
+    case Of::Caption:
+        return RenderTree::Role::Caption;
     case Of::Text:
     case Of::NoteReference:
-    case Of::Generated: break;
+    case Of::Generated:
+        break;
     }
     return RenderTree::Role::Paragraph;
 }
@@ -96,13 +104,15 @@ void PagePainter::PaintSpread(SpreadNode const & spread, Kernel::RectT<double> c
     }
 }
 
-void PagePainter::PaintMasterItems(SpreadNode const & spread, Kernel::RectT<double> const & clip, NodeChildListType list)
+void PagePainter::PaintMasterItems(SpreadNode const & spread, Kernel::RectT<double> const & clip,
+                                   NodeChildListType list)
 {
     Kernel::JailCounted<DocumentNode> const document = spread.GetDocumentNode();
     for (int i = 0; document && i < spread.GetPageCount(); ++i) {
         SpreadPage const & page = spread.GetPages()[static_cast<std::size_t>(i)];
         Kernel::JailCounted<MasterSpreadNode> const master =
-            page.m_Master.Empty() || !Meets(spread.GetPageExtents(i, true), clip) ? nullptr : document->FindMaster(page.m_Master);
+            page.m_Master.Empty() || !Meets(spread.GetPageExtents(i, true), clip) ? nullptr
+                                                                                  : document->FindMaster(page.m_Master);
         if (!master) {
             continue;
         }
@@ -161,6 +171,11 @@ void PagePainter::PaintItem(Node const & item, RunningTextSetter::Fields const &
     }
     case Node::Kind::EmbeddedDocument:
         PaintMissing(item.GetSpreadBaseBox(false).Moved(offset.x, offset.y));
+        if (m_Warnings) {
+            String const & path = static_cast<PictureNode const &>(item).GetPath();
+            m_Warnings->push_back({RenderTree::Warning::Code::PictureMissing, 0, path,
+                                   Kernel::Format("The placed document \"%1\" shows as a marked box.", path)});
+        }
         break;
     default:
         break;
@@ -190,7 +205,8 @@ void PagePainter::PaintFrame(TextFrameNode const & frame)
         Kernel::Counted<Raster::Picture const> const content =
             document ? document->GetPictures()->Get(layout->GetString(picture.m_DataId), problem) : nullptr;
         PaintPicture(content, problem,
-                     {origin.x + picture.m_Left, origin.y + picture.m_Top, origin.x + picture.m_Right, origin.y + picture.m_Bottom},
+                     {origin.x + picture.m_Left, origin.y + picture.m_Top, origin.x + picture.m_Right,
+                      origin.y + picture.m_Bottom},
                      layout->GetString(picture.m_AltText));
     }
     for (Story::LayoutItem::Box const & box : layout->GetBoxes(laidOut)) {
@@ -200,12 +216,14 @@ void PagePainter::PaintFrame(TextFrameNode const & frame)
     }
 }
 
-void PagePainter::PaintLines(Story::Layout const & layout, Story::LayoutItem::Frame const & frame, Kernel::PointT<double> origin)
+void PagePainter::PaintLines(Story::Layout const & layout, Story::LayoutItem::Frame const & frame,
+                             Kernel::PointT<double> origin)
 {
     auto const headings = layout.GetHeadings();
     auto const levelAt = [&headings](std::uint32_t offset) {
-        auto const after = std::upper_bound(headings.begin(), headings.end(), offset,
-                                            [](std::uint32_t place, auto const & heading) { return place < heading.m_StoryOffset; });
+        auto const after =
+            std::upper_bound(headings.begin(), headings.end(), offset,
+                             [](std::uint32_t place, auto const & heading) { return place < heading.m_StoryOffset; });
         return after == headings.begin() ? 1U : std::prev(after)->m_Level;
     };
     bool open = false;
@@ -253,9 +271,11 @@ void PagePainter::PaintLines(Story::Layout const & layout, Story::LayoutItem::Fr
     }
 }
 
-void PagePainter::PaintBox(Story::Layout const & layout, Story::LayoutItem::Box const & box, Kernel::PointT<double> origin)
+void PagePainter::PaintBox(Story::Layout const & layout, Story::LayoutItem::Box const & box,
+                           Kernel::PointT<double> origin)
 {
-    Kernel::Rect const rect{origin.x + box.m_Left, origin.y + box.m_Top, origin.x + box.m_Right, origin.y + box.m_Bottom};
+    Kernel::Rect const rect{origin.x + box.m_Left, origin.y + box.m_Top, origin.x + box.m_Right,
+                            origin.y + box.m_Bottom};
     if (Story::LayoutItem::Box::Kind::MissingPicture == box.m_Kind) {
         PaintMissing(rect);
         return;
@@ -272,8 +292,9 @@ void PagePainter::PaintBox(Story::Layout const & layout, Story::LayoutItem::Box 
     m_List->EndMark();
 }
 
-void PagePainter::PaintPicture(Kernel::Counted<Raster::Picture const> const & picture, Raster::PictureProblem const & problem,
-                               Kernel::RectT<double> const & rect, String const & altText)
+void PagePainter::PaintPicture(Kernel::Counted<Raster::Picture const> const & picture,
+                               Raster::PictureProblem const & problem, Kernel::RectT<double> const & rect,
+                               String const & altText)
 {
     m_List->BeginMark({RenderTree::Role::Figure, {}, altText});
     if (picture) {

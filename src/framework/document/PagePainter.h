@@ -10,22 +10,24 @@
 /// Draws pages of a document into a display list: masters, text from the layout, pictures, shapes. What output and
 /// previews show comes from here.
 ///
-/// Reads the documents under their reader locks, which the caller holds. One thread uses a painter at a time; keep it for many
-/// pages, as it remembers styles.
+/// Reads the documents under their reader locks, which the caller holds. One thread uses a painter at a time; keep it
+/// for many pages, as it remembers styles.
 class PagePainter
 {
 public:
-    /// Empties the list and draws one page of output. Each node is drawn with the styles and pictures of its own document:
-    /// two chapters may share a page. `warnings` may be null.
-    void Paint(ExportableInterface::ExportParams const & params, VisibilityInterface::VisibilityTestOptions const & visibility,
-               Renderer::RenderTree::DisplayList & list, std::vector<Renderer::RenderTree::Warning> * warnings);
+    /// Empties the list and draws one page of output. Each node is drawn with the styles and pictures of its own
+    /// document: two chapters may share a page. `warnings` may be null.
+    void Paint(ExportableInterface::ExportParams const & params,
+               VisibilityInterface::VisibilityTestOptions const & visibility, Renderer::RenderTree::DisplayList & list,
+               std::vector<Renderer::RenderTree::Warning> * warnings);
 
 private:
     void PaintSpread(SpreadNode const & spread, Kernel::RectT<double> const & clip);
     void PaintMasterItems(SpreadNode const & spread, Kernel::RectT<double> const & clip, NodeChildListType list);
     void PaintItem(Node const & item, RunningTextSetter::Fields const & fields, Kernel::PointT<double> offset);
     void PaintFrame(TextFrameNode const & frame);
-    void PaintLines(Story::Layout const & layout, Story::LayoutItem::Frame const & frame, Kernel::PointT<double> origin);
+    void PaintLines(Story::Layout const & layout, Story::LayoutItem::Frame const & frame,
+                    Kernel::PointT<double> origin);
     void PaintBox(Story::Layout const & layout, Story::LayoutItem::Box const & box, Kernel::PointT<double> origin);
     void PaintPicture(Kernel::Counted<Raster::Picture const> const & picture, Raster::PictureProblem const & problem,
                       Kernel::RectT<double> const & rect, String const & altText);

@@ -12,7 +12,8 @@ String const & PageShaper::MasterOf(PageSetup const & setup, std::size_t pageOfF
     return 0 == pageOfFlow ? setup.m_FirstMaster : setup.m_BodyMaster;
 }
 
-std::vector<std::vector<SpreadPage>> PageShaper::Shape(PageSetup const & setup, std::vector<unsigned int> const & numbers)
+std::vector<std::vector<SpreadPage>> PageShaper::Shape(PageSetup const & setup,
+                                                       std::vector<unsigned int> const & numbers)
 {
     KORVANE_ASSERT(!numbers.empty());
     std::vector<SpreadPage> pages;
@@ -31,7 +32,8 @@ std::vector<std::vector<SpreadPage>> PageShaper::Shape(PageSetup const & setup, 
 
     std::vector<std::vector<SpreadPage>> spreads;
     for (SpreadPage & page : pages) {
-        // A right-hand page joins the left-hand page before it; where a section's number breaks the row, it stands alone.
+        // A right-hand page joins the left-hand page before it; where a section's number breaks the row, it stands
+        // alone.
         bool const joins = PageSide::Right == page.m_Side && !spreads.empty() && 1 == spreads.back().size() &&
                            PageSide::Left == spreads.back().front().m_Side;
         double const x = joins && !setup.m_VerticalStack ? setup.m_PageSize.width : 0;

@@ -15,10 +15,9 @@ PreflightResults::Summary PreflightResults::GetSummary() const
         errors += PreflightResult::Status::Error == result.m_Status ? 1 : 0;
         warnings += PreflightResult::Status::Warning == result.m_Status ? 1 : 0;
     }
-    summary.m_Text =
-        m_Results.empty()
-            ? Kernel::LocalisedString("No problems found", "Preflight")
-            : Kernel::LocalisedString::CreateFakeFromString(
-                  Kernel::Format(Kernel::LocalisedString("Errors: %1, warnings: %2", "Preflight"), errors, warnings));
+    summary.m_Text = m_Results.empty()
+                         ? Kernel::LocalisedString("No problems found", "Preflight")
+                         : Kernel::LocalisedString::CreateFakeFromString(Kernel::Format(
+                               Kernel::LocalisedString("Errors: %1, warnings: %2", "Preflight"), errors, warnings));
     return summary;
 }

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "framework/kernel/Counted.h"
 #include "framework/kernel/Countable.h"
+#include "framework/kernel/Counted.h"
 #include "framework/kernel/LocalisedString.h"
 #include "framework/kernel/StringT.h"
 

@@ -35,13 +35,17 @@ enum class RunningTextAlignment : std::uint8_t
 
 /// A line of text on a master whose fields are filled in for each page when it is drawn: a running head or a folio.
 ///
-/// It is set in one line on the bottom of its rectangle, in a paragraph style of the document. A line that is too long is
-/// cut at a word, with an ellipsis. A line whose fields are all empty shows nothing.
+/// It is set in one line on the bottom of its rectangle, in a paragraph style of the document. A line that is too long
+/// is cut at a word, with an ellipsis. A line whose fields are all empty shows nothing.
 class RunningTextNode : public Node
 {
 public:
-    RunningTextNode(Kernel::RectT<double> rect, std::vector<RunningTextPart> parts, RunningTextAlignment alignment, String style)
-        : m_Rect(rect), m_Parts(std::move(parts)), m_Style(std::move(style)), m_Alignment(alignment)
+    RunningTextNode(Kernel::RectT<double> rect, std::vector<RunningTextPart> parts, RunningTextAlignment alignment,
+                    String style)
+        : m_Rect(rect),
+          m_Parts(std::move(parts)),
+          m_Style(std::move(style)),
+          m_Alignment(alignment)
     {
     }
 

@@ -6,10 +6,14 @@ Raster::Colour ToRasterColour(Story::Colour const & colour)
 {
     auto const & c = colour.m_Components;
     switch (colour.m_Space) {
-    case Story::Colour::Space::Grey: return Raster::Colour::Grey(c[0]);
-    case Story::Colour::Space::RGB: return Raster::Colour::Rgb(c[0], c[1], c[2]);
-    case Story::Colour::Space::CMYK: return Raster::Colour::Cmyk(c[0], c[1], c[2], c[3]);
-    case Story::Colour::Space::Lab: return Raster::Colour::Lab(c[0] * 100, c[1] * 255 - 128, c[2] * 255 - 128);
+    case Story::Colour::Space::Grey:
+        return Raster::Colour::Grey(c[0]);
+    case Story::Colour::Space::RGB:
+        return Raster::Colour::Rgb(c[0], c[1], c[2]);
+    case Story::Colour::Space::CMYK:
+        return Raster::Colour::Cmyk(c[0], c[1], c[2], c[3]);
+    case Story::Colour::Space::Lab:
+        return Raster::Colour::Lab(c[0] * 100, c[1] * 255 - 128, c[2] * 255 - 128);
     }
     return Raster::Colour::Black();
 }
@@ -110,7 +114,8 @@ void RunningTextSetter::Draw(RunningTextNode const & node, Fields const & fields
         drawn.m_Colour = style.m_Colour;
         drawn.m_Origin = {x + line.m_X + run.m_X, baseline - run.m_Rise};
         drawn.m_Level = run.m_Level;
-        list.DrawGlyphs(drawn, m_Arena.GlyphsOf(run), std::u16string_view(shown).substr(run.m_TextStart, run.m_TextEnd - run.m_TextStart),
+        list.DrawGlyphs(drawn, m_Arena.GlyphsOf(run),
+                        std::u16string_view(shown).substr(run.m_TextStart, run.m_TextEnd - run.m_TextStart),
                         run.m_TextStart);
     }
 }

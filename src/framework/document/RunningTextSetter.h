@@ -7,7 +7,8 @@
 
 #include <map>
 
-/// Sets running heads and folios, in one line each, when a page is drawn: so a page that only moves has its text untouched.
+/// Sets running heads and folios, in one line each, when a page is drawn: so a page that only moves has its text
+/// untouched.
 ///
 /// One thread at a time; keeps what it needs to set the next page quickly.
 class RunningTextSetter

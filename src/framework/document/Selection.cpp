@@ -7,7 +7,9 @@
 Selection::Selection(Nodes nodes) : m_Nodes(std::move(nodes)) {}
 
 Selection::Selection(Kernel::Counted<TextFlow> flow, std::size_t anchor, std::size_t caret)
-    : m_Flow(std::move(flow)), m_TextAnchor(anchor), m_TextCaret(caret)
+    : m_Flow(std::move(flow)),
+      m_TextAnchor(anchor),
+      m_TextCaret(caret)
 {
     Kernel::JailCounted<TextFrameNode> const first = m_Flow->FindFrame(std::min(anchor, caret));
     if (first) {
@@ -24,7 +26,10 @@ Selection::Selection(Kernel::Counted<TextFlow> flow, std::size_t anchor, std::si
 
 Selection::Selection(Kernel::Counted<TextFlow> flow, std::size_t place, Kernel::JailCounted<TextFrameNode> frame,
                      Kernel::RectT<double> box)
-    : m_Flow(std::move(flow)), m_TextAnchor(place), m_TextCaret(place), m_KnownBox(box)
+    : m_Flow(std::move(flow)),
+      m_TextAnchor(place),
+      m_TextCaret(place),
+      m_KnownBox(box)
 {
     m_Nodes.push_back(std::move(frame));
 }

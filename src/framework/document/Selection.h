@@ -34,11 +34,12 @@ public:
     /// The spread of the first node; null if there is none.
     [[nodiscard]] Kernel::JailCounted<SpreadNode> GetSingleSpreadNode() const;
     /// The boxes of the selected text in one of the frames, a rectangle a line. Empty for other nodes.
-    [[nodiscard]] std::vector<Kernel::RectT<double>> GetTextSelectionBaseBoxes(Kernel::JailCounted<Node> const & frame) const;
+    [[nodiscard]] std::vector<Kernel::RectT<double>>
+    GetTextSelectionBaseBoxes(Kernel::JailCounted<Node> const & frame) const;
     /// The box of the first line of the selected text, in the first frame; the empty rectangle without text or place.
     [[nodiscard]] Kernel::RectT<double> GetTextSelectionBaseBox() const;
-    /// The same selection with items that can't be selected by themselves replaced by what holds them. Every node of this
-    /// document model can be selected by itself, so it is the selection as it stands.
+    /// The same selection with items that can't be selected by themselves replaced by what holds them. Every node of
+    /// this document model can be selected by itself, so it is the selection as it stands.
     [[nodiscard]] Kernel::Counted<Selection> ClonePromotingRestrictedItems() const;
 
 private:

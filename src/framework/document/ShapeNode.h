@@ -11,7 +11,10 @@ class ShapeNode : public Node
 public:
     ShapeNode(Kernel::RectT<double> rect, std::optional<Raster::Colour> fill, std::optional<Raster::Colour> stroke,
               double strokeWidth)
-        : m_Rect(rect), m_Fill(fill), m_Stroke(stroke), m_StrokeWidth(strokeWidth)
+        : m_Rect(rect),
+          m_Fill(fill),
+          m_Stroke(stroke),
+          m_StrokeWidth(strokeWidth)
     {
     }
 

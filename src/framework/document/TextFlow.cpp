@@ -20,7 +20,6 @@ void TextFlow::SetStory(Kernel::Counted<Story::Story> story)
 {
     KORVANE_ASSERT(story);
     m_Story = std::move(story);
-    m_Dirty = true;
 }
 
 void TextFlow::SetFrames(std::vector<Kernel::JailCounted<TextFrameNode>> frames)
@@ -43,7 +42,6 @@ void TextFlow::SetLayout(Kernel::Counted<Story::Layout> layout, std::uint64_t ha
     m_LayoutHash = hash;
     m_GlyphsUsable = m_Layout && m_Layout->HasGlyphData();
     m_GlyphLoader = std::move(loader);
-    m_Dirty = !m_Layout;
 }
 
 bool TextFlow::EnsureGlyphData() const

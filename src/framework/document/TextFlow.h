@@ -21,8 +21,8 @@ enum class TextFlowPurpose : std::uint8_t
 
 /// A story in its chain of frames, with its composed layout.
 ///
-/// Frame `i` of the chain shows frame `i` of the layout. The layout is a snapshot: composing puts another in its place. A
-/// layout that comes from a file has its small facts at once, and its glyphs from the first `EnsureGlyphData` on. All
+/// Frame `i` of the chain shows frame `i` of the layout. The layout is a snapshot: composing puts another in its place.
+/// A layout that comes from a file has its small facts at once, and its glyphs from the first `EnsureGlyphData` on. All
 /// needs the document's reader lock, changing its writer lock.
 class TextFlow : public virtual Kernel::Countable
 {
@@ -41,7 +41,7 @@ public:
 
     /// Never null.
     [[nodiscard]] Kernel::Counted<Story::Story> const & GetStory() const { return m_Story; }
-    /// Another text; the layout is then dirty.
+    /// Another text; whoever changes it tells the document that its text is dirty.
     void SetStory(Kernel::Counted<Story::Story> story);
 
     [[nodiscard]] std::vector<Kernel::JailCounted<TextFrameNode>> const & GetFrames() const { return m_Frames; }
@@ -49,21 +49,17 @@ public:
 
     /// Null before the first composition.
     [[nodiscard]] Kernel::Counted<Story::Layout const> GetLayout() const { return m_Layout; }
-    /// A layout with what it was made from: `hash` covers text, styles and geometry. The flow is then clean. `loader` is
-    /// empty for a layout that has its glyphs.
+    /// A layout with what it was made from: `hash` covers text, styles and geometry. `loader` is empty for a layout
+    /// that has its glyphs.
     void SetLayout(Kernel::Counted<Story::Layout> layout, std::uint64_t hash, GlyphLoader loader);
     /// The fonts of a layout whose glyphs are still in the file.
     void SetSavedFonts(std::vector<FontStamp> fonts) { m_SavedFonts = std::move(fonts); }
     /// The fonts of the layout as they are now, or as the file has them if the glyphs are still there.
     [[nodiscard]] std::vector<FontStamp> GetFonts() const;
     [[nodiscard]] std::uint64_t GetLayoutHash() const { return m_LayoutHash; }
-    /// Makes the glyph data available. False if there is no layout, or if its glyphs or fonts can't be had any more: the
-    /// flow has to be composed again. Any number of threads may call it at once.
+    /// Makes the glyph data available. False if there is no layout, or if its glyphs or fonts can't be had any more:
+    /// the flow has to be composed again. Any number of threads may call it at once.
     [[nodiscard]] bool EnsureGlyphData() const;
-
-    /// The text, styles or frames may have changed since the layout was made.
-    [[nodiscard]] bool IsDirty() const { return m_Dirty; }
-    void SetDirty() { m_Dirty = true; }
 
     /// The chain grows and shrinks with the text, by whole pages made from the document's masters.
     [[nodiscard]] bool IsGrowing() const { return m_Growing; }
@@ -85,7 +81,6 @@ private:
     Kernel::Counted<Story::Layout> m_Layout;
     std::vector<FontStamp> m_SavedFonts;
     std::uint64_t m_LayoutHash = 0;
-    bool m_Dirty = true;
     bool m_Growing = false;
     TextFlowPurpose m_Purpose = TextFlowPurpose::Text;
 

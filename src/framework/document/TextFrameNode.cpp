@@ -35,7 +35,8 @@ Story::Selection TextFrameNode::GetStorySelection(bool wholeStory) const
     }
     Story::LayoutItem::Frame const & frame = layout->GetFrames()[static_cast<std::size_t>(m_FrameIndex)];
     std::size_t const length = story.GetLength();
-    return {{story, std::min<std::size_t>(frame.m_TextBegin, length)}, {story, std::min<std::size_t>(frame.m_TextEnd, length)}};
+    return {{story, std::min<std::size_t>(frame.m_TextBegin, length)},
+            {story, std::min<std::size_t>(frame.m_TextEnd, length)}};
 }
 
 Kernel::Counted<TextFlow> TextFrameNode::GetTextFlow() const
@@ -47,5 +48,6 @@ int TextFrameNode::GetPageIndex() const
 {
     Kernel::JailCounted<SpreadNode> const spread = GetSpreadNode();
     int const first = spread ? spread->GetFirstPageIndex() : -1;
-    return first < 0 ? -1 : first + spread->FindPage({(m_Rect.left + m_Rect.right) / 2, (m_Rect.top + m_Rect.bottom) / 2});
+    return first < 0 ? -1
+                     : first + spread->FindPage({(m_Rect.left + m_Rect.right) / 2, (m_Rect.top + m_Rect.bottom) / 2});
 }

@@ -10,10 +10,18 @@ void AppendEscaped(std::string & out, std::string_view text)
 {
     for (char const c : text) {
         switch (c) {
-        case '&': out += "&amp;"; break;
-        case '<': out += "&lt;"; break;
-        case '>': out += "&gt;"; break;
-        case '"': out += "&quot;"; break;
+        case '&':
+            out += "&amp;";
+            break;
+        case '<':
+            out += "&lt;";
+            break;
+        case '>':
+            out += "&gt;";
+            break;
+        case '"':
+            out += "&quot;";
+            break;
         default:
             if (0x20 <= static_cast<unsigned char>(c) || '\t' == c || '\n' == c || '\r' == c) {
                 out += c;
@@ -25,10 +33,14 @@ void AppendEscaped(std::string & out, std::string_view text)
 char const * Container(XMPTree::Form form)
 {
     switch (form) {
-    case XMPTree::Form::Bag: return "rdf:Bag";
-    case XMPTree::Form::Sequence: return "rdf:Seq";
-    case XMPTree::Form::LanguageAlternative: return "rdf:Alt";
-    case XMPTree::Form::Text: break;
+    case XMPTree::Form::Bag:
+        return "rdf:Bag";
+    case XMPTree::Form::Sequence:
+        return "rdf:Seq";
+    case XMPTree::Form::LanguageAlternative:
+        return "rdf:Alt";
+    case XMPTree::Form::Text:
+        break;
     }
     return nullptr;
 }

@@ -31,7 +31,8 @@ public:
     void Add(String name, Form form, std::vector<String> values);
     [[nodiscard]] std::vector<Property> const & GetProperties() const { return m_Properties; }
 
-    /// The tree as an `x:xmpmeta` element in UTF-8, without a packet wrapper. Characters that XML can't hold are left out.
+    /// The tree as an `x:xmpmeta` element in UTF-8, without a packet wrapper. Characters that XML can't hold are left
+    /// out.
     [[nodiscard]] String ToXML() const;
 
 private:
