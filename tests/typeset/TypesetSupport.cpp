@@ -59,10 +59,18 @@ std::u16string ToUtf16(std::string_view text)
 
 std::vector<std::u16string> ReadCorpus(std::string const & folder)
 {
+    std::filesystem::path const source(KORVANE_SOURCE_FOLDER);
     char const * own = std::getenv("KORVANE_CORPUS");
-    std::filesystem::path const root = std::filesystem::path(own ? own : "/work/shared/corpus") / folder;
     std::vector<std::u16string> paragraphs;
     std::error_code error;
+    std::filesystem::path root;
+    for (std::filesystem::path const & place :
+         {own ? std::filesystem::path(own) : source / "../shared/corpus", source / "../../shared/corpus"}) {
+        if (std::filesystem::exists(place / folder, error)) {
+            root = place / folder;
+            break;
+        }
+    }
     std::vector<std::filesystem::path> files;
     for (auto const & entry : std::filesystem::directory_iterator(root, error)) {
         if (entry.path().extension() == ".md") {

@@ -10,7 +10,8 @@
 [[nodiscard]] std::string ToUtf8(std::u16string_view text);
 [[nodiscard]] std::u16string ToUtf16(std::string_view text);
 
-/// Paragraphs (lines of Markdown that are not empty) of a folder of the shared corpus; none where it is not there.
+/// Paragraphs (lines of Markdown that are not empty) of a folder of the corpus, which KORVANE_CORPUS names, or which lies beside
+/// the checkout; none where it is not there.
 [[nodiscard]] std::vector<std::u16string> ReadCorpus(std::string const & folder);
 
 /// A paragraph of one style, set and looked at.

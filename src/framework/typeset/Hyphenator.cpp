@@ -1,13 +1,11 @@
 #include "framework/typeset/Hyphenator.h"
 
-#include <hyphen.h>
 #include <unicode/uchar.h>
-#include <unicode/ucnv.h>
 #include <unicode/unorm2.h>
-#include <unicode/ustring.h>
 #include <unicode/utf16.h>
 
 #include <algorithm>
+#include <cctype>
 #include <cstdlib>
 #include <map>
 #include <memory>
@@ -17,15 +15,6 @@
 
 namespace Typeset
 {
-
-struct Hyphenator::Dictionary
-{
-    HyphenDict * m_Hyphen = nullptr;
-    bool m_Utf8 = false;
-    /// For an 8-bit encoding: the byte of each code unit, 0 where it has none.
-    std::vector<char> m_Bytes;
-    std::string m_Locale;
-};
 
 namespace
 {
@@ -37,7 +26,7 @@ struct Minima
     int m_Right;
 };
 
-// The least fragments that each language's typographers accept; what a dictionary declares is not smaller for these.
+// The least fragments that each language's typographers accept; what a dictionary declares counts where it is more.
 constexpr Minima minima[] = {{"de", 2, 2}, {"el", 2, 2}, {"en", 2, 3}, {"es", 2, 2}, {"fr", 2, 3},
                              {"it", 2, 2}, {"nl", 2, 2}, {"pl", 2, 2}, {"pt", 2, 3}, {"ru", 2, 2},
                              {"sv", 2, 2}, {"cs", 2, 3}, {"uk", 2, 2}, {"la", 2, 2}};
@@ -79,28 +68,6 @@ std::string FindDictionary(std::string_view language)
     return {};
 }
 
-/// The byte that stands for each code unit of the Basic Multilingual Plane in an 8-bit encoding.
-std::vector<char> ReadEncoding(char const * name)
-{
-    std::vector<char> bytes;
-    UErrorCode error = U_ZERO_ERROR;
-    UConverter * converter = ucnv_open(name, &error);
-    if (U_FAILURE(error)) {
-        return bytes;
-    }
-    bytes.assign(0x10000, 0);
-    for (int byte = 1; byte < 256; ++byte) {
-        char const source = static_cast<char>(byte);
-        UChar target[4] = {};
-        error = U_ZERO_ERROR;
-        if (ucnv_toUChars(converter, target, 4, &source, 1, &error) == 1 && U_SUCCESS(error) && target[0] != 0xFFFD) {
-            bytes[target[0]] = source;
-        }
-    }
-    ucnv_close(converter);
-    return bytes;
-}
-
 }
 
 Hyphenator const * Hyphenator::Get(String const & language)
@@ -118,24 +85,18 @@ Hyphenator const * Hyphenator::Get(String const & language)
     if (std::string const path = FindDictionary(tag); !path.empty()) {
         std::unique_ptr<Hyphenator> & made = byPath[path + "|" + tag.substr(0, 2)];
         if (!made) {
-            if (HyphenDict * hyphen = hnj_hyphen_load(path.c_str())) {
-                made.reset(new Hyphenator);
-                made->m_Dictionary = new Dictionary;
-                Dictionary & dictionary = *made->m_Dictionary;
-                dictionary.m_Hyphen = hyphen;
-                dictionary.m_Utf8 = hyphen->utf8 != 0;
-                dictionary.m_Locale = tag.substr(0, tag.find_first_of("-_"));
-                if (!dictionary.m_Utf8) {
-                    dictionary.m_Bytes = ReadEncoding(hyphen->cset);
-                }
-                made->m_LeftMinimum = std::max<int>(hyphen->lhmin, 2);
-                made->m_RightMinimum = std::max<int>(hyphen->rhmin, 2);
+            std::unique_ptr<Hyphenator> loaded(new Hyphenator);
+            if (loaded->m_Patterns.Load(path)) {
+                std::string const base = tag.substr(0, tag.find_first_of("-_"));
+                loaded->m_LeftMinimum = std::max(loaded->m_Patterns.GetLeftMinimum(), 2);
+                loaded->m_RightMinimum = std::max(loaded->m_Patterns.GetRightMinimum(), 2);
                 for (Minima const & entry : minima) {
-                    if (dictionary.m_Locale == entry.m_Language) {
-                        made->m_LeftMinimum = std::max<int>(hyphen->lhmin, entry.m_Left);
-                        made->m_RightMinimum = std::max<int>(hyphen->rhmin, entry.m_Right);
+                    if (base == entry.m_Language) {
+                        loaded->m_LeftMinimum = std::max(loaded->m_LeftMinimum, entry.m_Left);
+                        loaded->m_RightMinimum = std::max(loaded->m_RightMinimum, entry.m_Right);
                     }
                 }
+                made = std::move(loaded);
             }
         }
         found = made.get();
@@ -144,93 +105,43 @@ Hyphenator const * Hyphenator::Get(String const & language)
     return found;
 }
 
-Hyphenator::~Hyphenator()
-{
-    if (m_Dictionary) {
-        hnj_hyphen_free(m_Dictionary->m_Hyphen);
-        delete m_Dictionary;
-    }
-}
-
 void Hyphenator::Hyphenate(std::u16string_view word, std::vector<std::uint16_t> & positions) const
 {
     constexpr std::size_t longest = 200; // Longer strings are no words.
     if (word.size() < static_cast<std::size_t>(m_LeftMinimum + m_RightMinimum) || word.size() > longest) {
         return;
     }
-    // One letter at a time, so that offsets in the lower-cased word lead back to the text. A letter whose lower case
-    // is longer stays as it is.
-    Dictionary const & dictionary = *m_Dictionary;
-    std::string bytes;
-    std::vector<std::uint16_t> starts; // Offset in the word of each letter of the dictionary's alphabet.
-    bytes.reserve(word.size() * 3);
-    std::size_t const length = word.size();
-    for (std::size_t i = 0; i < length;) {
-        std::size_t const start = i;
+    // One letter at a time, so that places in the lower-cased word lead back to the text.
+    std::u16string letters;
+    std::vector<std::uint16_t> starts; // Offset in the word of each letter.
+    for (std::size_t i = 0; i < word.size();) {
+        starts.push_back(static_cast<std::uint16_t>(i));
         UChar32 character = 0;
-        U16_NEXT(word.data(), i, length, character);
-        if (character == 0x2019) {
-            character = '\'';
+        U16_NEXT(word.data(), i, word.size(), character);
+        character = character == 0x2019 ? '\'' : u_tolower(character);
+        if (character > 0xFFFF) {
+            character = 0xFFFD; // No pattern has such letters.
+        } else if (!m_Patterns.Knows(static_cast<char16_t>(character))) {
+            // Polytonic Greek in a monotonic dictionary: accents do not matter to the syllables.
+            UErrorCode error = U_ZERO_ERROR;
+            UChar decomposed[8];
+            std::int32_t const count =
+                unorm2_getDecomposition(unorm2_getNFDInstance(&error), character, decomposed, 8, &error);
+            if (U_SUCCESS(error) && count > 0 && m_Patterns.Knows(decomposed[0])) {
+                character = decomposed[0];
+            }
         }
-        UChar32 const lower = u_tolower(character);
-        if (dictionary.m_Utf8) {
-            char units[4];
-            int count = 0;
-            UBool failed = false;
-            U8_APPEND(units, count, 4, lower, failed);
-            if (failed) {
-                return;
-            }
-            bytes.append(units, static_cast<std::size_t>(count));
-        } else {
-            char byte = lower < 0x10000 ? dictionary.m_Bytes[static_cast<std::size_t>(lower)] : '\0';
-            if (!byte && character == '\'') {
-                byte = '\'';
-            }
-            if (!byte) {
-                // Polytonic Greek in a monotonic dictionary: breathings and accents do not matter to the syllables.
-                UErrorCode error = U_ZERO_ERROR;
-                UNormalizer2 const * normaliser = unorm2_getNFDInstance(&error);
-                UChar decomposed[8];
-                int const count = unorm2_getDecomposition(normaliser, lower, decomposed, 8, &error);
-                if (U_FAILURE(error) || count < 1) {
-                    return;
-                }
-                byte = dictionary.m_Bytes[decomposed[0]];
-                if (!byte) {
-                    return;
-                }
-            }
-            bytes.push_back(byte);
-        }
-        starts.push_back(static_cast<std::uint16_t>(start));
+        letters += static_cast<char16_t>(character);
     }
-
-    std::vector<char> marks(bytes.size() + 5, 0);
-    char ** replacements = nullptr;
-    int * replacementPositions = nullptr;
-    int * replacementCuts = nullptr;
-    int const failed = hnj_hyphen_hyphenate3(dictionary.m_Hyphen, bytes.c_str(), static_cast<int>(bytes.size()),
-                                             marks.data(), nullptr, &replacements, &replacementPositions,
-                                             &replacementCuts, m_LeftMinimum, m_RightMinimum, 2, 2);
-    // With replacements, a break would change the spelling ("Schiffahrt" to "Schiff-fahrt"): such places are left out.
-    if (!failed) {
-        int const letters = static_cast<int>(starts.size());
-        for (int i = m_LeftMinimum - 1; i + m_RightMinimum < letters; ++i) {
-            bool const changesSpelling = replacements && replacements[i];
-            if ((marks[static_cast<std::size_t>(i)] & 1) && !changesSpelling) {
-                positions.push_back(starts[static_cast<std::size_t>(i) + 1]);
-            }
+    std::vector<bool> const allowed = m_Patterns.Find(letters);
+    auto const count = static_cast<int>(letters.size());
+    for (int i = m_LeftMinimum; i + m_RightMinimum <= count; ++i) {
+        // Marks stay with their letter.
+        bool const beforeMark = u_charType(letters[static_cast<std::size_t>(i)]) == U_NON_SPACING_MARK;
+        if (allowed[static_cast<std::size_t>(i) - 1] && !beforeMark) {
+            positions.push_back(starts[static_cast<std::size_t>(i)]);
         }
     }
-    if (replacements) {
-        for (std::size_t i = 0; i < bytes.size(); ++i) {
-            std::free(replacements[i]);
-        }
-        std::free(replacements);
-    }
-    std::free(replacementPositions);
-    std::free(replacementCuts);
 }
 
 }

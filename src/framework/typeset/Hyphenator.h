@@ -1,6 +1,7 @@
 #pragma once
 
 #include "framework/kernel/StringT.h"
+#include "framework/typeset/HyphenPatterns.h"
 
 #include <cstdint>
 #include <string_view>
@@ -9,7 +10,7 @@
 namespace Typeset
 {
 
-/// Hyphenation patterns of one language, from the libhyphen dictionaries in /usr/share/hyphen (or the folders in
+/// Hyphenation patterns of one language, from the dictionaries of libhyphen in /usr/share/hyphen (or the folders in
 /// KORVANE_HYPHEN_PATH). Made once a language and kept for the process. Any thread.
 class Hyphenator
 {
@@ -20,8 +21,7 @@ public:
 
     /// Offsets in the word after which a hyphen may stand, ascending, appended to `positions` (relative to the word,
     /// in code units: 2 = between the second and the third). The word is taken as it stands in the text: letters, with
-    /// apostrophes and combining marks. Words shorter than the two minima together give none; neither do words that
-    /// the dictionary's encoding can't express.
+    /// apostrophes and combining marks. Words shorter than the two minima together give none.
     void Hyphenate(std::u16string_view word, std::vector<std::uint16_t> & positions) const;
 
     /// Least number of letters before and after a hyphen.
@@ -30,13 +30,11 @@ public:
 
     Hyphenator(Hyphenator const &) = delete;
     Hyphenator & operator=(Hyphenator const &) = delete;
-    ~Hyphenator();
 
 private:
     Hyphenator() = default;
 
-    struct Dictionary;
-    Dictionary * m_Dictionary = nullptr;
+    HyphenPatterns m_Patterns;
     int m_LeftMinimum = 2;
     int m_RightMinimum = 2;
 };
