@@ -1,0 +1,158 @@
+#include "ProgramTest.h"
+
+#include "app/Interruption.h"
+
+#include <thread>
+
+class BuildVerbTest : public ProgramTest
+{
+};
+
+TEST_F(BuildVerbTest, AFolderBecomesABookAndASecondRunHasNothingToDo)
+{
+    WriteBook(3);
+    int code = 0;
+    auto const first = RunJson({"build", "@book", "-o", "@out.pdf"}, &code);
+    ASSERT_EQ(code, 0) << first.dump(1);
+    EXPECT_TRUE(IsWholePdf(m_Folder / "out.pdf"));
+    EXPECT_EQ(first["chapters"].size(), 4u);
+    EXPECT_EQ(CountPages(m_Folder / "out.pdf"), first["pages"].get<int>());
+    EXPECT_FALSE(first["upToDate"].get<bool>());
+
+    auto const documents = Documents();
+    std::string const pdf = Read("out.pdf");
+    EXPECT_TRUE(RunJson({"build", "@book", "-o", "@out.pdf"})["upToDate"].get<bool>());
+    EXPECT_EQ(Documents(), documents);
+    EXPECT_EQ(Read("out.pdf"), pdf);
+}
+
+TEST_F(BuildVerbTest, OnlyWhatChangedIsMadeAnewAndNumbersFollow)
+{
+    WriteBook(3);
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    ASSERT_TRUE(Exists("book/book.pdf"));
+    auto const before = Documents();
+
+    Write("book/3.md", "# Chapter 3\n\nShort now.\n");
+    auto const result = RunJson({"build", "@book"});
+    auto const after = Documents();
+    for (char const * name : {"title-page.kvdoc", "1.kvdoc", "2.kvdoc"}) {
+        EXPECT_TRUE(before.at(name) == after.at(name)) << name;
+    }
+    EXPECT_FALSE(before.at("3.kvdoc") == after.at("3.kvdoc"));
+    EXPECT_EQ(result["chapters"][1]["startPage"], 1);
+    EXPECT_EQ(result["chapters"][3]["startPage"], result["chapters"][2]["startPage"].get<int>() + result["chapters"][2]["pageCount"].get<int>());
+}
+
+TEST_F(BuildVerbTest, TheBookFollowsItsList)
+{
+    WriteBook(4);
+    auto const names = [&](std::string const & list) {
+        Write("book/book.toml", "title-page = false\nchapters = [" + list + "]\n");
+        int code = 0;
+        auto const built = RunJson({"build", "@book"}, &code);
+        EXPECT_EQ(code, 0) << built.dump(1);
+        std::string text;
+        auto const status = RunJson({"status", "@book/.korvane/book.kvbook"});
+        int next = 1;
+        for (auto const & chapter : status["chapters"]) {
+            text += chapter["name"].get<std::string>().back();
+            EXPECT_EQ(chapter["cachedStartPage"], next) << status.dump(1);
+            EXPECT_EQ(chapter["status"], "ok");
+            next += chapter["pageCount"].get<int>();
+        }
+        EXPECT_EQ(CountPages(m_Folder / "book/book.pdf"), next - 1);
+        return text;
+    };
+    EXPECT_EQ(names("'1.md', '2.md', '3.md'"), "123");
+    EXPECT_EQ(names("'3.md', '1.md', '2.md'"), "312");
+    EXPECT_EQ(names("'3.md', '4.md', '2.md', '1.md'"), "3421");
+    EXPECT_EQ(names("'2.md'"), "2");
+    EXPECT_EQ(names("'1.md', '2.md', '3.md', '4.md'"), "1234");
+}
+
+TEST_F(BuildVerbTest, AnotherTemplateOrTitleMakesTheBookAnew)
+{
+    WriteBook(1);
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    EXPECT_TRUE(RunJson({"build", "@book"})["upToDate"].get<bool>());
+    EXPECT_FALSE(RunJson({"build", "@book", "--template", "report"})["upToDate"].get<bool>());
+    Write("book/book.toml", "title = 'Another'\ntemplate = 'report'\n");
+    auto const renamed = RunJson({"build", "@book"});
+    EXPECT_FALSE(renamed["upToDate"].get<bool>());
+    EXPECT_EQ(renamed["chapters"][0]["title"], "Another");
+    EXPECT_TRUE(RunJson({"build", "@book"})["upToDate"].get<bool>());
+    std::filesystem::remove(m_Folder / "book/book.pdf");
+    EXPECT_FALSE(RunJson({"build", "@book"})["upToDate"].get<bool>());
+    EXPECT_TRUE(Exists("book/book.pdf"));
+}
+
+TEST_F(BuildVerbTest, AFixedTimeGivesTheSameBytes)
+{
+    WriteBook(2);
+    ASSERT_EQ(Run({"build", "@book", "-o", "@a.pdf", "--work", "@w1", "--fixed-time", "1000000000"}).m_Code, 0);
+    ASSERT_EQ(Run({"build", "@book", "-o", "@b.pdf", "--work", "@w1", "--fixed-time", "1000000000"}).m_Code, 0);
+    EXPECT_TRUE(Read("a.pdf") == Read("b.pdf"));
+}
+
+TEST_F(BuildVerbTest, DamagedWorkFilesAreMadeAnew)
+{
+    WriteBook(2);
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    struct Case
+    {
+        char const * m_File;
+        std::string m_Content;
+    };
+    std::string const document = Read("book/.korvane/1.kvdoc");
+    std::string const book = Read("book/.korvane/book.kvbook");
+    for (auto const & [file, content] : {
+             Case{"1.kvdoc", document.substr(0, document.size() / 2)},
+             Case{"1.kvdoc", "no document"},
+             Case{"1.kvdoc", book},
+             Case{"book.kvbook", book.substr(0, book.size() / 3)},
+             Case{"book.kvbook", document},
+             Case{"book.kvbook", ""},
+             Case{"import.json", "{\"version\": 1"},
+         }) {
+        SCOPED_TRACE(std::string(file) + " of " + std::to_string(content.size()) + " bytes");
+        Write(std::string("book/.korvane/") + file, content);
+        auto const outcome = Run({"build", "@book"});
+        EXPECT_EQ(outcome.m_Code, 0) << outcome.m_Err;
+        EXPECT_TRUE(IsWholePdf(m_Folder / "book/book.pdf"));
+        EXPECT_TRUE(RunJson({"build", "@book"})["upToDate"].get<bool>());
+    }
+}
+
+TEST_F(BuildVerbTest, InterruptingLeavesNothingHalfWritten)
+{
+    WriteBook(6);
+    Write("out.pdf", "old");
+    for (int const delay : {0, 3, 10, 30, 80, 200}) {
+        SCOPED_TRACE(delay);
+        std::atomic<bool> hasEnded = false;
+        std::jthread const user([&] {
+            std::this_thread::sleep_for(std::chrono::milliseconds(delay));
+            for (int times = 0; times < 50 && !hasEnded; ++times) {
+                App::Interruption::Raise();
+                std::this_thread::sleep_for(std::chrono::milliseconds(2));
+            }
+        });
+        auto const outcome = Run({"build", "@book", "-o", "@out.pdf", "--force"});
+        hasEnded = true;
+        if (0 == outcome.m_Code) {
+            EXPECT_TRUE(IsWholePdf(m_Folder / "out.pdf"));
+            Write("out.pdf", "old");
+        } else {
+            EXPECT_EQ(outcome.m_Code, 1);
+            EXPECT_NE(outcome.m_Err.find("nterrupted"), std::string::npos) << outcome.m_Err;
+            EXPECT_EQ(Read("out.pdf"), "old");
+        }
+    }
+    EXPECT_EQ(Run({"build", "@book", "-o", "@out.pdf"}).m_Code, 0);
+    EXPECT_TRUE(IsWholePdf(m_Folder / "out.pdf"));
+    for (auto const & entry : std::filesystem::directory_iterator(m_Folder / "book/.korvane")) {
+        std::string const extension = entry.path().extension().string();
+        EXPECT_TRUE(".kvdoc" == extension || ".kvbook" == extension || ".json" == extension) << entry.path();
+    }
+}

@@ -1,0 +1,171 @@
+#include "ProgramTest.h"
+
+#include "app/BookFileLock.h"
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+class WrongInputTest : public ProgramTest
+{
+};
+
+namespace
+{
+
+struct Case
+{
+    char const * m_Why;
+    std::vector<std::pair<std::string, std::string>> m_Files;
+    int m_Code;
+    /// What the messages have to contain.
+    std::vector<std::string> m_Messages;
+};
+
+std::string Deep()
+{
+    std::string text;
+    for (int level = 0; level < 20; ++level) {
+        text += std::string(static_cast<std::size_t>(level) * 2, ' ') + "- level " + std::to_string(level) + "\n";
+    }
+    return text;
+}
+
+std::string WideTable()
+{
+    std::string head = "|";
+    std::string rule = "|";
+    for (int column = 0; column < 40; ++column) {
+        head += " column" + std::to_string(column) + " |";
+        rule += "---|";
+    }
+    return head + "\n" + rule + "\n" + head + "\n";
+}
+
+}
+
+TEST_F(WrongInputTest, EachWrongSourceGetsItsSentenceAndAsMuchAsCanBeIsSet)
+{
+    std::string const png = "\x89PNG\r\n\x1a\n" + std::string(40, '\0');
+    std::vector<Case> const cases{
+        {"a chapter is missing", {{"book.toml", "chapters = ['a.md',\n'b.md']"}, {"a.md", "# A"}}, 1, {"book.toml:2:1: error: ", "b.md"}},
+        {"a chapter is listed twice", {{"book.toml", "chapters = ['a.md', 'a.md']"}, {"a.md", "# A"}}, 0, {"book.toml:1:21: warning: "}},
+        {"a syntax error", {{"book.toml", "title = \n"}, {"a.md", "# A"}}, 1, {"book.toml:1:"}},
+        {"an unknown key", {{"book.toml", "colour = 'red'\n"}, {"a.md", "# A"}}, 0, {"book.toml:1:1: warning: "}},
+        {"an unknown template", {{"book.toml", "template = 'nvoel'\n"}, {"a.md", "# A"}}, 1, {"nvoel", "novel"}},
+        {"invalid UTF-8", {{"a.md", "# A\n\nx\xff"}, {"b.md", "# B"}}, 1, {"a.md:3:2: error: "}},
+        {"zero bytes", {{"a.md", std::string("# A\0", 4)}, {"b.md", "# B"}}, 1, {"a.md:1:4: error: "}},
+        {"UTF-16", {{"a.md", std::string("\xff\xfe#\0 \0A\0", 8)}}, 0, {"a.md: note: "}},
+        {"an empty file", {{"a.md", ""}}, 0, {}},
+        {"only headings", {{"a.md", "# A\n## B\n### C\n"}}, 0, {}},
+        {"twenty levels of lists", {{"a.md", Deep()}}, 0, {}},
+        {"a word longer than a line", {{"a.md", std::string(5000, 'w')}}, 0, {}},
+        {"a table wider than the page", {{"a.md", WideTable()}}, 0, {}},
+        {"a missing picture", {{"a.md", "x\n\n![P](gone.png)"}}, 0, {"a.md:3: warning: ", "gone.png"}},
+        {"a picture cut short", {{"a.md", "![P](p.png)"}, {"p.png", png}}, 0, {"a.md:1: warning: ", "p.png"}},
+        {"a picture that is none", {{"a.md", "![P](p.jpg)"}, {"p.jpg", "hello"}}, 0, {"a.md:1: warning: ", "p.jpg"}},
+        {"links to nowhere", {{"a.md", "# A\n\n[x](#gone) [y](b.md#gone) [z](c.md)"}, {"b.md", "# B"}}, 0,
+         {"a.md:3: warning: The link to #gone", "b.md has no anchor #gone", "The link to c.md"}},
+        {"an anchor twice", {{"a.md", "# A {#x}\n\n# B {#x}\n"}}, 0, {"a.md:3: warning: "}},
+        {"a file in place of the work folder", {{"a.md", "# A"}, {".korvane", "x"}}, 1, {"work folder"}},
+        {"a folder in place of the output", {{"a.md", "# A"}, {"book.pdf/x", "x"}}, 1, {"book.pdf"}},
+        {"a template with a mistake", {{"book.toml", "template = 'x.toml'"}, {"a.md", "# A"}, {"x.toml", "[page]\nsize = 'A0'"}}, 1, {"x.toml:2:"}},
+    };
+    for (Case const & row : cases) {
+        SCOPED_TRACE(row.m_Why);
+        std::filesystem::remove_all(m_Folder / "book");
+        for (auto const & [name, text] : row.m_Files) {
+            Write("book/" + name, text);
+        }
+        auto const outcome = Run({"build", "@book"});
+        EXPECT_EQ(outcome.m_Code, row.m_Code) << outcome.m_Err;
+        for (std::string const & text : row.m_Messages) {
+            EXPECT_NE(outcome.m_Err.find(text), std::string::npos) << text << " is not in\n" << outcome.m_Err;
+        }
+        if (std::filesystem::is_regular_file(m_Folder / "book/book.pdf")) {
+            EXPECT_TRUE(IsWholePdf(m_Folder / "book/book.pdf"));
+        } else {
+            EXPECT_EQ(row.m_Code, 1);
+        }
+    }
+}
+
+TEST_F(WrongInputTest, WrongUseIsToldFromFailure)
+{
+    struct Use
+    {
+        std::vector<std::string> m_Arguments;
+        int m_Code;
+        char const * m_Text;
+    };
+    for (auto const & [arguments, code, text] : {
+             Use{{}, 2, "subcommand"},
+             Use{{"bind"}, 2, ""},
+             Use{{"build"}, 2, "FOLDER"},
+             Use{{"build", "@", "--colour"}, 2, "--colour"},
+             Use{{"export", "x.kvbook"}, 2, "--output"},
+             Use{{"--help"}, 0, "Example"},
+             Use{{"build", "--help"}, 0, "Example"},
+             Use{{"--version"}, 0, "korvane"},
+             Use{{"build", "@nowhere"}, 1, "no such folder"},
+             Use{{"build", "@"}, 1, "no Markdown file"},
+             Use{{"status", "@gone.kvbook"}, 1, "gone.kvbook"},
+             Use{{"show", "@gone.kvdoc"}, 1, "gone.kvdoc"},
+             Use{{"export", "@gone.kvbook", "-o", "@x.pdf"}, 1, "gone.kvbook"},
+             Use{{"import", "@gone.md"}, 1, "gone.md"},
+         }) {
+        auto const outcome = Run(arguments);
+        std::string const all = outcome.m_Out + outcome.m_Err;
+        EXPECT_EQ(outcome.m_Code, code) << all;
+        EXPECT_NE(all.find(text), std::string::npos) << text << " is not in\n" << all;
+    }
+}
+
+TEST_F(WrongInputTest, ForeignAndDamagedFilesAreRefused)
+{
+    WriteBook(1);
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    std::string const document = Read("book/.korvane/1.kvdoc");
+    std::string const book = Read("book/.korvane/book.kvbook");
+    Write("text.kvdoc", "hello");
+    Write("empty.kvbook", "");
+    Write("cut.kvdoc", document.substr(0, document.size() * 2 / 3));
+    Write("cut.kvbook", book.substr(0, book.size() * 2 / 3));
+    Write("swapped.kvbook", document);
+    for (char const * name : {"text.kvdoc", "empty.kvbook", "cut.kvdoc", "cut.kvbook"}) {
+        auto const outcome = Run({"show", std::string("@") + name});
+        EXPECT_EQ(outcome.m_Code, 1) << name;
+        EXPECT_NE(outcome.m_Err.find(name), std::string::npos) << outcome.m_Err;
+    }
+    for (char const * name : {"empty.kvbook", "cut.kvbook", "swapped.kvbook"}) {
+        EXPECT_EQ(Run({"status", std::string("@") + name}).m_Code, 1) << name;
+        EXPECT_EQ(Run({"export", std::string("@") + name, "-o", "@x.pdf"}).m_Code, 1) << name;
+        EXPECT_FALSE(Exists("x.pdf"));
+    }
+}
+
+TEST_F(WrongInputTest, AFolderThatMayNotBeWrittenLeavesTheTargetAlone)
+{
+    if (0 == geteuid()) {
+        GTEST_SKIP() << "nothing is forbidden to the superuser";
+    }
+    WriteBook(1);
+    Write("shut/out.pdf", "old");
+    chmod((m_Folder / "shut").c_str(), 0555);
+    auto const outcome = Run({"build", "@book", "-o", "@shut/out.pdf"});
+    chmod((m_Folder / "shut").c_str(), 0755);
+    EXPECT_EQ(outcome.m_Code, 1);
+    EXPECT_NE(outcome.m_Err.find("out.pdf"), std::string::npos) << outcome.m_Err;
+    EXPECT_EQ(Read("shut/out.pdf"), "old");
+}
+
+TEST_F(WrongInputTest, ASecondProgramIsToldWhoHasTheBook)
+{
+    WriteBook(1);
+    std::filesystem::create_directories(m_Folder / "book/.korvane");
+    App::BookFileLock lock;
+    std::string problem;
+    ASSERT_TRUE(lock.Take(m_Folder / "book/.korvane/book.kvbook", problem)) << problem;
+    auto const outcome = Run({"build", "@book"});
+    EXPECT_EQ(outcome.m_Code, 1);
+    EXPECT_NE(outcome.m_Err.find("process " + std::to_string(getpid())), std::string::npos) << outcome.m_Err;
+}
