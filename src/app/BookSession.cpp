@@ -137,6 +137,17 @@ void BookSession::RefreshChapters()
     WaitForRest();
 }
 
+void BookSession::ReportUnusable(Import::MessageList & messages) const
+{
+    for (ChapterPtr const & chapter : GetChapters()) {
+        if (!chapter->IsValid()) {
+            messages.Error("chapter-unusable", {chapter->GetPath().ToStd()},
+                           "The chapter \"" + chapter->GetName().ToStd() + "\" is missing from the output: " +
+                               chapter->GetStatusDescription().ToStd() + ".");
+        }
+    }
+}
+
 void BookSession::MatchChapters(std::vector<Import::ImportedChapter> const & wanted, bool hasTitlePage)
 {
     std::vector<String> paths;

@@ -39,6 +39,8 @@ public:
     void MatchChapters(std::vector<Import::ImportedChapter> const & chapters, bool hasTitlePage);
     /// Refreshes what the book knows of its chapters' documents.
     void RefreshChapters();
+    /// An error for each chapter whose document can't take part in the output.
+    void ReportUnusable(Import::MessageList & messages) const;
     /// Runs the updates before output until no chapter's pages move any more; how many passes it took. After
     /// `g_MostPasses` it says which chapter won't settle.
     int Update(Import::MessageList & messages);

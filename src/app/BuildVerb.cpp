@@ -180,10 +180,10 @@ private:
     {
         session.MatchChapters(m_Chapters, m_Plan->m_HasTitlePage);
         session.RefreshChapters();
+        session.ReportUnusable(m_Messages);
         if (Interruption::IsRaised()) {
             return false;
         }
-        m_Context.m_Console.Progress("Updating numbers", 0);
         m_Passes = session.Update(m_Messages);
         m_Messages.Append(listener.TakeMessages());
         if (Interruption::IsRaised() || !session.Save(m_Book.string(), m_Messages)) {

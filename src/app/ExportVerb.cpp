@@ -50,6 +50,7 @@ int RunExport(VerbContext & context, ExportOptions const & options)
         isGood = session.Open(book.string(), messages);
         if (isGood) {
             session.RefreshChapters();
+            session.ReportUnusable(messages);
             if (session.GetChapters().empty()) {
                 messages.Error("book-empty", {options.m_Book}, "The book has no chapters, so there is nothing to write.");
                 isGood = false;

@@ -105,6 +105,18 @@ bool SaveDocument(DocumentController & document, fs::path const & path, std::str
 
 }
 
+bool Importer::IsUsable(KnownChapter const & known) const
+{
+    fs::path const path = m_Work / known.m_Document;
+    FileStamp const stamp = FileStamp::Of(path);
+    if (!stamp.Exists() || stamp == known.m_DocumentStamp) {
+        return stamp.Exists();
+    }
+    auto const document = Kernel::MakeCounted<DocumentController>();
+    OpenDocumentFailedNotification failure(String(path.string()), false);
+    return document->LoadDocument(String(path.string()), false, true, LoadWhole, nullptr, failure, false);
+}
+
 bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
 {
     PlannedChapter const & planned = *job.m_Planned;
@@ -126,7 +138,9 @@ bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
                                          chapter.m_FrontMatter.m_Language),
                              story);
     FillIndex(*document->GetDocument()->GetIndex(), chapter.m_IndexMarks);
-    return SaveDocument(*document, path, planned.m_Name, job.m_Messages);
+    bool const isSaved = SaveDocument(*document, path, planned.m_Name, job.m_Messages);
+    job.m_Known.m_DocumentStamp = FileStamp::Of(path);
+    return isSaved;
 }
 
 std::uint64_t Importer::FactsOfTitlePage() const
@@ -140,7 +154,7 @@ bool Importer::WriteTitleDocument(std::vector<ImportedChapter> & chapters, Messa
     fs::path const path = m_Work / "title-page.kvdoc";
     KnownChapter & known = m_State.m_Chapters[""];
     std::uint64_t const hash = FactsOfTitlePage();
-    bool const isCurrent = known.m_Facts == hash && FileStamp::Of(path).Exists();
+    bool const isCurrent = known.m_Facts == hash && IsUsable(known);
     if (!isCurrent) {
         auto const document = OpenOrMake(path, "title page", messages);
         if (!document) {
@@ -151,6 +165,8 @@ bool Importer::WriteTitleDocument(std::vector<ImportedChapter> & chapters, Messa
         if (!m_Look.m_TitleMaster.empty()) {
             settings.m_PageSetup.m_FirstMaster = String(m_Look.m_TitleMaster);
         }
+        // The leaf of the title page is its own: the first chapter begins on a right-hand page of the printed book.
+        settings.m_PageSetup.m_ChapterStart = ChapterStart::RightPage;
         // Its pages count for nothing and show no number: the first chapter begins with page 1.
         DocumentSection::Values section;
         section.m_RestartPageNumbering = true;
@@ -163,6 +179,7 @@ bool Importer::WriteTitleDocument(std::vector<ImportedChapter> & chapters, Messa
         known.m_Facts = hash;
         known.m_Title = m_Plan.m_Title;
         known.m_Document = "title-page.kvdoc";
+        known.m_DocumentStamp = FileStamp::Of(path);
     }
     chapters.push_back({"", m_Plan.m_Title, path, !isCurrent});
     return true;

@@ -95,8 +95,7 @@ std::uint64_t Importer::FactsOfLinks(PlannedChapter const & chapter, std::vector
 bool Importer::IsCurrent(Job & job, std::uint64_t facts) const
 {
     KnownChapter & known = job.m_Known;
-    FileStamp const document = FileStamp::Of(m_Work / known.m_Document);
-    if (known.m_Facts != (facts ^ FactsOfLinks(*job.m_Planned, known.m_Links)) || !document.Exists() ||
+    if (known.m_Facts != (facts ^ FactsOfLinks(*job.m_Planned, known.m_Links)) || !IsUsable(known) ||
         !IsUnchanged(job.m_Planned->m_Path, known.m_Source, m_State.m_Saved)) {
         return false;
     }

@@ -63,6 +63,8 @@ private:
     [[nodiscard]] std::vector<Job> MakeJobs() const;
     void RunJob(Job & job) const;
     bool IsCurrent(Job & job, std::uint64_t facts) const;
+    /// The document is there and, if another hand than the importer's has been at it, still a document.
+    [[nodiscard]] bool IsUsable(KnownChapter const & known) const;
     void Import(Job & job, std::uint64_t facts) const;
     bool WriteDocument(Job & job, ChapterText const & chapter) const;
     [[nodiscard]] std::uint64_t FactsOfTitlePage() const;

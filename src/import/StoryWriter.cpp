@@ -196,6 +196,10 @@ StoryWriter::ParagraphAttsPtr StoryWriter::AttsOf(Block const & block, std::stri
         bool const isQuotation = StyleName::Quotation == style;
         left += std::min(quote * (block.m_QuoteDepth - (isQuotation ? 1 : 0)), most);
     }
+    if (&block == m_TitleBlock && !before && !(m_Context.m_Part.empty() && m_Context.m_Number.empty())) {
+        // The lines of part and number belong to the title.
+        atts.SetDouble(Att::SpaceBefore, 0);
+    }
     bool const isItem = ListMark::None != block.m_ListMark && BlockKind::Paragraph == block.m_Kind;
     if (isItem && most < depth * step) {
         atts.SetDouble(Att::ListIndent, most / depth);

@@ -285,6 +285,10 @@ void PieceMaker::MakeText(Segment segment, std::size_t paragraph, ParagraphStyle
                 break;
             }
         }
+        if (context.m_IsCell) {
+            // Rules and neighbours stand close by: the first line of a cell keeps its whole slot.
+            piece.m_HeadAbove = piece.m_Above;
+        }
         if (i > 0) {
             bool const mayBreak = !format.m_KeepTogether && i >= orphans && count - i >= widows;
             piece.m_Break = mayBreak ? Piece::Break::Allowed : Piece::Break::Forbidden;

@@ -268,6 +268,11 @@ void LineSetter::Justify(double missing, Line & line)
     if (capacity + letterCapacity <= 0) {
         return;
     }
+    // A line that a wide box or an endless word has left nearly empty reads better with its own spaces.
+    constexpr double mostSpaces = 6;
+    if (opens && gaps <= 0 && missing > mostSpaces * spaces) {
+        return;
+    }
     double ratio = capacity > 0 ? std::abs(missing) / capacity : 0;
     line.m_SpaceRatio = static_cast<float>(opens ? ratio : -ratio);
     double letterRatio = 0;
