@@ -200,9 +200,10 @@ void BookSession::MatchChapters(std::vector<Import::ImportedChapter> const & wan
     std::size_t const first = hasTitlePage ? 1 : 0;
     auto & collection = Book::BookCollection::GetInstance();
     for (std::size_t at = 0; at < ordered.size(); ++at) {
+        // A document that was in another place before brings the number that it had there.
         bool const isFixed = at <= first;
-        int const start = ordered[at]->GetStartFromPage();
-        if (isFixed ? 1 != start : 1 == start) {
+        int const wantedStart = isFixed ? 1 : 0;
+        if (wantedStart != ordered[at]->GetStartFromPage()) {
             collection.SetPageNumberOptions(m_Book, ordered[at], !isFixed, 1);
         }
     }

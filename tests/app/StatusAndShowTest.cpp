@@ -35,12 +35,12 @@ TEST_F(StatusAndShowTest, StatusGivesTheKeysThatTheHandbookLists)
 
 TEST_F(StatusAndShowTest, ShowTellsADocumentFromAChapter)
 {
-    Write("book/a.md", "---\nlang: de\nauthor: Ich\n---\n# Titel {#t}\n\nText mit Note[^1] und *Nachdruck*.\n\n- eins\n\n|a|b|\n|-|-|\n|c|d|\n\n![Bild](weg.png)\n\n[^1]: Die Note.\n");
+    Write("book/a.md", "---\nlang: fr\nauthor: Ich\n---\n# Titel {#t}\n\nText mit Note[^1] und *Nachdruck*.\n\n- eins\n\n|a|b|\n|-|-|\n|c|d|\n\n![Bild](weg.png)\n\n[^1]: Die Note.\n");
     ASSERT_EQ(Run({"import", "@book/a.md", "-o", "@docs"}).m_Code, 0);
     auto const show = RunJson({"show", "@docs/a.kvdoc"});
     EXPECT_EQ(show["kind"], "document");
     EXPECT_EQ(show["metadata"]["title"], "Titel");
-    EXPECT_EQ(show["metadata"]["language"], "de");
+    EXPECT_EQ(show["metadata"]["language"], "fr");
     EXPECT_EQ(show["metadata"]["author"], "Ich");
     ASSERT_EQ(show["sections"].size(), 1u);
     EXPECT_EQ(KeysOf(show["sections"][0]), (Keys{"format", "included", "prefix", "restart", "startNumber", "startPageIndex"}));
@@ -85,7 +85,7 @@ TEST_F(StatusAndShowTest, ShowTellsABookWithoutOpeningItsChapters)
     ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
     auto const documents = Documents();
     auto const show = RunJson({"show", "@book/.korvane/book.kvbook"});
-    EXPECT_EQ(KeysOf(show), (Keys{"chapters", "kind", "messages", "mergeStrays", "name", "ok", "padStrays", "path", "synchronise"}));
+    EXPECT_EQ(KeysOf(show), (Keys{"chapters", "kind", "mergeStrays", "messages", "name", "ok", "padStrays", "path", "synchronise"}));
     EXPECT_EQ(show["chapters"].size(), 2u);
     EXPECT_EQ(Documents(), documents);
 }
