@@ -7,31 +7,27 @@
 namespace Renderer::RenderTree
 {
 
-namespace
+PdfCompressor::Deflater::Deflater() : m_Quick(libdeflate_alloc_compressor(1)), m_Thorough(libdeflate_alloc_compressor(6))
 {
-
-/// Higher levels gain a hundredth of the size on page contents and cost twice the time.
-constexpr int Level = 6;
-
-}
-
-PdfCompressor::Deflater::Deflater() : m_Compressor(libdeflate_alloc_compressor(Level))
-{
-    if (!m_Compressor) {
+    if (!m_Quick || !m_Thorough) {
+        libdeflate_free_compressor(m_Quick);
+        libdeflate_free_compressor(m_Thorough);
         throw std::bad_alloc();
     }
 }
 
 PdfCompressor::Deflater::~Deflater()
 {
-    libdeflate_free_compressor(m_Compressor);
+    libdeflate_free_compressor(m_Quick);
+    libdeflate_free_compressor(m_Thorough);
 }
 
-std::string_view PdfCompressor::Deflater::Compress(std::string_view data)
+std::string_view PdfCompressor::Deflater::Compress(std::string_view data, Effort effort)
 {
-    m_Buffer.resize(std::max(m_Buffer.size(), libdeflate_zlib_compress_bound(m_Compressor, data.size())));
+    libdeflate_compressor * const compressor = effort == Effort::Quick ? m_Quick : m_Thorough;
+    m_Buffer.resize(std::max(m_Buffer.size(), libdeflate_zlib_compress_bound(compressor, data.size())));
     std::size_t const size =
-        libdeflate_zlib_compress(m_Compressor, data.data(), data.size(), m_Buffer.data(), m_Buffer.size());
+        libdeflate_zlib_compress(compressor, data.data(), data.size(), m_Buffer.data(), m_Buffer.size());
     return std::string_view(m_Buffer).substr(0, size);
 }
 

@@ -114,7 +114,7 @@ public:
 
     SpillRange StoreForm(std::string_view content)
     {
-        std::string_view const packed = m_Deflater.Compress(content);
+        std::string_view const packed = m_Deflater.Compress(content, PdfCompressor::Deflater::Effort::Quick);
         return m_Spill.Append(packed.data(), packed.size());
     }
 
@@ -268,7 +268,7 @@ bool PdfExport::WritePage(PdfPage const & page, DisplayList const & content, std
         std::size_t const size = text.size();
         state.m_Compressor.Add(size, [&spill = state.m_Spill, &range = state.m_File.m_Pages.back().m_Content,
                                       text = std::move(text)](PdfCompressor::Deflater & deflater) {
-            std::string_view const packed = deflater.Compress(text);
+            std::string_view const packed = deflater.Compress(text, PdfCompressor::Deflater::Effort::Quick);
             range = spill.Append(packed.data(), packed.size());
         });
     } catch (std::exception const & exception) {

@@ -224,7 +224,7 @@ bool PdfPictures::FromBitmap(PlacedPicture const & placed, std::uint32_t & image
 
 SpillRange PdfPictures::Deflate(std::string_view data)
 {
-    std::string_view const packed = m_Deflater.Compress(data);
+    std::string_view const packed = m_Deflater.Compress(data, PdfCompressor::Deflater::Effort::Thorough);
     return m_Spill.Append(packed.data(), packed.size());
 }
 
