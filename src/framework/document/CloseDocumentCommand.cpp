@@ -114,6 +114,7 @@ public:
             document.SetWantNotifications(false);
             document.SetWantBackgroundTasks(false);
             document.EngageBookLock(false);
+            document.HoldFile(false);
             notification->Closed(document.GetPath());
             Tell(true);
             break;

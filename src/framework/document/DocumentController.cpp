@@ -250,6 +250,13 @@ bool DocumentController::LoadDocument(String const & path, bool inFront, bool as
     return true;
 }
 
+bool DocumentController::HoldFile(bool alone)
+{
+    Kernel::Counted<Kernel::Archive> const archive = m_Store->GetArchive();
+    using Kind = Kernel::FileLock::Kind;
+    return archive && archive->GetLock() && archive->GetLock()->ChangeKind(alone ? Kind::Exclusive : Kind::Shared);
+}
+
 void DocumentController::ShutDownArchive()
 {
     m_Store->SetArchive(nullptr);

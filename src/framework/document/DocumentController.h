@@ -90,6 +90,10 @@ public:
     /// This moment, as metadata have it.
     [[nodiscard]] static String GetTimeText();
 
+    /// Holds its file for the user alone, or lets others read it, for a document that comes in front or leaves it. False if
+    /// others hold it as well: then it stays as it was. Under the writer lock.
+    bool HoldFile(bool alone);
+
     /// Closes the file and gives its lock back; what is in memory stays. Again, nothing.
     virtual void ShutDownArchive();
     void StopOfflining() const override;

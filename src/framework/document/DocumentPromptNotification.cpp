@@ -37,5 +37,7 @@ bool DocumentPromptNotification::Answer(DocumentPromptChoice choice) const
 
 void DocumentPromptNotification::OnPassedEveryLine()
 {
-    m_Question.MarkAsked();
+    if (IsKept()) {
+        m_Question.MarkAsked();
+    }
 }

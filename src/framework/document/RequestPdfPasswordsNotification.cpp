@@ -25,5 +25,7 @@ bool RequestPdfPasswordsNotification::Answer(Passwords const & passwords) const
 
 void RequestPdfPasswordsNotification::OnPassedEveryLine()
 {
-    m_Question.MarkAsked();
+    if (IsKept()) {
+        m_Question.MarkAsked();
+    }
 }

@@ -142,6 +142,11 @@ Counted<DocumentController> VantraController::OpenDocument(String const & path,
         m_Registry->EndLoading(path, controller, true);
     } else if (!m_Registry->TakeInFront(*controller)) {
         return controller;
+    } else {
+        // Others who only read it may go on; a save looks at the file's lock again.
+        controller->AcquireWriterLock();
+        controller->HoldFile(true);
+        controller->ReleaseWriterLock();
     }
     IntroduceFront(controller);
     return controller;

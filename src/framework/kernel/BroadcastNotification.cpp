@@ -10,6 +10,7 @@
 #include <atomic>
 #include <condition_variable>
 #include <deque>
+#include <memory>
 #include <mutex>
 #include <thread>
 #include <utility>
@@ -43,12 +44,30 @@ public:
     std::uint64_t LastPostingNumber() const { return m_Last.load(std::memory_order_acquire); }
     std::uint64_t DeliveredUpTo();
 
-    static void Passed(Kernel::Notification & notification)
+    /// A notification that wants to know when it has passed all lines: they share this, and the last one tells it.
+    struct Passing
     {
-        if (notification.m_LinesToPass.fetch_sub(1, std::memory_order_acq_rel) == 1) {
-            notification.OnPassedEveryLine();
+        explicit Passing(Kernel::Counted<Kernel::Notification> notification) : m_Notification(std::move(notification)) {}
+        ~Passing() { m_Notification->OnPassedEveryLine(); }
+        Passing(Passing const &) = delete;
+        Passing & operator=(Passing const &) = delete;
+
+        Kernel::Counted<Kernel::Notification> const m_Notification;
+    };
+
+    /// What a line delivers: a notification, in one of two forms, or a function.
+    struct Item
+    {
+        [[nodiscard]] Kernel::Counted<Kernel::Notification> const & GetNotification() const
+        {
+            return m_Passing ? m_Passing->m_Notification : m_Notification;
         }
-    }
+
+        Kernel::Counted<Kernel::Notification> m_Notification;
+        std::shared_ptr<Passing> m_Passing;
+        std::function<void()> m_Function;
+        std::uint64_t m_Number = 0;
+    };
 
 private:
     std::mutex m_Lock;
@@ -65,13 +84,12 @@ public:
     [[nodiscard]] BroadcastNotificationSink * GetSink() const { return m_Sink; }
     [[nodiscard]] std::uint64_t GetId() const { return m_Id; }
 
-    void Append(Kernel::Counted<Kernel::Notification> notification, std::function<void()> function)
+    void Append(Item item)
     {
         Kernel::Activity::Begin();
-        std::uint64_t const number = notification ? notification->GetPostingNumber() : 0;
         {
             std::lock_guard const lock(m_Lock);
-            m_Items.push_back({std::move(notification), std::move(function), number});
+            m_Items.push_back(std::move(item));
             if (std::exchange(m_Scheduled, true)) {
                 return;
             }
@@ -119,7 +137,6 @@ public:
             });
         }
         for (Item & item : dropped) {
-            Pass(item);
             item = Item();
             Kernel::Activity::End();
         }
@@ -141,34 +158,19 @@ public:
     }
 
 private:
-    struct Item
-    {
-        Kernel::Counted<Kernel::Notification> m_Notification;
-        std::function<void()> m_Function;
-        std::uint64_t m_Number = 0;
-    };
-
     void Deliver(Item & item)
     {
         Kernel::TurnSession const session;
         lineOfThread = m_Id;
-        deliveryOfThread = item.m_Notification.Get();
-        if (item.m_Notification) {
-            m_Sink->Notify(item.m_Notification);
-        } else {
+        deliveryOfThread = item.GetNotification().Get();
+        if (item.m_Function) {
             item.m_Function();
+        } else {
+            m_Sink->Notify(item.GetNotification());
         }
         deliveryOfThread = nullptr;
-        Pass(item);
         item = Item();
         lineOfThread = 0;
-    }
-
-    static void Pass(Item & item)
-    {
-        if (item.m_Notification && item.m_Notification->m_TellWhenPassed) {
-            Passed(*item.m_Notification);
-        }
     }
 
     BroadcastNotificationSink * const m_Sink;
@@ -218,18 +220,20 @@ void BroadcastNotification::Hub::Post(Kernel::Counted<Kernel::Notification> cons
         }
         notification->m_PostingNumber.store(m_Last.fetch_add(1, std::memory_order_acq_rel) + 1,
                                             std::memory_order_release);
+        Item item{notification, nullptr, nullptr, notification->GetPostingNumber()};
         if (notification->m_TellWhenPassed) {
-            notification->m_LinesToPass.fetch_add(std::max(1, static_cast<int>(m_Lines.size())));
+            item.m_Passing = std::make_shared<Passing>(std::move(item.m_Notification));
             if (m_Lines.empty()) {
                 Kernel::Activity::Begin();
-                Kernel::Scheduler::Run([notification] {
-                    Passed(*notification);
+                Kernel::Scheduler::Run([passing = std::move(item.m_Passing)]() mutable {
+                    passing.reset();
                     Kernel::Activity::End();
                 });
             }
         }
-        for (Kernel::Counted<Line> const & line : m_Lines) {
-            line->Append(notification, nullptr);
+        // The last line gets the item itself, so that it is never this thread that lets go of it last.
+        for (std::size_t line = 0; line < m_Lines.size(); ++line) {
+            m_Lines[line]->Append(line + 1 < m_Lines.size() ? item : std::move(item));
         }
     }
 }
@@ -247,7 +251,7 @@ void BroadcastNotification::Hub::RunOnLine(std::uint64_t id, std::function<void(
     std::lock_guard const lock(m_Lock);
     for (Kernel::Counted<Line> const & line : m_Lines) {
         if (line->GetId() == id) {
-            line->Append(nullptr, std::move(function));
+            line->Append({nullptr, nullptr, std::move(function), 0});
         }
     }
 }

@@ -45,12 +45,13 @@ protected:
     /// whose constructor calls `TellWhenPassed`.
     virtual void OnPassedEveryLine() {}
     void TellWhenPassed() { m_TellWhenPassed = true; }
+    /// For `OnPassedEveryLine`: somebody has kept the notification. If not, it is about to go.
+    [[nodiscard]] bool IsKept() const { return ReferenceCount() > 1; }
 
 private:
     friend class ::BroadcastNotification;
 
     std::atomic<std::uint64_t> m_PostingNumber{0};
-    std::atomic<int> m_LinesToPass{0};
     bool m_TellWhenPassed = false;
 };
 
