@@ -107,6 +107,41 @@ TEST(PdfExportTest, LinksLeadForwardBackwardAndOut)
     EXPECT_EQ(writer.Probe().Links(1), "");
 }
 
+TEST(PdfExportTest, APlaceOnALaterPageOfASpreadIsFoundFromTheSpreadsFirstPage)
+{
+    PageWriter writer;
+    PdfPage alone;
+    alone.m_Boxes = PageBoxes::Plain(PageWriter::Page);
+    PdfPage beside = alone;
+    beside.m_ContinuesSpread = PdfPage::Continues::Beside;
+    PdfPage below = alone;
+    below.m_ContinuesSpread = PdfPage::Continues::Below;
+    auto const link = [](int page, Kernel::Point position) {
+        PdfHyperlink hyperlink;
+        hyperlink.m_Kind = PdfHyperlink::Position;
+        hyperlink.m_Page = page;
+        hyperlink.m_Position = position;
+        hyperlink.m_Rect = {10, 0, 110, 20};
+        return hyperlink;
+    };
+    std::vector<PdfHyperlink> const links = {
+        link(1, {350, 100}), // Page 2 is beside page 1.
+        link(1, {50, 100}),  // The first page itself.
+        link(3, {350, 100}), // Page 4 is below page 3: too far right is no reason to go there.
+        link(3, {50, 450}),
+        link(4, {350, 450}), // Nothing follows: clipped by no one, as it stands.
+    };
+    writer.Write(Word(u"left"), alone, links);
+    writer.Write(Word(u"right"), beside, {});
+    writer.Write(Word(u"upper"), alone, {});
+    writer.Write(Word(u"lower"), below, {});
+    EXPECT_EQ(writer.Probe().Links(1), "10 380 110 400 -> page 2 (50, 300)\n"
+                                       "10 380 110 400 -> page 1 (50, 300)\n"
+                                       "10 380 110 400 -> page 3 (350, 300)\n"
+                                       "10 380 110 400 -> page 4 (50, 350)\n"
+                                       "10 380 110 400 -> page 4 (350, -50)\n");
+}
+
 TEST(PdfExportTest, TheOutlineKeepsItsTreeAndShowsTheAskedLevels)
 {
     PageWriter writer;

@@ -79,6 +79,10 @@ enum ExportResult ExportItemCommandBase::ExportPDFPage(Renderer::RenderTree::Pdf
     frame.m_Boxes = marks->GetBoxes(BleedOf(page));
     frame.m_Label = page.m_Label;
     frame.m_PrintersMarks = marks;
+    using Continues = Renderer::RenderTree::PdfPage::Continues;
+    frame.m_ContinuesSpread = page.m_IsBesidePrevious  ? Continues::Beside
+                              : page.m_IsBelowPrevious ? Continues::Below
+                                                       : Continues::Nothing;
     if (!pdfExport.WritePage(frame, m_List, links, warnings)) {
         return IsAborted() ? ExportResultAborted : ExportResultFailed;
     }

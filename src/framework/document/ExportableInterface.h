@@ -28,6 +28,9 @@ public:
         /// The page's label in the output; empty if it has none.
         String m_Label;
         bool m_IncludeBackground = true;
+        /// It is a later page of a spread that goes out page by page: to the right of the page before it, or below it.
+        bool m_IsBesidePrevious = false;
+        bool m_IsBelowPrevious = false;
 
         [[nodiscard]] Raster::AffineTransform::Params TransformOf(std::size_t node) const
         {

@@ -107,6 +107,11 @@ void ExportablePages::GetMultiPageExportParams(DocumentController const & docume
             output.m_Label = LabelOf(document, *part.m_Spread, part.m_Page);
         }
     }
+    if (m_Parts.size() == 1 && m_Parts.front().m_Spread && m_Parts.front().m_Page > 0) {
+        bool const vertical = document.GetDocument()->IsVerticalStack();
+        output.m_IsBelowPrevious = vertical;
+        output.m_IsBesidePrevious = !vertical;
+    }
     if (!output.m_Rect.IsEmpty()) {
         params.push_back(std::move(output));
     }

@@ -259,6 +259,7 @@ bool PdfExport::WritePage(PdfPage const & page, DisplayList const & content, std
         record.m_Boxes = state.NumberOfBoxes(boxes);
         record.m_Origin = {page.m_Boxes.GetTrim().left, page.m_Boxes.GetTrim().top};
         record.m_Label = page.m_Label;
+        record.m_Continues = static_cast<std::uint8_t>(page.m_ContinuesSpread);
         record.m_FirstLink = static_cast<std::uint32_t>(state.m_File.m_Links.size());
         for (PdfHyperlink const & link : links) {
             state.AddLink(link, toPage);

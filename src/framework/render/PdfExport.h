@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <memory>
 #include <string>
 #include <vector>
@@ -30,6 +31,15 @@ struct PdfPage
     String m_Label;
     /// For marks outside of the page; may be null.
     Kernel::Counted<PrintersMarksHelper const> m_PrintersMarks;
+    /// Whether this page is the next one of the spread that the page before it began. A position on that page which lies
+    /// beyond its right or lower edge is then a position on this one: links are given in coordinates of spreads.
+    enum class Continues : std::uint8_t
+    {
+        Nothing,
+        Beside,
+        Below
+    };
+    Continues m_ContinuesSpread = Continues::Nothing;
 };
 
 /// Writes one PDF file (ISO 32000-2) page by page: `Create`, `WritePage` for each page in order, `AddBookmarks`, `Close`.

@@ -1,10 +1,12 @@
 #include "framework/render/PdfFile.h"
 
 #include "framework/render/PdfCatalogue.h"
+#include "framework/render/PdfExport.h"
 #include "framework/render/PdfFontObjects.h"
 #include "framework/render/PdfObjects.h"
 #include "framework/render/PdfOutline.h"
 
+#include <cmath>
 #include <map>
 #include <qpdf/QPDFWriter.hh>
 #include <tuple>
@@ -267,25 +269,45 @@ private:
         return action;
     }
 
+    /// Goes from a spread's first page to the one of its pages that the place lies on.
+    void GoToPartOfSpread(std::size_t & index, Kernel::Point & place) const
+    {
+        using Continues = PdfPage::Continues;
+        for (; index + 1 < m_File.m_Pages.size(); ++index) {
+            auto const next = static_cast<Continues>(m_File.m_Pages[index + 1].m_Continues);
+            Kernel::Rect const & trim = m_File.m_Boxes[m_File.m_Pages[index].m_Boxes].GetTrim();
+            double const width = std::abs(trim.Width());
+            double const height = std::abs(trim.Height());
+            if (next == Continues::Beside && place.x >= width) {
+                place.x -= width;
+            } else if (next == Continues::Below && place.y >= height) {
+                place.y -= height;
+            } else {
+                return;
+            }
+        }
+    }
+
     /// Null for a page that is not in the file.
     Handle Destination(PdfTarget const & target)
     {
         if (target.m_Page < 1 || static_cast<std::size_t>(target.m_Page) > m_Pages.size()) {
             return Handle::newNull();
         }
-        std::size_t const index = static_cast<std::size_t>(target.m_Page - 1);
+        std::size_t index = static_cast<std::size_t>(target.m_Page - 1);
         PdfPageRecord const & page = m_File.m_Pages[index];
-        Kernel::Rect const & trim = m_File.m_Boxes[page.m_Boxes].GetTrim();
         Kernel::Point place{0, 0};
         if (target.m_HasPosition) {
             place = target.m_FromTopLeft ? target.m_Position
                                          : Kernel::Point{target.m_Position.x - page.m_Origin.x,
                                                          target.m_Position.y - page.m_Origin.y};
+            GoToPartOfSpread(index, place);
         }
+        Kernel::Rect const & trim = m_File.m_Boxes[m_File.m_Pages[index].m_Boxes].GetTrim();
         double const x = trim.left + place.x;
         double const y = trim.top - place.y;
         // Many links lead to one place: the index to a chapter, a note's marks to the note.
-        Handle & known = m_Destinations[{target.m_Page, ToThousandths(x), ToThousandths(y)}];
+        Handle & known = m_Destinations[{static_cast<int>(index) + 1, ToThousandths(x), ToThousandths(y)}];
         if (!known.isInitialized()) {
             known = Handle::newArray({m_Pages[index], Name("/XYZ"), Number(x), Number(y), m_Null});
         }

@@ -28,6 +28,8 @@ struct PdfPageRecord
     /// Top left of the trimmed page in the display list's coordinates.
     Kernel::Point m_Origin;
     String m_Label;
+    /// Its part in the spread that the page before it began: 0 none, 1 to the right, 2 below.
+    std::uint8_t m_Continues = 0;
 };
 
 /// Where something leads in the file.
