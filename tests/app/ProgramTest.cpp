@@ -1,11 +1,10 @@
 #include "ProgramTest.h"
 
 #include "app/Verbs.h"
+#include "framework/render/Qpdf.h"
 
 #include <cstdlib>
 #include <fstream>
-#include <qpdf/QPDF.hh>
-#include <qpdf/QPDFPageDocumentHelper.hh>
 #include <sstream>
 #include <unistd.h>
 

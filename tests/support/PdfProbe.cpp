@@ -1,4 +1,5 @@
 #include "support/PdfProbe.h"
+#include "framework/render/Qpdf.h"
 
 #include <algorithm>
 #include <array>
@@ -7,8 +8,6 @@
 #include <functional>
 #include <gtest/gtest.h>
 #include <map>
-#include <qpdf/QPDF.hh>
-#include <qpdf/QPDFPageLabelDocumentHelper.hh>
 #include <sstream>
 
 namespace

@@ -5,10 +5,10 @@
 #include "framework/render/PdfFontObjects.h"
 #include "framework/render/PdfObjects.h"
 #include "framework/render/PdfOutline.h"
+#include "framework/render/Qpdf.h"
 
 #include <cmath>
 #include <map>
-#include <qpdf/QPDFWriter.hh>
 #include <tuple>
 
 namespace Renderer::RenderTree

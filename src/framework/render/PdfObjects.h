@@ -11,8 +11,8 @@
 #include "framework/render/PdfCompressor.h"
 #include "framework/render/PdfSpill.h"
 #include "framework/render/PdfText.h"
+#include "framework/render/Qpdf.h"
 
-#include <qpdf/QPDF.hh>
 
 namespace Renderer::RenderTree
 {

@@ -1,8 +1,8 @@
 #include "framework/render/PdfOutline.h"
 
 #include "framework/render/PdfText.h"
+#include "framework/render/Qpdf.h"
 
-#include <qpdf/QPDF.hh>
 #include <unordered_map>
 
 namespace Renderer::RenderTree
