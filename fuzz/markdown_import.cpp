@@ -17,7 +17,8 @@ extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const * data, std::size_t siz
     for (Block const & block : chapter.m_Blocks) {
         std::uint32_t at = 0;
         for (Span const & span : block.m_Text.m_Spans) {
-            if (span.m_Start != at || 0 == span.m_Length || static_cast<std::int32_t>(chapter.m_Links.size()) <= span.m_Link) {
+            if (span.m_Start != at || 0 == span.m_Length ||
+                static_cast<std::int32_t>(chapter.m_Links.size()) <= span.m_Link) {
                 std::abort();
             }
             at += span.m_Length;

@@ -27,7 +27,8 @@ Kernel::Consolidated<Renderer::FileExportOptions> MakeOptions(PdfWishes const & 
     options->SetSettings(settings);
     options->SetIncludeBleed(wishes.m_IncludesBleed || wishes.m_HasMarks);
     options->SetEmbedMetadata(wishes.m_EmbedsMetadata);
-    return Kernel::Consolidated<Renderer::FileExportOptions>(Kernel::Counted<Renderer::FileExportOptions const>(options));
+    return Kernel::Consolidated<Renderer::FileExportOptions>(
+        Kernel::Counted<Renderer::FileExportOptions const>(options));
 }
 
 /// One sentence for results that have no text of their own; empty for those that have.
@@ -37,19 +38,21 @@ std::string DescribeQuietResult(ExportResult result)
         return "Interrupted; the PDF was not written.";
     }
     if (ExportResultAborted == result) {
-        return "The export stopped half-way, so the PDF was not written: there may be no room left for its temporary file.";
+        return "The export stopped half-way, so the PDF was not written: there may be no room left for its temporary "
+               "file.";
     }
     return "The PDF could not be made.";
 }
 
 }
 
-bool ExportBook(BookSession & session, Listener & listener, std::filesystem::path const & target, PdfWishes const & wishes,
-                Import::MessageList & messages)
+bool ExportBook(BookSession & session, Listener & listener, std::filesystem::path const & target,
+                PdfWishes const & wishes, Import::MessageList & messages)
 {
     listener.Forget();
-    auto const command = Kernel::MakeCounted<Book::ExportBookCommand>(session.GetChapters(), String(target.string()), MakeOptions(wishes),
-                                                                      Kernel::SizeT<double>(), false, false, false, true, nullptr);
+    auto const command = Kernel::MakeCounted<Book::ExportBookCommand>(session.GetChapters(), String(target.string()),
+                                                                      MakeOptions(wishes), Kernel::SizeT<double>(),
+                                                                      false, false, false, true, nullptr);
     session.Run(command);
     VantraController::GetInstance().WaitUntilIdle();
     messages.Append(listener.TakeMessages());

@@ -21,7 +21,7 @@ struct PdfWishes
 
 /// Writes all chapters of a book into one PDF, page by page. False, with the reason in `messages`, if it failed or was
 /// interrupted; the target is then as it was before.
-bool ExportBook(BookSession & session, Listener & listener, std::filesystem::path const & target, PdfWishes const & wishes,
-                Import::MessageList & messages);
+bool ExportBook(BookSession & session, Listener & listener, std::filesystem::path const & target,
+                PdfWishes const & wishes, Import::MessageList & messages);
 
 }

@@ -33,17 +33,23 @@ bool BookFileLock::Take(std::filesystem::path const & book, std::string & proble
             ssize_t const length = read(file, owner, sizeof owner - 1);
             close(file);
             problem = "Another program is at work on this book" +
-                      (0 < length ? " (process " + std::string(owner, static_cast<std::size_t>(length)) + ")" : std::string()) +
+                      (0 < length ? " (process " + std::string(owner, static_cast<std::size_t>(length)) + ")"
+                                  : std::string()) +
                       "; wait until it has ended.";
             return false;
         }
         // The one before may have removed the file between our opening and locking it.
-        struct stat ours{};
-        struct stat there{};
+        struct stat ours
+        {
+        };
+        struct stat there
+        {
+        };
         if (0 == fstat(file, &ours) && 0 == stat(m_Path.c_str(), &there) && ours.st_ino == there.st_ino) {
             std::string const owner = std::to_string(getpid());
             m_File = file;
-            if (0 != ftruncate(file, 0) || static_cast<ssize_t>(owner.size()) != write(file, owner.data(), owner.size())) {
+            if (0 != ftruncate(file, 0) ||
+                static_cast<ssize_t>(owner.size()) != write(file, owner.data(), owner.size())) {
                 // A lock that can't name its owner still locks.
                 return true;
             }

@@ -142,8 +142,8 @@ void BookSession::ReportUnusable(Import::MessageList & messages) const
     for (ChapterPtr const & chapter : GetChapters()) {
         if (!chapter->IsValid()) {
             messages.Error("chapter-unusable", {chapter->GetPath().ToStd()},
-                           "The chapter \"" + chapter->GetName().ToStd() + "\" is missing from the output: " +
-                               chapter->GetStatusDescription().ToStd() + ".");
+                           "The chapter \"" + chapter->GetName().ToStd() +
+                               "\" is missing from the output: " + chapter->GetStatusDescription().ToStd() + ".");
         }
     }
 }
@@ -234,9 +234,11 @@ int BookSession::Update(Import::MessageList & messages)
         }
         if (g_MostPasses == pass) {
             std::string const name = std::filesystem::path(moved.second->m_Path).filename().string();
-            messages.Warn("unsettled", {}, "The chapter " + name + " still changes its number of pages (" +
-                                               std::to_string(moved.first->m_Pages) + ", then " + std::to_string(moved.second->m_Pages) + ") after " +
-                                               std::to_string(g_MostPasses) + " passes; page numbers behind it may be off.");
+            messages.Warn("unsettled", {},
+                          "The chapter " + name + " still changes its number of pages (" +
+                              std::to_string(moved.first->m_Pages) + ", then " + std::to_string(moved.second->m_Pages) +
+                              ") after " + std::to_string(g_MostPasses) +
+                              " passes; page numbers behind it may be off.");
             return pass;
         }
         before = std::move(after);

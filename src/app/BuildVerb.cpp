@@ -55,7 +55,8 @@ private:
             return false;
         }
         if (fs::path const parent = m_Target.parent_path(); !fs::is_directory(parent, error)) {
-            m_Messages.Error("output", {m_Target.string()}, "The folder " + parent.string() + " for the output does not exist.");
+            m_Messages.Error("output", {m_Target.string()},
+                             "The folder " + parent.string() + " for the output does not exist.");
             return false;
         }
         return true;
@@ -78,11 +79,13 @@ private:
     bool MakeWorkFolder()
     {
         std::error_code error;
-        m_Work = m_Options.m_Work.empty() ? m_Plan->m_Folder / ".korvane" : fs::absolute(m_Options.m_Work, error).lexically_normal();
+        m_Work = m_Options.m_Work.empty() ? m_Plan->m_Folder / ".korvane"
+                                          : fs::absolute(m_Options.m_Work, error).lexically_normal();
         m_Book = m_Work / g_BookName;
         fs::create_directories(m_Work, error);
         if (!fs::is_directory(m_Work, error)) {
-            m_Messages.Error("work-folder", {m_Work.string()}, "The work folder cannot be made; name another with --work.");
+            m_Messages.Error("work-folder", {m_Work.string()},
+                             "The work folder cannot be made; name another with --work.");
             return false;
         }
         return true;
@@ -91,7 +94,8 @@ private:
     /// Hash of what the PDF depends on beside its chapters.
     std::uint64_t OutputFacts() const
     {
-        std::string facts = m_Plan->m_Title + '\0' + m_Plan->m_Subtitle + '\0' + m_Plan->AuthorsAsText() + '\0' + m_Plan->m_Language;
+        std::string facts =
+            m_Plan->m_Title + '\0' + m_Plan->m_Subtitle + '\0' + m_Plan->AuthorsAsText() + '\0' + m_Plan->m_Language;
         for (auto const & chapter : m_Plan->m_Chapters) {
             facts += '\0' + chapter.m_Name + '\0' + chapter.m_Title + '\0' + chapter.m_Part + '\0' + chapter.m_Number;
         }
@@ -112,7 +116,8 @@ private:
             return false;
         }
         Import::Importer importer(*m_Plan, *m_Look, m_Work, Interruption::Flag());
-        if (!m_Options.m_IsForced && !m_Messages.HasErrors() && importer.IsEverythingCurrent(m_Messages) && IsOutputCurrent(importer.State())) {
+        if (!m_Options.m_IsForced && !m_Messages.HasErrors() && importer.IsEverythingCurrent(m_Messages) &&
+            IsOutputCurrent(importer.State())) {
             m_IsUpToDate = true;
             m_Pages = importer.State().m_Pages;
             return true;
@@ -123,7 +128,8 @@ private:
         if (!isImported || Interruption::IsRaised()) {
             return false;
         }
-        if (std::none_of(m_Chapters.begin(), m_Chapters.end(), [](auto const & chapter) { return !chapter.m_Name.empty(); })) {
+        if (std::none_of(m_Chapters.begin(), m_Chapters.end(),
+                         [](auto const & chapter) { return !chapter.m_Name.empty(); })) {
             return false;
         }
         return SetBook(importer);
@@ -131,8 +137,9 @@ private:
 
     bool IsOutputCurrent(Import::WorkState const & state) const
     {
-        return state.m_OutputFacts == OutputFacts() && state.m_OutputFile == m_Target.string() && state.m_OutputStamp.Exists() &&
-               state.m_OutputStamp == Import::FileStamp::Of(m_Target) && state.m_BookStamp == Import::FileStamp::Of(m_Book);
+        return state.m_OutputFacts == OutputFacts() && state.m_OutputFile == m_Target.string() &&
+               state.m_OutputStamp.Exists() && state.m_OutputStamp == Import::FileStamp::Of(m_Target) &&
+               state.m_BookStamp == Import::FileStamp::Of(m_Book);
     }
 
     bool SetBook(Import::Importer & importer)
@@ -168,7 +175,8 @@ private:
                 m_Messages.Warn(message.m_Kind, message.m_Place, message.m_Text + " The book is made anew.");
             }
             if (!fs::remove(m_Book, error)) {
-                m_Messages.Error("book-unreadable", {m_Book.string()}, "The damaged book cannot be removed: " + error.message() + ".");
+                m_Messages.Error("book-unreadable", {m_Book.string()},
+                                 "The damaged book cannot be removed: " + error.message() + ".");
                 return false;
             }
         }
@@ -220,7 +228,9 @@ private:
         }
         std::string problem;
         if (!state.Save(m_Work, problem)) {
-            m_Messages.Warn("work-folder", {m_Work.string()}, "The work folder's memory could not be written (" + problem + "); the next run takes longer.");
+            m_Messages.Warn("work-folder", {m_Work.string()},
+                            "The work folder's memory could not be written (" + problem +
+                                "); the next run takes longer.");
         }
     }
 
@@ -232,19 +242,30 @@ private:
             Json chapters = Json::array();
             for (Import::ImportedChapter const & chapter : m_Chapters) {
                 auto const & [start, count] = m_PageCounts[chapter.m_Document.string()];
-                chapters.push_back({{"source", chapter.m_Name}, {"title", chapter.m_Title}, {"document", chapter.m_Document.string()},
-                                    {"imported", chapter.m_IsFresh}, {"startPage", start}, {"pageCount", count}});
+                chapters.push_back({{"source", chapter.m_Name},
+                                    {"title", chapter.m_Title},
+                                    {"document", chapter.m_Document.string()},
+                                    {"imported", chapter.m_IsFresh},
+                                    {"startPage", start},
+                                    {"pageCount", count}});
             }
-            console.SayResult(Print({{"ok", isGood}, {"upToDate", m_IsUpToDate}, {"output", m_Target.string()}, {"book", m_Book.string()},
-                                     {"pages", m_Pages}, {"passes", m_Passes}, {"chapters", chapters}, {"messages", ToJson(m_Messages)}}));
+            console.SayResult(Print({{"ok", isGood},
+                                     {"upToDate", m_IsUpToDate},
+                                     {"output", m_Target.string()},
+                                     {"book", m_Book.string()},
+                                     {"pages", m_Pages},
+                                     {"passes", m_Passes},
+                                     {"chapters", chapters},
+                                     {"messages", ToJson(m_Messages)}}));
         }
         console.Tell(m_Messages);
         if (m_IsUpToDate) {
             console.Say(m_Target.string() + " is up to date (" + std::to_string(m_Pages) + " pages)");
         } else if (m_IsWritten) {
-            auto const fresh = std::count_if(m_Chapters.begin(), m_Chapters.end(), [](auto const & chapter) { return chapter.m_IsFresh; });
-            console.Say("Wrote " + m_Target.string() + ": " + std::to_string(m_Pages) + " pages, " + std::to_string(fresh) + " of " +
-                        std::to_string(m_Chapters.size()) + " documents made anew");
+            auto const fresh = std::count_if(m_Chapters.begin(), m_Chapters.end(),
+                                             [](auto const & chapter) { return chapter.m_IsFresh; });
+            console.Say("Wrote " + m_Target.string() + ": " + std::to_string(m_Pages) + " pages, " +
+                        std::to_string(fresh) + " of " + std::to_string(m_Chapters.size()) + " documents made anew");
         }
         return isGood ? ExitFine : ExitFailed;
     }

@@ -31,28 +31,34 @@ void AddAnswers(CLI::App & verb, StandingAnswers & answers)
         return [&choice, value](std::int64_t) { choice = value; };
     };
     using Choice = StandingAnswers::Choice;
-    verb.add_flag_function("--upgrade", set(answers.m_Upgrade, Choice::Yes), "Bring documents of an older version up to date");
-    verb.add_flag_function("--no-upgrade", set(answers.m_Upgrade, Choice::No), "Leave out documents of an older version");
+    verb.add_flag_function("--upgrade", set(answers.m_Upgrade, Choice::Yes),
+                           "Bring documents of an older version up to date");
+    verb.add_flag_function("--no-upgrade", set(answers.m_Upgrade, Choice::No),
+                           "Leave out documents of an older version");
     verb.add_flag_function("--locate", set(answers.m_Locate, Choice::Yes), "Look for chapters whose files are gone");
-    verb.add_flag_function("--no-locate", set(answers.m_Locate, Choice::No), "Go on without chapters whose files are gone");
+    verb.add_flag_function("--no-locate", set(answers.m_Locate, Choice::No),
+                           "Go on without chapters whose files are gone");
 }
 
 void AddFixedTime(CLI::App & verb, long long & time)
 {
-    verb.add_option("--fixed-time", time, "Seconds since 1970 that stand for now in the PDF, for files that are the same to the byte")
+    verb.add_option("--fixed-time", time,
+                    "Seconds since 1970 that stand for now in the PDF, for files that are the same to the byte")
         ->type_name("SECONDS")
         ->check(CLI::NonNegativeNumber);
 }
 
 }
 
-int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, std::ostream & err, bool isTerminal, AskUser ask)
+int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, std::ostream & err, bool isTerminal,
+               AskUser ask)
 {
     CLI::App app("Korvane sets folders of Markdown, and books of many documents, into print-ready PDF.", "korvane");
     app.set_version_flag("--version", g_Version);
     app.require_subcommand(1);
     app.get_formatter()->column_width(34);
-    app.footer("Example:\n  korvane build my-book -o my-book.pdf\n\nEvery verb has --help. Exit codes: 0 fine, 1 the work failed, 2 wrong use.");
+    app.footer("Example:\n  korvane build my-book -o my-book.pdf\n\nEvery verb has --help. Exit codes: 0 fine, 1 the "
+               "work failed, 2 wrong use.");
 
     CommonOptions common;
     StandingAnswers answers;
@@ -60,9 +66,13 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     BuildOptions build;
     CLI::App & buildVerb = *app.add_subcommand("build", "Set a folder of Markdown chapters into a PDF");
     buildVerb.add_option("FOLDER", build.m_Folder, "Folder with book.toml, SUMMARY.md or Markdown files")->required();
-    buildVerb.add_option("-o,--output", build.m_Output, "The PDF; by default FOLDER/NAME.pdf, or what the manifest says")->type_name("OUT.pdf");
-    buildVerb.add_option("--template", build.m_Template, "Template by name (novel, manual, report) or a .toml file")->type_name("NAME|FILE");
-    buildVerb.add_option("--work", build.m_Work, "Folder for the documents in between; by default FOLDER/.korvane")->type_name("DIR");
+    buildVerb
+        .add_option("-o,--output", build.m_Output, "The PDF; by default FOLDER/NAME.pdf, or what the manifest says")
+        ->type_name("OUT.pdf");
+    buildVerb.add_option("--template", build.m_Template, "Template by name (novel, manual, report) or a .toml file")
+        ->type_name("NAME|FILE");
+    buildVerb.add_option("--work", build.m_Work, "Folder for the documents in between; by default FOLDER/.korvane")
+        ->type_name("DIR");
     buildVerb.add_flag("--force", build.m_IsForced, "Make the PDF anew even if nothing has changed");
     AddFixedTime(buildVerb, build.m_FixedTime);
     AddCommon(buildVerb, common);
@@ -73,7 +83,10 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     ImportOptions import;
     CLI::App & importVerb = *app.add_subcommand("import", "Make chapter documents (.kvdoc) of Markdown");
     importVerb.add_option("SOURCE", import.m_Sources, "Markdown files, or one folder")->required();
-    importVerb.add_option("-o,--output", import.m_Output, "Folder for the documents; by default .korvane beside the first source")->type_name("DIR");
+    importVerb
+        .add_option("-o,--output", import.m_Output,
+                    "Folder for the documents; by default .korvane beside the first source")
+        ->type_name("DIR");
     importVerb.add_option("--template", import.m_Template, "Template by name or a .toml file")->type_name("NAME|FILE");
     AddCommon(importVerb, common);
     importVerb.footer("Example:\n  korvane import chapter1.md chapter2.md -o documents");

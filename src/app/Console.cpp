@@ -15,8 +15,10 @@ constexpr int g_BarWidth = 30;
 
 }
 
-Console::Console(std::ostream & out, std::ostream & err, ConsoleSettings settings) :
-    m_Out(out), m_Err(err), m_Settings(settings)
+Console::Console(std::ostream & out, std::ostream & err, ConsoleSettings settings)
+    : m_Out(out),
+      m_Err(err),
+      m_Settings(settings)
 {
 }
 
@@ -82,7 +84,9 @@ void Console::Tell(Import::MessageList const & messages)
     }
     for (Key const & key : order) {
         int const more = counts[key] - g_MessagesOfOneKind;
-        Tell({Import::Severity::Note, std::get<1>(key), {std::get<0>(key)},
+        Tell({Import::Severity::Note,
+              std::get<1>(key),
+              {std::get<0>(key)},
               std::to_string(more) + " more of this kind (" + std::get<1>(key) + "); --json lists them all."});
     }
 }

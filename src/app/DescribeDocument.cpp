@@ -88,16 +88,20 @@ Json DescribeParagraphs(Story::Story const & story, Json & notes)
         Json paragraph{{"style", atts ? atts->Get(Story::ParagraphAtt::Style).ToStd() : std::string()}, {"text", text}};
         if (atts && atts->GetListAtt()) {
             auto const item = atts->GetListAtt();
-            paragraph["list"] = {{"level", item->GetLevel()}, {"numbered", Story::ListAtt::Numbered == item->GetKind()}};
+            paragraph["list"] = {{"level", item->GetLevel()},
+                                 {"numbered", Story::ListAtt::Numbered == item->GetKind()}};
         }
         Json anchors = Json::array();
         Json pictures = Json::array();
-        for (std::size_t index = story.GetObjectIndex(begin); index < story.GetObjects().size() && story.GetObjects()[index].m_Offset < end; ++index) {
+        for (std::size_t index = story.GetObjectIndex(begin);
+             index < story.GetObjects().size() && story.GetObjects()[index].m_Offset < end; ++index) {
             Story::Glyph const * const glyph = story.GetObjects()[index].m_Glyph.Get();
             if (auto const * anchor = dynamic_cast<Story::AnchorGlyph const *>(glyph)) {
-                anchors.push_back({{"name", anchor->GetAnchorData()->GetName().ToStd()}, {"uid", anchor->GetAnchorData()->GetUid().ToStd()}});
+                anchors.push_back({{"name", anchor->GetAnchorData()->GetName().ToStd()},
+                                   {"uid", anchor->GetAnchorData()->GetUid().ToStd()}});
             } else if (auto const * picture = dynamic_cast<Story::PictureGlyph const *>(glyph)) {
-                pictures.push_back({{"path", picture->GetFields().m_Path.ToStd()}, {"missing", picture->GetFields().m_IsMissing}});
+                pictures.push_back(
+                    {{"path", picture->GetFields().m_Path.ToStd()}, {"missing", picture->GetFields().m_IsMissing}});
             } else if (auto const * note = dynamic_cast<Story::NoteReferenceGlyph const *>(glyph)) {
                 Json inner = Json::array();
                 notes.push_back({{"paragraphs", DescribeParagraphs(*note->GetNote(), inner)}});
@@ -131,7 +135,10 @@ Json DescribeStories(DocumentNode const & node)
     for (auto const & flow : node.GetTextFlows()) {
         Json notes = Json::array();
         Json paragraphs = DescribeParagraphs(*flow->GetStory(), notes);
-        list.push_back({{"main", flow->IsGrowing()}, {"frameCount", flow->GetFrames().size()}, {"paragraphs", paragraphs}, {"notes", notes}});
+        list.push_back({{"main", flow->IsGrowing()},
+                        {"frameCount", flow->GetFrames().size()},
+                        {"paragraphs", paragraphs},
+                        {"notes", notes}});
     }
     return list;
 }
@@ -143,11 +150,13 @@ Json DescribeStyles(DocumentNode const & node)
     if (auto const & sheet = node.GetStyleSheet()) {
         for (Story::TextStyle const & style : sheet->GetParagraphStyles()) {
             Story::ResolvedStyle const & resolved = sheet->ResolveParagraphStyle(style.m_Name);
-            paragraph.push_back({{"name", style.m_Name.ToStd()},
-                                 {"basedOn", style.m_BasedOn.ToStd()},
-                                 {"font", resolved.m_Glyph.m_Families.empty() ? std::string() : resolved.m_Glyph.m_Families.front().ToStd()},
-                                 {"size", resolved.m_Glyph.m_Size},
-                                 {"leading", resolved.m_Paragraph.m_Leading}});
+            paragraph.push_back(
+                {{"name", style.m_Name.ToStd()},
+                 {"basedOn", style.m_BasedOn.ToStd()},
+                 {"font",
+                  resolved.m_Glyph.m_Families.empty() ? std::string() : resolved.m_Glyph.m_Families.front().ToStd()},
+                 {"size", resolved.m_Glyph.m_Size},
+                 {"leading", resolved.m_Paragraph.m_Leading}});
         }
         for (Story::TextStyle const & style : sheet->GetCharacterStyles()) {
             character.push_back({{"name", style.m_Name.ToStd()}, {"basedOn", style.m_BasedOn.ToStd()}});

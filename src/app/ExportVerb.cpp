@@ -52,7 +52,8 @@ int RunExport(VerbContext & context, ExportOptions const & options)
             session.RefreshChapters();
             session.ReportUnusable(messages);
             if (session.GetChapters().empty()) {
-                messages.Error("book-empty", {options.m_Book}, "The book has no chapters, so there is nothing to write.");
+                messages.Error("book-empty", {options.m_Book},
+                               "The book has no chapters, so there is nothing to write.");
                 isGood = false;
             }
         }
@@ -81,7 +82,11 @@ int RunExport(VerbContext & context, ExportOptions const & options)
     Console & console = context.m_Console;
     console.EndProgress();
     if (console.Settings().m_IsJson) {
-        console.SayResult(Print({{"ok", isGood}, {"output", target.string()}, {"book", book.string()}, {"pages", pages}, {"messages", ToJson(messages)}}));
+        console.SayResult(Print({{"ok", isGood},
+                                 {"output", target.string()},
+                                 {"book", book.string()},
+                                 {"pages", pages},
+                                 {"messages", ToJson(messages)}}));
     }
     console.Tell(messages);
     if (isGood) {

@@ -40,18 +40,23 @@ int RunImport(VerbContext & context, ImportOptions const & options)
     Import::MessageList messages;
     std::error_code error;
     bool const isFolder = 1 == options.m_Sources.size() && fs::is_directory(options.m_Sources.front(), error);
-    auto const plan = isFolder ? Import::ReadBookPlan(options.m_Sources.front(), messages) : PlanFiles(options.m_Sources, messages);
+    auto const plan =
+        isFolder ? Import::ReadBookPlan(options.m_Sources.front(), messages) : PlanFiles(options.m_Sources, messages);
     std::optional<Import::Template> look;
     if (plan) {
-        std::string const name = !options.m_Template.empty() ? options.m_Template : plan->m_Template.empty() ? "novel" : plan->m_Template;
-        auto const path = Import::FindTemplate(name, options.m_Template.empty() ? plan->m_Folder : fs::current_path(), messages);
+        std::string const name = !options.m_Template.empty() ? options.m_Template
+                                 : plan->m_Template.empty()  ? "novel"
+                                                             : plan->m_Template;
+        auto const path =
+            Import::FindTemplate(name, options.m_Template.empty() ? plan->m_Folder : fs::current_path(), messages);
         look = path ? Import::ReadTemplate(*path, messages) : std::nullopt;
     }
 
     std::vector<Import::ImportedChapter> chapters;
     bool isGood = plan && look;
     if (isGood) {
-        fs::path const work = options.m_Output.empty() ? plan->m_Folder / ".korvane" : fs::absolute(options.m_Output, error).lexically_normal();
+        fs::path const work = options.m_Output.empty() ? plan->m_Folder / ".korvane"
+                                                       : fs::absolute(options.m_Output, error).lexically_normal();
         fs::create_directories(work, error);
         BookFileLock lock;
         std::string problem;
@@ -74,7 +79,10 @@ int RunImport(VerbContext & context, ImportOptions const & options)
     if (console.Settings().m_IsJson) {
         Json list = Json::array();
         for (Import::ImportedChapter const & chapter : chapters) {
-            list.push_back({{"source", chapter.m_Name}, {"title", chapter.m_Title}, {"document", chapter.m_Document.string()}, {"imported", chapter.m_IsFresh}});
+            list.push_back({{"source", chapter.m_Name},
+                            {"title", chapter.m_Title},
+                            {"document", chapter.m_Document.string()},
+                            {"imported", chapter.m_IsFresh}});
         }
         console.SayResult(Print({{"ok", isGood}, {"chapters", list}, {"messages", ToJson(messages)}}));
     }

@@ -24,7 +24,9 @@ void OnSignal(int signal)
 Interruption::Interruption()
 {
     g_IsRaised = false;
-    struct sigaction action{};
+    struct sigaction action
+    {
+    };
     action.sa_handler = &OnSignal;
     sigemptyset(&action.sa_mask);
     for (int const signal : {SIGINT, SIGTERM, SIGHUP}) {

@@ -27,8 +27,10 @@ bool IsYes(std::string const & answer)
 
 }
 
-Listener::Listener(Console & console, AskUser ask, StandingAnswers answers) :
-    m_Console(console), m_Ask(std::move(ask)), m_Answers(answers)
+Listener::Listener(Console & console, AskUser ask, StandingAnswers answers)
+    : m_Console(console),
+      m_Ask(std::move(ask)),
+      m_Answers(answers)
 {
     BroadcastNotification::RegisterBroadcastSink(this);
 }
@@ -95,9 +97,12 @@ void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
             Add(Severity::Error, "document-unreadable", failed->GetPath().ToStd(), failed->GetReason().ToStd());
         }
     } else if (auto const * broken = dynamic_cast<CommandFailedNotification const *>(heard)) {
-        Add(Severity::Error, "command-failed", "", broken->GetDescription().ToStd() + " failed: " + broken->GetReason().ToStd());
+        Add(Severity::Error, "command-failed", "",
+            broken->GetDescription().ToStd() + " failed: " + broken->GetReason().ToStd());
     } else if (auto const * lost = dynamic_cast<DocumentSaveFailedNotification const *>(heard)) {
-        std::string const kept = lost->GetKeptPath().Empty() ? std::string() : " Its content is kept in " + lost->GetKeptPath().ToStd() + ".";
+        std::string const kept = lost->GetKeptPath().Empty()
+                                     ? std::string()
+                                     : " Its content is kept in " + lost->GetKeptPath().ToStd() + ".";
         Add(Severity::Error, "document-unsaved", lost->GetPath().ToStd(), lost->GetReason().ToStd() + kept);
     } else if (auto const * permission = dynamic_cast<Book::PromptFixBookPermissionsNotification const *>(heard)) {
         AnswerPermission(*permission);
@@ -130,7 +135,9 @@ void Listener::AnswerPrompt(DocumentPromptNotification const & prompt)
     if (StandingAnswers::Choice::Ask == standing) {
         std::string answer;
         std::string const title = prompt.GetTitle().Empty() ? std::string() : prompt.GetTitle().ToStd() + ": ";
-        isYes = Ask(title + prompt.GetMessage().ToStd() + " [y/N]", isMissing ? "--locate or --no-locate" : "--upgrade or --no-upgrade", answer) && IsYes(answer);
+        isYes = Ask(title + prompt.GetMessage().ToStd() + " [y/N]",
+                    isMissing ? "--locate or --no-locate" : "--upgrade or --no-upgrade", answer) &&
+                IsYes(answer);
     }
     auto const choices = static_cast<unsigned>(prompt.GetChoices());
     auto const pick = [choices](DocumentPromptChoice first, DocumentPromptChoice second) {

@@ -41,8 +41,8 @@ struct StandingAnswers
     Choice m_Locate = Choice::Ask;
 };
 
-/// The program's ear: hears every notification of the process, shows progress, keeps what went wrong, answers questions,
-/// and takes closed books out of the collection.
+/// The program's ear: hears every notification of the process, shows progress, keeps what went wrong, answers
+/// questions, and takes closed books out of the collection.
 class Listener : public BroadcastNotificationSink
 {
 public:

@@ -7,8 +7,8 @@
 namespace App
 {
 
-/// Gives chapters the names that people know them by, in place of those of their files. Chapters that are not named here
-/// keep theirs.
+/// Gives chapters the names that people know them by, in place of those of their files. Chapters that are not named
+/// here keep theirs.
 class NameChaptersCommand : public Book::BookCommand
 {
 public:

@@ -59,7 +59,10 @@ Json DescribeBook(BookSession const & session, fs::path const & path)
             {"padStrays", book->IsPadStrays()},
             {"mergeStrays", book->IsMergeStrays()},
             {"synchronise",
-             {{"swatches", settings.m_Swatches}, {"textStyles", settings.m_TextStyles}, {"tableStyles", settings.m_TableStyles}, {"masterPages", settings.m_MasterPages}}},
+             {{"swatches", settings.m_Swatches},
+              {"textStyles", settings.m_TextStyles},
+              {"tableStyles", settings.m_TableStyles},
+              {"masterPages", settings.m_MasterPages}}},
             {"chapters", chapters}};
 }
 
@@ -68,25 +71,32 @@ std::vector<std::string> Summarise(Json const & json)
 {
     std::vector<std::string> lines;
     if ("book" == json.at("kind")) {
-        lines.push_back("Book " + json.at("name").get<std::string>() + ", " + std::to_string(json.at("chapters").size()) + " chapters");
+        lines.push_back("Book " + json.at("name").get<std::string>() + ", " +
+                        std::to_string(json.at("chapters").size()) + " chapters");
         for (Json const & chapter : json.at("chapters")) {
-            lines.push_back("  " + std::to_string(chapter.at("index").get<int>() + 1) + "  " + chapter.at("name").get<std::string>() +
+            lines.push_back("  " + std::to_string(chapter.at("index").get<int>() + 1) + "  " +
+                            chapter.at("name").get<std::string>() +
                             (chapter.at("key").get<bool>() ? " (style source)" : ""));
         }
         return lines;
     }
     Json const & metadata = json.at("metadata");
-    lines.push_back("Document \"" + metadata.at("title").get<std::string>() + "\", language " + metadata.at("language").get<std::string>());
-    lines.push_back("  " + std::to_string(json.at("pageCount").get<int>()) + " pages on " + std::to_string(json.at("spreads").size()) + " spreads, " +
-                    std::to_string(json.at("sections").size()) + " sections, " + std::to_string(json.at("styles").at("paragraph").size()) + " paragraph styles");
+    lines.push_back("Document \"" + metadata.at("title").get<std::string>() + "\", language " +
+                    metadata.at("language").get<std::string>());
+    lines.push_back("  " + std::to_string(json.at("pageCount").get<int>()) + " pages on " +
+                    std::to_string(json.at("spreads").size()) + " spreads, " +
+                    std::to_string(json.at("sections").size()) + " sections, " +
+                    std::to_string(json.at("styles").at("paragraph").size()) + " paragraph styles");
     for (Json const & section : json.at("sections")) {
-        lines.push_back("  section at page index " + std::to_string(section.at("startPageIndex").get<int>()) + ", number " +
-                        std::to_string(section.at("startNumber").get<int>()) + (section.at("restart").get<bool>() ? ", restarts" : "") +
+        lines.push_back("  section at page index " + std::to_string(section.at("startPageIndex").get<int>()) +
+                        ", number " + std::to_string(section.at("startNumber").get<int>()) +
+                        (section.at("restart").get<bool>() ? ", restarts" : "") +
                         (section.at("included").get<bool>() ? "" : ", left out of output"));
     }
     for (Json const & story : json.at("stories")) {
         lines.push_back("  story of " + std::to_string(story.at("paragraphs").size()) + " paragraphs in " +
-                        std::to_string(story.at("frameCount").get<int>()) + " frames, " + std::to_string(story.at("notes").size()) + " notes");
+                        std::to_string(story.at("frameCount").get<int>()) + " frames, " +
+                        std::to_string(story.at("notes").size()) + " notes");
     }
     return lines;
 }
@@ -126,7 +136,8 @@ int RunShow(VerbContext & context, std::string const & file)
             json = DescribeDocument(*document);
             json["path"] = path.string();
         } else {
-            std::string const place = failure.GetPlace().Empty() ? std::string() : " (" + failure.GetPlace().ToStd() + ")";
+            std::string const place =
+                failure.GetPlace().Empty() ? std::string() : " (" + failure.GetPlace().ToStd() + ")";
             messages.Error("document-unreadable", {file}, failure.GetReason().ToStd() + place);
         }
         break;

@@ -74,9 +74,10 @@ int RunStatus(VerbContext & context, std::string const & file)
                                     {"startFromPage", chapter->GetStartFromPage()},
                                     {"cachedStartPage", chapter->GetCachedStartPage()},
                                     {"preflight", chapter->GetPreflightDescription().ToStd()}});
-                lines.push_back(Padded(std::to_string(index + 1), 4) + Padded(chapter->GetName().ToStd(), 40) + "  " +
-                                Padded(chapter->DescribePages().ToStd(), 14) + Padded(chapter->GetStatusDescription().ToStd(), 12) +
-                                chapter->GetPreflightDescription().ToStd() + (chapter->IsKey() ? " (style source)" : ""));
+                lines.push_back(
+                    Padded(std::to_string(index + 1), 4) + Padded(chapter->GetName().ToStd(), 40) + "  " +
+                    Padded(chapter->DescribePages().ToStd(), 14) + Padded(chapter->GetStatusDescription().ToStd(), 12) +
+                    chapter->GetPreflightDescription().ToStd() + (chapter->IsKey() ? " (style source)" : ""));
                 ++index;
             }
         }
@@ -85,8 +86,12 @@ int RunStatus(VerbContext & context, std::string const & file)
     isGood = isGood && !messages.HasErrors();
     console.EndProgress();
     if (console.Settings().m_IsJson) {
-        console.SayResult(Print({{"ok", isGood}, {"book", path.string()}, {"name", path.stem().string()}, {"pageCount", pages},
-                                 {"chapters", chapters}, {"messages", ToJson(messages)}}));
+        console.SayResult(Print({{"ok", isGood},
+                                 {"book", path.string()},
+                                 {"name", path.stem().string()},
+                                 {"pageCount", pages},
+                                 {"chapters", chapters},
+                                 {"messages", ToJson(messages)}}));
     }
     console.Tell(messages);
     for (std::string const & line : lines) {

@@ -66,8 +66,9 @@ int RunStatus(VerbContext & context, std::string const & book);
 /// Tells what is in a book or document file.
 int RunShow(VerbContext & context, std::string const & file);
 
-/// The whole program: reads the arguments (without the program's name), runs the verb, and gives the exit code. `ask` is
-/// null where nobody can be asked.
-int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, std::ostream & err, bool isTerminal, AskUser ask);
+/// The whole program: reads the arguments (without the program's name), runs the verb, and gives the exit code. `ask`
+/// is null where nobody can be asked.
+int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, std::ostream & err, bool isTerminal,
+               AskUser ask);
 
 }

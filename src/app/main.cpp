@@ -20,5 +20,6 @@ int main(int argc, char ** argv)
     std::setlocale(LC_MESSAGES, "");
     bool const canAsk = isatty(STDIN_FILENO) && isatty(STDERR_FILENO);
     std::vector<std::string> const arguments(argv + 1, argv + argc);
-    return App::RunProgram(arguments, std::cout, std::cerr, isatty(STDERR_FILENO), canAsk ? App::AskUser(&AskOnTerminal) : nullptr);
+    return App::RunProgram(arguments, std::cout, std::cerr, isatty(STDERR_FILENO),
+                           canAsk ? App::AskUser(&AskOnTerminal) : nullptr);
 }

@@ -133,10 +133,10 @@ bool ReadWidth(std::string_view text, double & share, double & points)
         share = number / 100;
         return share <= 10;
     }
-    double const factor = "mm" == unit ? 72 / 25.4
-                          : "cm" == unit ? 72 / 2.54
-                          : "in" == unit ? 72
-                          : "pt" == unit ? 1
+    double const factor = "mm" == unit                   ? 72 / 25.4
+                          : "cm" == unit                 ? 72 / 2.54
+                          : "in" == unit                 ? 72
+                          : "pt" == unit                 ? 1
                           : "px" == unit || unit.empty() ? 0.75
                                                          : 0;
     points = number * factor;

@@ -34,7 +34,8 @@ void AddFilesOfFolder(BookPlan & plan, MessageList & messages)
     if (error) {
         messages.Error("unreadable", {plan.m_Folder.string()}, "The folder cannot be read: " + error.message() + ".");
     }
-    std::sort(names.begin(), names.end(), [](std::string const & a, std::string const & b) { return ComesBefore(a, b); });
+    std::sort(names.begin(), names.end(),
+              [](std::string const & a, std::string const & b) { return ComesBefore(a, b); });
     for (std::string const & name : names) {
         AddChapter(plan, name, {name}, messages);
     }
@@ -67,14 +68,15 @@ bool AddChapter(BookPlan & plan, std::string const & name, Place const & place, 
                                     [&](PlannedChapter const & chapter) { return chapter.m_Path == path; });
     if (known != plan.m_Chapters.end()) {
         std::string where = known->m_Place.m_Line ? " (line " + std::to_string(known->m_Place.m_Line) + ")" : "";
-        messages.Warn("chapter-twice", place, "The chapter " + shown + " is listed twice" + where +
-                                                  "; it is set once, in the first place.");
+        messages.Warn("chapter-twice", place,
+                      "The chapter " + shown + " is listed twice" + where + "; it is set once, in the first place.");
         return false;
     }
     std::error_code error;
     if (!fs::exists(path, error)) {
-        messages.Error("chapter-missing", place, "The chapter " + shown + " is listed but there is no such file" +
-                                                     (error ? ": " + error.message() : std::string()) + ".");
+        messages.Error("chapter-missing", place,
+                       "The chapter " + shown + " is listed but there is no such file" +
+                           (error ? ": " + error.message() : std::string()) + ".");
         return false;
     }
     plan.m_Chapters.push_back({path, shown.empty() ? name : shown, "", "", "", place});
@@ -88,8 +90,9 @@ std::optional<BookPlan> ReadBookPlan(fs::path const & folder, MessageList & mess
     plan.m_Folder = fs::absolute(folder, error).lexically_normal();
     if (!fs::is_directory(plan.m_Folder, error)) {
         messages.Error("no-folder", {folder.string()},
-                       fs::exists(plan.m_Folder, error) ? "This is not a folder; give the folder that holds the chapters."
-                                                        : "There is no such folder.");
+                       fs::exists(plan.m_Folder, error)
+                           ? "This is not a folder; give the folder that holds the chapters."
+                           : "There is no such folder.");
         return std::nullopt;
     }
 

@@ -30,7 +30,8 @@ std::string_view NoteLabel(std::string_view line)
         return {};
     }
     std::size_t const end = line.find("]:", start);
-    std::string_view const label = std::string_view::npos == end ? line.substr(0, 0) : line.substr(start + 2, end - start - 2);
+    std::string_view const label =
+        std::string_view::npos == end ? line.substr(0, 0) : line.substr(start + 2, end - start - 2);
     return std::string_view::npos == label.find_first_of(" \t[]") ? label : std::string_view();
 }
 
@@ -41,8 +42,11 @@ std::string ListTextOf(std::string_view info)
 
 }
 
-ChapterReader::ChapterReader(std::string_view text, ReadOptions const & options, MessageList & messages) :
-    m_Source(text), m_Options(options), m_Messages(messages), m_Smart("en")
+ChapterReader::ChapterReader(std::string_view text, ReadOptions const & options, MessageList & messages)
+    : m_Source(text),
+      m_Options(options),
+      m_Messages(messages),
+      m_Smart("en")
 {
     m_Chapter.m_FrontMatter = ReadFrontMatter(text, options.m_ShownName, messages);
     m_LineOffset = m_Chapter.m_FrontMatter.m_Lines;
@@ -188,8 +192,9 @@ void ChapterReader::EmitText(BlockKind kind, int level, int line)
 {
     FinishInline();
     InlineText text = Builder().Finish();
-    bool const onlyAnchors = text.m_Text.empty() && std::all_of(text.m_Objects.begin(), text.m_Objects.end(),
-                                                                [](InlineObject const & o) { return ObjectKind::Anchor == o.m_Kind; });
+    bool const onlyAnchors =
+        text.m_Text.empty() && std::all_of(text.m_Objects.begin(), text.m_Objects.end(),
+                                           [](InlineObject const & o) { return ObjectKind::Anchor == o.m_Kind; });
     if (onlyAnchors && BlockKind::Heading != kind) {
         for (InlineObject const & object : text.m_Objects) {
             m_PendingAnchors.push_back(object.m_Index);
@@ -277,13 +282,16 @@ bool ChapterReader::ReadFence(int line)
             static std::map<std::string, std::string, std::less<>> const later{
                 {"toc", "Table of contents"}, {"index", "Index"}, {"endnotes", "Collated notes"}};
             if (auto const known = later.find(name); known != later.end()) {
-                Warn("later-block", place, "A \"" + name + "\" block cannot be generated yet; a marked box stands in its place.");
+                Warn("later-block", place,
+                     "A \"" + name + "\" block cannot be generated yet; a marked box stands in its place.");
                 boxes.push_back(known->second);
             } else if (!content.empty()) {
-                Warn("class-unknown", place, "The block \"" + content + "\" has no look of its own; its content is set as it stands.");
+                Warn("class-unknown", place,
+                     "The block \"" + content + "\" has no look of its own; its content is set as it stands.");
             }
             edits.push_back({static_cast<std::uint32_t>(start),
-                             static_cast<std::uint32_t>(std::min(end + 1, text.size()) - start), {}});
+                             static_cast<std::uint32_t>(std::min(end + 1, text.size()) - start),
+                             {}});
         }
         start = end + 1;
     }
@@ -420,10 +428,12 @@ void ChapterReader::ReportUnusedNotes()
         }
         auto const [known, isNew] = defined.emplace(label, line + m_LineOffset);
         if (!isNew) {
-            Warn("note-twice", line, "The note [^" + std::string(label) + "] is defined again (first in line " +
-                                         std::to_string(known->second) + "); the first one is set.");
+            Warn("note-twice", line,
+                 "The note [^" + std::string(label) + "] is defined again (first in line " +
+                     std::to_string(known->second) + "); the first one is set.");
         } else if (!m_NoteLines.contains(line)) {
-            Warn("note-unused", line, "The note [^" + std::string(label) + "] has no mark in the text and is left out.");
+            Warn("note-unused", line,
+                 "The note [^" + std::string(label) + "] has no mark in the text and is left out.");
         }
     }
 }

@@ -19,22 +19,22 @@ struct TagMark
 
 /// Tags that only change the look of their text.
 constexpr std::array g_TagMarks{
-    TagMark{"em", Mark::Emphasis},    TagMark{"i", Mark::Emphasis},     TagMark{"cite", Mark::Emphasis},
-    TagMark{"var", Mark::Emphasis},   TagMark{"dfn", Mark::Emphasis},   TagMark{"strong", Mark::Strong},
-    TagMark{"b", Mark::Strong},       TagMark{"u", Mark::Underline},    TagMark{"ins", Mark::Underline},
-    TagMark{"s", Mark::Strike},       TagMark{"strike", Mark::Strike},  TagMark{"del", Mark::Strike},
-    TagMark{"sub", Mark::Subscript},  TagMark{"sup", Mark::Superscript}, TagMark{"code", Mark::Code},
-    TagMark{"tt", Mark::Code},        TagMark{"samp", Mark::Code},      TagMark{"kbd", Mark::Keyboard},
-    TagMark{"small", Mark::Small},    TagMark{"mark", Mark::Highlight},
+    TagMark{"em", Mark::Emphasis},   TagMark{"i", Mark::Emphasis},      TagMark{"cite", Mark::Emphasis},
+    TagMark{"var", Mark::Emphasis},  TagMark{"dfn", Mark::Emphasis},    TagMark{"strong", Mark::Strong},
+    TagMark{"b", Mark::Strong},      TagMark{"u", Mark::Underline},     TagMark{"ins", Mark::Underline},
+    TagMark{"s", Mark::Strike},      TagMark{"strike", Mark::Strike},   TagMark{"del", Mark::Strike},
+    TagMark{"sub", Mark::Subscript}, TagMark{"sup", Mark::Superscript}, TagMark{"code", Mark::Code},
+    TagMark{"tt", Mark::Code},       TagMark{"samp", Mark::Code},       TagMark{"kbd", Mark::Keyboard},
+    TagMark{"small", Mark::Small},   TagMark{"mark", Mark::Highlight},
 };
 
 /// Tags that part paragraphs and mean nothing more in print.
-constexpr std::array<std::string_view, 15> g_ParagraphTags{"p",      "div",     "section", "article", "aside",
-                                                           "header", "footer",  "main",    "nav",     "center",
+constexpr std::array<std::string_view, 15> g_ParagraphTags{"p",      "div",     "section", "article",    "aside",
+                                                           "header", "footer",  "main",    "nav",        "center",
                                                            "figure", "details", "address", "blockquote", "picture"};
 
 /// Tags whose structure is lost when their text is set as paragraphs.
-constexpr std::array<std::string_view, 11> g_StructureTags{"ul", "ol", "li", "dl", "dt", "dd",
+constexpr std::array<std::string_view, 11> g_StructureTags{"ul",    "ol", "li", "dl", "dt",     "dd",
                                                            "table", "tr", "td", "th", "caption"};
 
 template <typename TList>
@@ -45,7 +45,8 @@ bool Contains(TList const & list, std::string_view name)
 
 Mark MarkOfTag(std::string_view name)
 {
-    auto const found = std::find_if(g_TagMarks.begin(), g_TagMarks.end(), [name](TagMark const & t) { return t.m_Name == name; });
+    auto const found =
+        std::find_if(g_TagMarks.begin(), g_TagMarks.end(), [name](TagMark const & t) { return t.m_Name == name; });
     return found == g_TagMarks.end() ? Mark::None : found->m_Mark;
 }
 
@@ -114,8 +115,10 @@ void ChapterReader::ReadTag(HtmlToken const & token, int line)
             } else if (Mark const mark = MarkOfClass(classes); Mark::None != mark) {
                 tag.m_Marks = mark;
             }
-        } else if (Mark::None == tag.m_Marks && "a" != token.m_Name && "abbr" != token.m_Name && "time" != token.m_Name) {
-            Warn("html-unknown", line, "The tag <" + token.m_Name + "> has no meaning in print; its text is set as it stands.");
+        } else if (Mark::None == tag.m_Marks && "a" != token.m_Name && "abbr" != token.m_Name &&
+                   "time" != token.m_Name) {
+            Warn("html-unknown", line,
+                 "The tag <" + token.m_Name + "> has no meaning in print; its text is set as it stands.");
         }
         EnterMark(tag.m_Marks, true);
         m_Tags.push_back(std::move(tag));
@@ -124,7 +127,8 @@ void ChapterReader::ReadTag(HtmlToken const & token, int line)
 
 void ChapterReader::CloseTag(std::string const & name)
 {
-    auto const open = std::find_if(m_Tags.rbegin(), m_Tags.rend(), [&](OpenTag const & tag) { return tag.m_Name == name; });
+    auto const open =
+        std::find_if(m_Tags.rbegin(), m_Tags.rend(), [&](OpenTag const & tag) { return tag.m_Name == name; });
     if (open == m_Tags.rend()) {
         return;
     }
@@ -143,7 +147,8 @@ void ChapterReader::CloseAllTags()
     while (!m_Tags.empty()) {
         OpenTag const & tag = m_Tags.back();
         if (Mark::None != tag.m_Marks || tag.m_IsLink) {
-            Warn("html-open", tag.m_Line, "The tag <" + tag.m_Name + "> is not closed in its paragraph; it ends there.");
+            Warn("html-open", tag.m_Line,
+                 "The tag <" + tag.m_Name + "> is not closed in its paragraph; it ends there.");
         }
         CloseTag(std::string(tag.m_Name));
     }
@@ -163,7 +168,8 @@ void ChapterReader::ReadImageTag(HtmlToken const & token, int line)
     picture.m_Line = line + m_LineOffset;
     std::string const & width = token.Value("width");
     if (!width.empty() && !ReadWidth(width, picture.m_WidthShare, picture.m_Width)) {
-        Warn("picture-width", line, "The width \"" + width + "\" is not a length or a percentage; the picture keeps its size.");
+        Warn("picture-width", line,
+             "The width \"" + width + "\" is not a length or a percentage; the picture keeps its size.");
     }
     m_Chapter.m_Pictures.push_back(std::move(picture));
     m_PictureCaptions.emplace_back();
@@ -273,7 +279,8 @@ bool ChapterReader::ReadBlockTag(HtmlToken const & token, int line)
             AddAnchorAt(0, token.Value("id"), line);
         }
         if (isStructure && ("table" == name || "ul" == name || "ol" == name || "dl" == name)) {
-            Warn("html-structure", line, "A raw <" + name + "> is set as plain paragraphs; write it in Markdown to keep its form.");
+            Warn("html-structure", line,
+                 "A raw <" + name + "> is set as plain paragraphs; write it in Markdown to keep its form.");
         }
     }
     return true;
@@ -293,7 +300,8 @@ void ChapterReader::ReadHtmlBlock(cmark_node * node)
             bool const isOpen = HtmlToken::Kind::OpenTag == token.m_Kind && !token.m_IsSelfClosing;
             skipped = isOpen ? std::string_view(token.m_Name) : std::string_view();
             if (isOpen) {
-                Warn("html-unknown", line, "A <" + token.m_Name + "> has no meaning in print and is left out with its content.");
+                Warn("html-unknown", line,
+                     "A <" + token.m_Name + "> has no meaning in print and is left out with its content.");
             }
         } else if (!skipped.empty() || HtmlToken::Kind::Comment == token.m_Kind) {
             continue;

@@ -162,8 +162,9 @@ void ChapterReader::EnterLink(cmark_node * node, bool isEnter)
     if (0 <= index && start == Builder().Position()) {
         Link & link = m_Chapter.m_Links[static_cast<std::size_t>(index)];
         link.m_IsEmpty = true;
-        m_Messages.Warn("later-reference", {m_Options.m_ShownName, link.m_Line},
-                        "A reference without a text of its own cannot be filled in yet; its target is set in its place.");
+        m_Messages.Warn(
+            "later-reference", {m_Options.m_ShownName, link.m_Line},
+            "A reference without a text of its own cannot be filled in yet; its target is set in its place.");
         Builder().Append(ToUtf16(link.m_Target), true);
     }
     m_Spots.push_back({start, Builder().Position(), index, -1});
@@ -218,7 +219,8 @@ void ChapterReader::ReadNoteReference(cmark_node * node)
 void ChapterReader::AddAnchorAt(std::uint32_t position, std::string const & id, int line)
 {
     if (!m_Slugs.Take(id)) {
-        Warn("anchor-twice", line, "The anchor #" + id + " exists already in this chapter; links lead to the first one.");
+        Warn("anchor-twice", line,
+             "The anchor #" + id + " exists already in this chapter; links lead to the first one.");
         return;
     }
     m_Chapter.m_Anchors.push_back({id, line + m_LineOffset});
@@ -239,7 +241,9 @@ Attributes ChapterReader::TakeHeadingAttributes()
         return {};
     }
     std::size_t const from = text.find_last_not_of(u' ', 0 < start ? start - 1 : 0) + 1;
-    Builder().Apply({{static_cast<std::uint32_t>(std::min(from, start)), static_cast<std::uint32_t>(end - std::min(from, start)), {}}});
+    Builder().Apply({{static_cast<std::uint32_t>(std::min(from, start)),
+                      static_cast<std::uint32_t>(end - std::min(from, start)),
+                      {}}});
     return std::move(*attributes);
 }
 
@@ -247,7 +251,8 @@ void ChapterReader::ApplyToLink(AttributeSpot const & spot, Attributes const & a
 {
     for (std::string_view const name : g_ReferenceClasses) {
         if (attributes.HasClass(name)) {
-            Warn("later-reference", line, "References by ." + std::string(name) + " cannot be filled in yet; the link's own text is set.");
+            Warn("later-reference", line,
+                 "References by ." + std::string(name) + " cannot be filled in yet; the link's own text is set.");
         }
     }
     Attributes rest = attributes;
@@ -262,7 +267,8 @@ void ChapterReader::ApplyToPicture(std::uint32_t index, Attributes const & attri
     Picture & picture = m_Chapter.m_Pictures[index];
     for (auto const & [key, value] : attributes.m_Values) {
         if ("width" == key && !ReadWidth(value, picture.m_WidthShare, picture.m_Width)) {
-            Warn("picture-width", line, "The width \"" + value + "\" is not a length or a percentage; the picture keeps its size.");
+            Warn("picture-width", line,
+                 "The width \"" + value + "\" is not a length or a percentage; the picture keeps its size.");
         }
     }
 }
@@ -299,7 +305,8 @@ void ChapterReader::ApplyToSpan(std::uint32_t start, std::uint32_t end, Attribut
         } else if (std::find(g_NoteClasses.begin(), g_NoteClasses.end(), name) != g_NoteClasses.end()) {
             Warn("later-notes", line, "Notes are set at the end of the chapter; ." + name + " has no effect yet.");
         } else {
-            Warn("class-unknown", line, "The class ." + name + " has no look of its own; the text is set as it stands.");
+            Warn("class-unknown", line,
+                 "The class ." + name + " has no look of its own; the text is set as it stands.");
         }
     }
 }
@@ -338,7 +345,8 @@ void ChapterReader::ReadBracketedSpans()
         }
         from = close + 1;
         std::size_t length = 0;
-        auto const attributes = Builder().IsVerbatim(close) ? std::nullopt : ReadAttributes(text.substr(close + 1), length);
+        auto const attributes =
+            Builder().IsVerbatim(close) ? std::nullopt : ReadAttributes(text.substr(close + 1), length);
         if (!attributes) {
             continue;
         }
@@ -368,7 +376,8 @@ void ChapterReader::ReportDirectives(std::string_view text, int line)
         std::string_view const directive = text.substr(at, text.find("}}", at) - at + 2);
         auto const lines = std::count(text.begin(), text.begin() + static_cast<std::ptrdiff_t>(at), '\n');
         Warn("directive", line + static_cast<int>(lines),
-             "The directive " + std::string(directive.substr(0, directive.find('\n'))) + " is not carried out; it is set as written.");
+             "The directive " + std::string(directive.substr(0, directive.find('\n'))) +
+                 " is not carried out; it is set as written.");
     }
 }
 

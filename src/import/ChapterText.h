@@ -26,9 +26,18 @@ enum class Mark : std::uint16_t
     Highlight = 1024
 };
 
-constexpr Mark operator|(Mark a, Mark b) { return static_cast<Mark>(static_cast<int>(a) | static_cast<int>(b)); }
-constexpr Mark operator-(Mark a, Mark b) { return static_cast<Mark>(static_cast<int>(a) & ~static_cast<int>(b)); }
-constexpr bool Has(Mark marks, Mark mark) { return 0 != (static_cast<int>(marks) & static_cast<int>(mark)); }
+constexpr Mark operator|(Mark a, Mark b)
+{
+    return static_cast<Mark>(static_cast<int>(a) | static_cast<int>(b));
+}
+constexpr Mark operator-(Mark a, Mark b)
+{
+    return static_cast<Mark>(static_cast<int>(a) & ~static_cast<int>(b));
+}
+constexpr bool Has(Mark marks, Mark mark)
+{
+    return 0 != (static_cast<int>(marks) & static_cast<int>(mark));
+}
 
 /// Attributes in pandoc's notation: `{#id .class key=value}`.
 struct Attributes

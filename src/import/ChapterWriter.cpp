@@ -22,7 +22,8 @@ namespace
 
 /// The document of the work folder, to be filled anew. One that is there keeps its identity; one that can't be used is
 /// replaced, with a warning.
-Kernel::Counted<DocumentController> OpenOrMake(fs::path const & path, std::string const & shownName, MessageList & messages)
+Kernel::Counted<DocumentController> OpenOrMake(fs::path const & path, std::string const & shownName,
+                                               MessageList & messages)
 {
     auto document = Kernel::MakeCounted<DocumentController>();
     std::error_code error;
@@ -34,17 +35,19 @@ Kernel::Counted<DocumentController> OpenOrMake(fs::path const & path, std::strin
         return document;
     }
     if (2 <= failure.GetResult() && failure.GetResult() <= 10) {
-        messages.Error("document-locked", {shownName}, "The document " + path.filename().string() + " of the work folder cannot be changed: " +
-                                                           failure.GetReason().ToStd());
+        messages.Error("document-locked", {shownName},
+                       "The document " + path.filename().string() +
+                           " of the work folder cannot be changed: " + failure.GetReason().ToStd());
         return nullptr;
     }
-    messages.Warn("document-damaged", {shownName}, "The document " + path.filename().string() + " of the work folder could not be used and is made anew: " +
-                                                       failure.GetReason().ToStd());
+    messages.Warn("document-damaged", {shownName},
+                  "The document " + path.filename().string() +
+                      " of the work folder could not be used and is made anew: " + failure.GetReason().ToStd());
     return Kernel::MakeCounted<DocumentController>();
 }
 
-DocumentSettings SettingsFor(BookPlan const & plan, Template const & look, std::string const & title, std::string const & author,
-                             std::string const & language)
+DocumentSettings SettingsFor(BookPlan const & plan, Template const & look, std::string const & title,
+                             std::string const & author, std::string const & language)
 {
     DocumentSettings settings = look.m_Settings;
     settings.m_PublicationTitle = String(plan.m_Title);
@@ -92,7 +95,8 @@ void FillIndex(Story::Index & index, std::vector<IndexMark> const & marks)
     }
 }
 
-bool SaveDocument(DocumentController & document, fs::path const & path, std::string const & shownName, MessageList & messages)
+bool SaveDocument(DocumentController & document, fs::path const & path, std::string const & shownName,
+                  MessageList & messages)
 {
     DocumentSaveResult result;
     document.SaveDocument(result, String(path.string()));
@@ -125,7 +129,8 @@ bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
     if (!document) {
         return false;
     }
-    PictureLoader pictures(planned.m_Path, planned.m_Name, document->GetPictures(), job.m_Known.m_Pictures, job.m_Messages);
+    PictureLoader pictures(planned.m_Path, planned.m_Name, document->GetPictures(), job.m_Known.m_Pictures,
+                           job.m_Messages);
     StoryContext const context{planned.m_Name, m_Names, planned.m_Part, planned.m_Number,
                                [&](Picture const & picture) { return pictures.Load(picture); }};
     auto const story = StoryWriter(chapter, m_Look, context).Write();
@@ -134,7 +139,8 @@ bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
     for (std::string const & name : chapter.m_FrontMatter.m_Authors) {
         author += (author.empty() ? "" : ", ") + name;
     }
-    document->ReplaceContent(SettingsFor(m_Plan, m_Look, job.m_Known.m_Title, author.empty() ? m_Plan.AuthorsAsText() : author,
+    document->ReplaceContent(SettingsFor(m_Plan, m_Look, job.m_Known.m_Title,
+                                         author.empty() ? m_Plan.AuthorsAsText() : author,
                                          chapter.m_FrontMatter.m_Language),
                              story);
     FillIndex(*document->GetDocument()->GetIndex(), chapter.m_IndexMarks);
@@ -145,7 +151,8 @@ bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
 
 std::uint64_t Importer::FactsOfTitlePage() const
 {
-    std::string const facts = m_Plan.m_Title + '\0' + m_Plan.m_Subtitle + '\0' + m_Plan.AuthorsAsText() + '\0' + m_Plan.m_Language;
+    std::string const facts =
+        m_Plan.m_Title + '\0' + m_Plan.m_Subtitle + '\0' + m_Plan.AuthorsAsText() + '\0' + m_Plan.m_Language;
     return HashBytes(facts, m_Look.m_Hash);
 }
 
@@ -160,7 +167,8 @@ bool Importer::WriteTitleDocument(std::vector<ImportedChapter> & chapters, Messa
         if (!document) {
             return false;
         }
-        DocumentSettings settings = SettingsFor(m_Plan, m_Look, m_Plan.m_Title, m_Plan.AuthorsAsText(), m_Plan.m_Language);
+        DocumentSettings settings =
+            SettingsFor(m_Plan, m_Look, m_Plan.m_Title, m_Plan.AuthorsAsText(), m_Plan.m_Language);
         settings.m_Metadata.m_Subject = String(m_Plan.m_Subtitle);
         if (!m_Look.m_TitleMaster.empty()) {
             settings.m_PageSetup.m_FirstMaster = String(m_Look.m_TitleMaster);

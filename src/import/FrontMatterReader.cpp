@@ -126,7 +126,8 @@ FrontMatter ReadFrontMatter(std::string_view text, std::string const & shownName
         } else {
             std::size_t const colon = line.find(':');
             if (std::string_view::npos == colon) {
-                messages.Warn("front-matter", {shownName, number, 1}, "This line of the front matter has no \"key: value\".");
+                messages.Warn("front-matter", {shownName, number, 1},
+                              "This line of the front matter has no \"key: value\".");
                 continue;
             }
             key = Trimmed(line.substr(0, colon));
@@ -142,7 +143,8 @@ FrontMatter ReadFrontMatter(std::string_view text, std::string const & shownName
         }
         if (!isGood) {
             messages.Warn("front-matter", {shownName, number, 1},
-                          "The value of \"" + key + "\" is not closed by its quotation mark or bracket; it is ignored.");
+                          "The value of \"" + key +
+                              "\" is not closed by its quotation mark or bracket; it is ignored.");
         } else if ("title" == key) {
             result.m_Title = values.front();
         } else if ("lang" == key) {

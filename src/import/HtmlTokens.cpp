@@ -18,22 +18,23 @@ struct NamedCharacter
 };
 
 constexpr std::array g_Characters{
-    NamedCharacter{"amp", "&"},       NamedCharacter{"lt", "<"},        NamedCharacter{"gt", ">"},
-    NamedCharacter{"quot", "\""},     NamedCharacter{"apos", "'"},      NamedCharacter{"nbsp", "\u00A0"},
-    NamedCharacter{"copy", "\u00A9"}, NamedCharacter{"reg", "\u00AE"},  NamedCharacter{"trade", "\u2122"},
-    NamedCharacter{"deg", "\u00B0"},  NamedCharacter{"times", "\u00D7"}, NamedCharacter{"middot", "\u00B7"},
+    NamedCharacter{"amp", "&"},        NamedCharacter{"lt", "<"},         NamedCharacter{"gt", ">"},
+    NamedCharacter{"quot", "\""},      NamedCharacter{"apos", "'"},       NamedCharacter{"nbsp", "\u00A0"},
+    NamedCharacter{"copy", "\u00A9"},  NamedCharacter{"reg", "\u00AE"},   NamedCharacter{"trade", "\u2122"},
+    NamedCharacter{"deg", "\u00B0"},   NamedCharacter{"times", "\u00D7"}, NamedCharacter{"middot", "\u00B7"},
     NamedCharacter{"ndash", "\u2013"}, NamedCharacter{"mdash", "\u2014"}, NamedCharacter{"hellip", "\u2026"},
     NamedCharacter{"lsquo", "\u2018"}, NamedCharacter{"rsquo", "\u2019"}, NamedCharacter{"ldquo", "\u201C"},
     NamedCharacter{"rdquo", "\u201D"}, NamedCharacter{"laquo", "\u00AB"}, NamedCharacter{"raquo", "\u00BB"},
-    NamedCharacter{"bull", "\u2022"}, NamedCharacter{"shy", "\u00AD"},  NamedCharacter{"thinsp", "\u2009"},
-    NamedCharacter{"ensp", "\u2002"}, NamedCharacter{"emsp", "\u2003"}, NamedCharacter{"euro", "\u20AC"},
-    NamedCharacter{"pound", "\u00A3"}, NamedCharacter{"sect", "\u00A7"}, NamedCharacter{"para", "\u00B6"},
-    NamedCharacter{"rarr", "\u2192"}, NamedCharacter{"larr", "\u2190"},
+    NamedCharacter{"bull", "\u2022"},  NamedCharacter{"shy", "\u00AD"},   NamedCharacter{"thinsp", "\u2009"},
+    NamedCharacter{"ensp", "\u2002"},  NamedCharacter{"emsp", "\u2003"},  NamedCharacter{"euro", "\u20AC"},
+    NamedCharacter{"pound", "\u00A3"}, NamedCharacter{"sect", "\u00A7"},  NamedCharacter{"para", "\u00B6"},
+    NamedCharacter{"rarr", "\u2192"},  NamedCharacter{"larr", "\u2190"},
 };
 
 bool IsNameCharacter(char c)
 {
-    return ('a' <= c && c <= 'z') || ('A' <= c && c <= 'Z') || ('0' <= c && c <= '9') || '-' == c || '_' == c || ':' == c;
+    return ('a' <= c && c <= 'z') || ('A' <= c && c <= 'Z') || ('0' <= c && c <= '9') || '-' == c || '_' == c ||
+           ':' == c;
 }
 
 bool IsSpace(char c)
@@ -155,7 +156,8 @@ std::string DecodeCharacterReferences(std::string_view text)
             name.remove_prefix(isHex ? 1 : 0);
             std::uint32_t code = 0;
             auto const [stop, error] = std::from_chars(name.data(), name.data() + name.size(), code, isHex ? 16 : 10);
-            bool const isGood = std::errc() == error && stop == name.data() + name.size() && U_IS_UNICODE_CHAR(code) && 0 < code;
+            bool const isGood =
+                std::errc() == error && stop == name.data() + name.size() && U_IS_UNICODE_CHAR(code) && 0 < code;
             if (isGood) {
                 char bytes[4];
                 std::int32_t length = 0;

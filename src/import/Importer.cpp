@@ -29,7 +29,10 @@ public:
         m_Hash = HashBytes(text, m_Hash * 31 + 1);
         return *this;
     }
-    FactHash & Add(std::uint64_t number) { return Add(std::string_view(reinterpret_cast<char const *>(&number), sizeof number)); }
+    FactHash & Add(std::uint64_t number)
+    {
+        return Add(std::string_view(reinterpret_cast<char const *>(&number), sizeof number));
+    }
     [[nodiscard]] std::uint64_t Get() const { return m_Hash; }
 
 private:
@@ -60,8 +63,12 @@ std::string DocumentNameFor(std::string name)
 
 }
 
-Importer::Importer(BookPlan const & plan, Template const & look, fs::path work, std::atomic<bool> const * abort) :
-    m_Plan(plan), m_Look(look), m_Work(std::move(work)), m_Abort(abort), m_State(WorkState::Load(m_Work))
+Importer::Importer(BookPlan const & plan, Template const & look, fs::path work, std::atomic<bool> const * abort)
+    : m_Plan(plan),
+      m_Look(look),
+      m_Work(std::move(work)),
+      m_Abort(abort),
+      m_State(WorkState::Load(m_Work))
 {
     for (PlannedChapter const & chapter : plan.m_Chapters) {
         m_Names.push_back(chapter.m_Name);
@@ -72,7 +79,11 @@ Importer::Importer(BookPlan const & plan, Template const & look, fs::path work, 
 std::uint64_t Importer::FactsOf(PlannedChapter const & chapter) const
 {
     FactHash hash;
-    hash.Add(m_Look.m_Hash).Add(m_Plan.m_Title).Add(m_Plan.m_Language).Add(m_Plan.m_Smart ? 1 : 0).Add(m_Plan.AuthorsAsText());
+    hash.Add(m_Look.m_Hash)
+        .Add(m_Plan.m_Title)
+        .Add(m_Plan.m_Language)
+        .Add(m_Plan.m_Smart ? 1 : 0)
+        .Add(m_Plan.AuthorsAsText());
     hash.Add(chapter.m_Name).Add(chapter.m_Title).Add(chapter.m_Part).Add(chapter.m_Number);
     return hash.Get();
 }
@@ -118,7 +129,8 @@ void Importer::Import(Job & job, std::uint64_t facts) const
         return;
     }
 
-    ChapterText const chapter = ReadMarkdown(*text, {planned.m_Name, m_Plan.m_Language, m_Plan.m_Smart}, job.m_Messages);
+    ChapterText const chapter =
+        ReadMarkdown(*text, {planned.m_Name, m_Plan.m_Language, m_Plan.m_Smart}, job.m_Messages);
     known.m_Title = chapter.Title();
     if (known.m_Title.empty()) {
         known.m_Title = planned.m_Title.empty() ? fs::path(planned.m_Name).stem().string() : planned.m_Title;
@@ -188,10 +200,14 @@ void Importer::CheckLinks(std::vector<Job> & jobs, MessageList & messages) const
             LinkTarget const target = ReadLinkTarget(link.m_Target, name, m_Names);
             Place const place{name, link.m_Line};
             if (LinkTarget::Kind::Unknown == target.m_Kind) {
-                messages.Warn("link-file", place, "The link to " + link.m_Target + " leads to no chapter of the book; its text is set without a link.");
-            } else if (LinkTarget::Kind::Chapter == target.m_Kind && !target.m_Id.empty() && !anchors[target.m_Chapter].contains(target.m_Id)) {
-                messages.Warn("link-anchor", place, "The link to " + link.m_Target + " leads nowhere: " + target.m_Chapter +
-                                                        " has no anchor #" + target.m_Id + ".");
+                messages.Warn("link-file", place,
+                              "The link to " + link.m_Target +
+                                  " leads to no chapter of the book; its text is set without a link.");
+            } else if (LinkTarget::Kind::Chapter == target.m_Kind && !target.m_Id.empty() &&
+                       !anchors[target.m_Chapter].contains(target.m_Id)) {
+                messages.Warn("link-anchor", place,
+                              "The link to " + link.m_Target + " leads nowhere: " + target.m_Chapter +
+                                  " has no anchor #" + target.m_Id + ".");
             }
         }
     }
@@ -212,11 +228,13 @@ std::vector<Importer::Job> Importer::MakeJobs() const
 bool Importer::IsEverythingCurrent(MessageList & messages)
 {
     auto const isTouched = [this](KnownChapter const & known) {
-        return known.m_Document.empty() || !known.m_DocumentStamp.Exists() || known.m_DocumentStamp != FileStamp::Of(m_Work / known.m_Document);
+        return known.m_Document.empty() || !known.m_DocumentStamp.Exists() ||
+               known.m_DocumentStamp != FileStamp::Of(m_Work / known.m_Document);
     };
     if (m_Plan.m_HasTitlePage) {
         auto const title = m_State.m_Chapters.find("");
-        if (title == m_State.m_Chapters.end() || title->second.m_Facts != FactsOfTitlePage() || isTouched(title->second)) {
+        if (title == m_State.m_Chapters.end() || title->second.m_Facts != FactsOfTitlePage() ||
+            isTouched(title->second)) {
             return false;
         }
     }
@@ -276,13 +294,16 @@ bool Importer::Run(std::vector<ImportedChapter> & chapters, MessageList & messag
             messages.Add(message.m_Severity, message.m_Kind, message.m_Place, message.m_Text);
         }
         if (job.m_IsUsable) {
-            chapters.push_back({job.m_Planned->m_Name, job.m_Known.m_Title, m_Work / job.m_Known.m_Document, job.m_IsFresh});
+            chapters.push_back(
+                {job.m_Planned->m_Name, job.m_Known.m_Title, m_Work / job.m_Known.m_Document, job.m_IsFresh});
             m_State.m_Chapters[job.m_Planned->m_Name] = job.m_Known;
         }
     }
     if (isWhole) {
         CheckLinks(jobs, messages);
-        std::erase_if(m_State.m_Chapters, [&](auto const & entry) { return !std::binary_search(m_Names.begin(), m_Names.end(), entry.first) && !entry.first.empty(); });
+        std::erase_if(m_State.m_Chapters, [&](auto const & entry) {
+            return !std::binary_search(m_Names.begin(), m_Names.end(), entry.first) && !entry.first.empty();
+        });
     }
     std::string problem;
     if (!m_State.Save(m_Work, problem)) {

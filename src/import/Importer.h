@@ -26,8 +26,8 @@ struct ImportedChapter
 };
 
 /// Brings the chapter documents of a work folder in step with a book's sources. A document whose source, pictures,
-/// template and other facts are what they were is not touched. One that is made anew keeps its identity, the uids of its
-/// anchors and its start numbers.
+/// template and other facts are what they were is not touched. One that is made anew keeps its identity, the uids of
+/// its anchors and its start numbers.
 class Importer
 {
 public:
@@ -42,8 +42,8 @@ public:
     /// none is half-written.
     bool Run(std::vector<ImportedChapter> & chapters, MessageList & messages, Progress const & progress);
 
-    /// Whether nothing at all has changed since a build ended: no source, no fact, and no document by another hand. If so,
-    /// the messages of the unchanged chapters are appended. Writes nothing.
+    /// Whether nothing at all has changed since a build ended: no source, no fact, and no document by another hand. If
+    /// so, the messages of the unchanged chapters are appended. Writes nothing.
     bool IsEverythingCurrent(MessageList & messages);
 
     /// The memory of the folder, for the one who builds: it is saved by `Run` and again when the build has ended.
@@ -72,7 +72,8 @@ private:
     void CheckLinks(std::vector<Job> & jobs, MessageList & messages) const;
     void NameDocuments(std::vector<Job> & jobs) const;
     [[nodiscard]] std::uint64_t FactsOf(PlannedChapter const & chapter) const;
-    [[nodiscard]] std::uint64_t FactsOfLinks(PlannedChapter const & chapter, std::vector<KnownLink> const & links) const;
+    [[nodiscard]] std::uint64_t FactsOfLinks(PlannedChapter const & chapter,
+                                             std::vector<KnownLink> const & links) const;
     [[nodiscard]] bool IsAborted() const { return m_Abort && *m_Abort; }
 
     BookPlan const & m_Plan;

@@ -83,8 +83,9 @@ void InlineBuilder::AddObject(ObjectKind kind, std::uint32_t index)
 
 void InlineBuilder::AddObjectAt(std::uint32_t position, ObjectKind kind, std::uint32_t index)
 {
-    auto const place = std::lower_bound(m_Objects.begin(), m_Objects.end(), position,
-                                        [](InlineObject const & object, std::uint32_t at) { return object.m_Position < at; });
+    auto const place =
+        std::lower_bound(m_Objects.begin(), m_Objects.end(), position,
+                         [](InlineObject const & object, std::uint32_t at) { return object.m_Position < at; });
     m_Objects.insert(place, {position, kind, index});
 }
 
@@ -95,7 +96,8 @@ void InlineBuilder::StartLine(int line)
 
 bool InlineBuilder::HasObjectsOf(ObjectKind kind) const
 {
-    return std::any_of(m_Objects.begin(), m_Objects.end(), [kind](InlineObject const & object) { return kind == object.m_Kind; });
+    return std::any_of(m_Objects.begin(), m_Objects.end(),
+                       [kind](InlineObject const & object) { return kind == object.m_Kind; });
 }
 
 InlineBuilder::Run const * InlineBuilder::RunAt(std::size_t position) const
@@ -142,8 +144,9 @@ int InlineBuilder::LineAt(std::size_t position) const
 void InlineBuilder::AddMarks(std::uint32_t start, std::uint32_t end, Mark marks)
 {
     auto const split = [this](std::uint32_t at) {
-        auto const next = std::upper_bound(m_Runs.begin(), m_Runs.end(), at,
-                                           [](std::uint32_t position, Run const & run) { return position < run.m_Start; });
+        auto const next =
+            std::upper_bound(m_Runs.begin(), m_Runs.end(), at,
+                             [](std::uint32_t position, Run const & run) { return position < run.m_Start; });
         if (next != m_Runs.begin() && (next - 1)->m_Start < at && at < Position()) {
             Run run = *(next - 1);
             run.m_Start = at;
@@ -227,7 +230,8 @@ InlineText InlineBuilder::Finish()
     }
     for (std::size_t at = first; at < last; ++at) {
         if (u'\n' == m_Text[at]) {
-            bool const vanishes = IsWithoutSpaces(CharacterBefore(m_Text, at)) && IsWithoutSpaces(CharacterAt(m_Text, at + 1));
+            bool const vanishes =
+                IsWithoutSpaces(CharacterBefore(m_Text, at)) && IsWithoutSpaces(CharacterAt(m_Text, at + 1));
             edits.push_back({static_cast<std::uint32_t>(at), 1, vanishes ? u"" : u" "});
         }
     }

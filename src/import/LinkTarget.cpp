@@ -20,7 +20,8 @@ bool HasScheme(std::string_view target)
         return false;
     }
     return std::all_of(target.begin(), target.begin() + static_cast<std::ptrdiff_t>(colon), [](char c) {
-        return ('a' <= c && c <= 'z') || ('A' <= c && c <= 'Z') || ('0' <= c && c <= '9') || '+' == c || '-' == c || '.' == c;
+        return ('a' <= c && c <= 'z') || ('A' <= c && c <= 'Z') || ('0' <= c && c <= '9') || '+' == c || '-' == c ||
+               '.' == c;
     });
 }
 
@@ -39,7 +40,8 @@ std::string MakeUuid(std::string_view space, std::string_view first, std::string
     char uuid[37];
     std::snprintf(uuid, sizeof uuid, "%08x-%04x-8%03x-%04x-%012llx", static_cast<unsigned>(a >> 32),
                   static_cast<unsigned>(a >> 16 & 0xFFFF), static_cast<unsigned>(a & 0xFFF),
-                  static_cast<unsigned>(0x8000 | (b >> 48 & 0x3FFF)), static_cast<unsigned long long>(b & 0xFFFFFFFFFFFFu));
+                  static_cast<unsigned>(0x8000 | (b >> 48 & 0x3FFF)),
+                  static_cast<unsigned long long>(b & 0xFFFFFFFFFFFFu));
     return uuid;
 }
 

@@ -33,8 +33,8 @@ struct LinkTarget
 /// unknown.
 LinkTarget ReadLinkTarget(std::string_view target, std::string_view from, std::vector<std::string> const & chapters);
 
-/// Identity of an anchor across chapters, in UUID form: the same for the same chapter and id in every run, so that links
-/// between chapters can be made without looking into the other chapter.
+/// Identity of an anchor across chapters, in UUID form: the same for the same chapter and id in every run, so that
+/// links between chapters can be made without looking into the other chapter.
 std::string MakeAnchorUid(std::string_view chapter, std::string_view id);
 
 /// Identity of an index topic, from its full name: chapters that name the same topic agree without having met.

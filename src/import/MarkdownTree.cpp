@@ -64,7 +64,10 @@ ExtensionTypes const & Types()
 
 int HexValue(char c)
 {
-    return '0' <= c && c <= '9' ? c - '0' : 'a' <= c && c <= 'f' ? c - 'a' + 10 : 'A' <= c && c <= 'F' ? c - 'A' + 10 : -1;
+    return '0' <= c && c <= '9'   ? c - '0'
+           : 'a' <= c && c <= 'f' ? c - 'a' + 10
+           : 'A' <= c && c <= 'F' ? c - 'A' + 10
+                                  : -1;
 }
 
 }
@@ -95,11 +98,26 @@ std::string PlainText(cmark_node * node)
     return text;
 }
 
-bool IsTable(cmark_node * node) { return cmark_node_get_type(node) == Types().m_Table; }
-bool IsTableRow(cmark_node * node) { return cmark_node_get_type(node) == Types().m_Row; }
-bool IsTableCell(cmark_node * node) { return cmark_node_get_type(node) == Types().m_Cell; }
-bool IsStrikethrough(cmark_node * node) { return cmark_node_get_type(node) == Types().m_Strikethrough; }
-bool IsTaskItem(cmark_node * node) { return HasTypeName(node, "tasklist"); }
+bool IsTable(cmark_node * node)
+{
+    return cmark_node_get_type(node) == Types().m_Table;
+}
+bool IsTableRow(cmark_node * node)
+{
+    return cmark_node_get_type(node) == Types().m_Row;
+}
+bool IsTableCell(cmark_node * node)
+{
+    return cmark_node_get_type(node) == Types().m_Cell;
+}
+bool IsStrikethrough(cmark_node * node)
+{
+    return cmark_node_get_type(node) == Types().m_Strikethrough;
+}
+bool IsTaskItem(cmark_node * node)
+{
+    return HasTypeName(node, "tasklist");
+}
 
 std::string DecodePercent(std::string_view text)
 {

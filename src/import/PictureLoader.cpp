@@ -29,7 +29,8 @@ std::string LoweredExtension(std::filesystem::path const & path)
 /// Whether the file ends as its format wants it; a file cut short shows by this without being decoded.
 bool HasEnd(std::vector<unsigned char> const & bytes, Raster::PictureKind kind)
 {
-    std::string_view const tail(reinterpret_cast<char const *>(bytes.data()) + (bytes.size() - std::min<std::size_t>(bytes.size(), 512)),
+    std::string_view const tail(reinterpret_cast<char const *>(bytes.data()) +
+                                    (bytes.size() - std::min<std::size_t>(bytes.size(), 512)),
                                 std::min<std::size_t>(bytes.size(), 512));
     return std::string_view::npos != (Raster::PictureKind::Png == kind ? tail.rfind("IEND") : tail.rfind("\xFF\xD9"));
 }
@@ -37,8 +38,12 @@ bool HasEnd(std::vector<unsigned char> const & bytes, Raster::PictureKind kind)
 }
 
 PictureLoader::PictureLoader(std::filesystem::path const & chapter, std::string shownName, DocumentPictures & pictures,
-                             std::map<std::string, KnownFile> & known, MessageList & messages) :
-    m_Folder(chapter.parent_path()), m_ShownName(std::move(shownName)), m_Pictures(pictures), m_Known(known), m_Messages(messages)
+                             std::map<std::string, KnownFile> & known, MessageList & messages)
+    : m_Folder(chapter.parent_path()),
+      m_ShownName(std::move(shownName)),
+      m_Pictures(pictures),
+      m_Known(known),
+      m_Messages(messages)
 {
 }
 
@@ -69,7 +74,9 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
     auto const opened = Raster::Picture::FromBytes(bytes, String(picture.m_Path), problem);
     if (!opened) {
         bool const isOtherKind = Raster::PictureProblem::Code::UnknownKind == problem.m_Code;
-        return {"", 0, 0, isOtherKind ? "is neither PNG nor JPEG, whatever its name says" : "cannot be used (" + problem.m_Text.ToStd() + ")",
+        return {"", 0, 0,
+                isOtherKind ? "is neither PNG nor JPEG, whatever its name says"
+                            : "cannot be used (" + problem.m_Text.ToStd() + ")",
                 isOtherKind ? "picture-kind" : "picture-damaged"};
     }
     Raster::PictureInfo const & info = opened->GetInfo();
@@ -80,7 +87,8 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
     std::string const actual = Raster::PictureKind::Png == info.m_Kind ? ".png" : ".jpg";
     if (promised != actual) {
         m_Messages.Warn("picture-kind", {m_ShownName, picture.m_Line},
-                        "The picture " + picture.m_Path + " is a " + (".png" == actual ? "PNG" : "JPEG") + " under another name; it is set all the same.");
+                        "The picture " + picture.m_Path + " is a " + (".png" == actual ? "PNG" : "JPEG") +
+                            " under another name; it is set all the same.");
     }
 
     DocumentPictures::Entry entry;

@@ -13,8 +13,8 @@ class DocumentPictures;
 namespace Import
 {
 
-/// Takes the pictures of one chapter into its document. A picture that can't be set becomes a marked box with the reason
-/// in it, and a message. Used by one thread.
+/// Takes the pictures of one chapter into its document. A picture that can't be set becomes a marked box with the
+/// reason in it, and a message. Used by one thread.
 class PictureLoader
 {
 public:

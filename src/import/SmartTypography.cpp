@@ -48,9 +48,18 @@ constexpr std::array g_Customs{
 
 constexpr std::u16string_view g_Apostrophe = u"\u2019";
 
-bool IsDigit(char16_t c) { return u'0' <= c && c <= u'9'; }
-bool IsWord(char16_t c) { return u_isalnum(c) || (0xD800 <= c && c < 0xE000); }
-bool IsSpace(char16_t c) { return u_isUWhiteSpace(c) || 0x2028 == c; }
+bool IsDigit(char16_t c)
+{
+    return u'0' <= c && c <= u'9';
+}
+bool IsWord(char16_t c)
+{
+    return u_isalnum(c) || (0xD800 <= c && c < 0xE000);
+}
+bool IsSpace(char16_t c)
+{
+    return u_isUWhiteSpace(c) || 0x2028 == c;
+}
 
 /// Whether a quotation mark after `c` can open: after space, brackets, dashes and other opening marks.
 bool IsBeforeOpening(char16_t c)
@@ -71,7 +80,8 @@ bool IsElision(std::u16string_view rest)
     if (!rest.empty() && IsDigit(rest.front())) {
         return true;
     }
-    for (std::u16string_view word : {u"tis", u"twas", u"twere", u"twill", u"twould", u"em", u"til", u"n", u"cause", u"bout"}) {
+    for (std::u16string_view word :
+         {u"tis", u"twas", u"twere", u"twill", u"twould", u"em", u"til", u"n", u"cause", u"bout"}) {
         if (rest.size() < word.size() || (word.size() < rest.size() && IsWord(rest[word.size()]))) {
             continue;
         }
@@ -127,9 +137,12 @@ bool IsRangeHyphen(std::u16string_view text, std::size_t at)
     if (first.empty() || second.empty() || 4 < first.size() || 4 < second.size()) {
         return false;
     }
-    auto const joins = [](char16_t c) { return IsWord(c) || u'-' == c || u'.' == c || u'/' == c || u'_' == c || u':' == c; };
+    auto const joins = [](char16_t c) {
+        return IsWord(c) || u'-' == c || u'.' == c || u'/' == c || u'_' == c || u':' == c;
+    };
     bool const isBound = 0 < start && joins(text[start - 1]);
-    bool const runsOn = end < text.size() && (IsWord(text[end]) || u'-' == text[end] || u'/' == text[end] || u'_' == text[end]);
+    bool const runsOn =
+        end < text.size() && (IsWord(text[end]) || u'-' == text[end] || u'/' == text[end] || u'_' == text[end]);
     if (isBound || runsOn || IsLabel(text, start)) {
         return false;
     }

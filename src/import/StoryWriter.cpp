@@ -24,11 +24,16 @@ struct MarkStyle
 
 /// Character styles in the order in which they are laid over each other.
 constexpr std::array g_MarkStyles{
-    MarkStyle{Mark::Emphasis, "Emphasis"},       MarkStyle{Mark::Strong, "Strong"},
-    MarkStyle{Mark::Code, "Code"},               MarkStyle{Mark::Keyboard, "Keyboard"},
-    MarkStyle{Mark::Strike, "Strike-through"},   MarkStyle{Mark::Underline, "Underline"},
-    MarkStyle{Mark::Superscript, "Superscript"}, MarkStyle{Mark::Subscript, "Subscript"},
-    MarkStyle{Mark::Small, "Small"},             MarkStyle{Mark::SmallCaps, "Small capitals"},
+    MarkStyle{Mark::Emphasis, "Emphasis"},
+    MarkStyle{Mark::Strong, "Strong"},
+    MarkStyle{Mark::Code, "Code"},
+    MarkStyle{Mark::Keyboard, "Keyboard"},
+    MarkStyle{Mark::Strike, "Strike-through"},
+    MarkStyle{Mark::Underline, "Underline"},
+    MarkStyle{Mark::Superscript, "Superscript"},
+    MarkStyle{Mark::Subscript, "Subscript"},
+    MarkStyle{Mark::Small, "Small"},
+    MarkStyle{Mark::SmallCaps, "Small capitals"},
     MarkStyle{Mark::Highlight, "Highlight"},
 };
 
@@ -62,8 +67,11 @@ std::string JoinTopic(std::vector<std::string> const & names)
 
 }
 
-StoryWriter::StoryWriter(ChapterText const & chapter, Template const & look, StoryContext const & context) :
-    m_Chapter(chapter), m_Look(look), m_Context(context), m_Styles(*look.m_Settings.m_Styles)
+StoryWriter::StoryWriter(ChapterText const & chapter, Template const & look, StoryContext const & context)
+    : m_Chapter(chapter),
+      m_Look(look),
+      m_Context(context),
+      m_Styles(*look.m_Settings.m_Styles)
 {
     // The first heading is the chapter's title, whatever stands before it.
     auto const title = std::find_if(chapter.m_Blocks.begin(), chapter.m_Blocks.end(),
@@ -107,7 +115,8 @@ void StoryWriter::WriteStartAnchor()
 void StoryWriter::WriteBlocks(std::vector<Block> const & blocks, bool isNote)
 {
     for (std::size_t at = 0; at < blocks.size(); ++at) {
-        WriteBlock(blocks[at], 0 < at ? &blocks[at - 1] : nullptr, at + 1 < blocks.size() ? &blocks[at + 1] : nullptr, isNote);
+        WriteBlock(blocks[at], 0 < at ? &blocks[at - 1] : nullptr, at + 1 < blocks.size() ? &blocks[at + 1] : nullptr,
+                   isNote);
     }
 }
 
@@ -158,9 +167,10 @@ Kernel::Counted<Story::ListAtt const> StoryWriter::ListAttOf(Block const & block
     att->SetLevel(static_cast<int>(depth) - 1);
     m_NextNumbers.resize(depth);
     if (ListMark::Number != block.m_ListMark) {
-        std::string const & bullet = ListMark::TaskOpen == block.m_ListMark   ? "\u2610"
-                                     : ListMark::TaskDone == block.m_ListMark ? "\u2611"
-                                                                              : m_Look.m_Bullets[std::min(depth, m_Look.m_Bullets.size()) - 1];
+        std::string const & bullet = ListMark::TaskOpen == block.m_ListMark ? "\u2610"
+                                     : ListMark::TaskDone == block.m_ListMark
+                                         ? "\u2611"
+                                         : m_Look.m_Bullets[std::min(depth, m_Look.m_Bullets.size()) - 1];
         att->SetKind(Story::ListAtt::Bulleted);
         att->SetName("Bullets");
         att->SetBullet(String(bullet));
@@ -219,7 +229,8 @@ StoryWriter::ParagraphAttsPtr StoryWriter::AttsOf(Block const & block, std::stri
             atts.SetDouble(Att::SpaceAfter, std::max(gap, format.m_SpaceAfter));
         }
     }
-    return Kernel::MakeCounted<Story::ParagraphAtts>(std::move(atts), Story::AttSet(), isItem ? ListAttOf(block) : nullptr);
+    return Kernel::MakeCounted<Story::ParagraphAtts>(std::move(atts), Story::AttSet(),
+                                                     isItem ? ListAttOf(block) : nullptr);
 }
 
 void StoryWriter::WriteBlock(Block const & block, Block const * before, Block const * next, bool isNote)
@@ -399,7 +410,8 @@ void StoryWriter::WriteAnchor(Anchor const & anchor)
         // The chapter's title is the outline's entry of the chapter itself.
         Block const & heading = *std::exchange(m_Heading, nullptr);
         bool const isBookmark = &heading != m_TitleBlock;
-        data = Kernel::MakeCounted<Story::AnchorData>(String(PlainText(heading.m_Text)), isBookmark, true, uid, heading.m_Level);
+        data = Kernel::MakeCounted<Story::AnchorData>(String(PlainText(heading.m_Text)), isBookmark, true, uid,
+                                                      heading.m_Level);
     } else {
         String const name(anchor.m_Id.empty() ? m_Context.m_Chapter : anchor.m_Id);
         data = Kernel::MakeCounted<Story::AnchorData>(name, false, false, uid);
@@ -414,10 +426,14 @@ void StoryWriter::WriteObject(InlineObject const & object, GlyphAttsPtr const & 
         WriteAnchor(m_Chapter.m_Anchors[object.m_Index]);
         break;
     case ObjectKind::IndexMark:
-        m_Builder->AppendObject(Kernel::MakeCounted<Story::IndexMarkGlyph>(String(JoinTopic(m_Chapter.m_IndexMarks[object.m_Index].m_Topic))), atts);
+        m_Builder->AppendObject(Kernel::MakeCounted<Story::IndexMarkGlyph>(
+                                    String(JoinTopic(m_Chapter.m_IndexMarks[object.m_Index].m_Topic))),
+                                atts);
         break;
     case ObjectKind::Picture:
-        m_Builder->AppendObject(Kernel::MakeCounted<Story::PictureGlyph>(m_Context.m_LoadPicture(m_Chapter.m_Pictures[object.m_Index])), atts);
+        m_Builder->AppendObject(
+            Kernel::MakeCounted<Story::PictureGlyph>(m_Context.m_LoadPicture(m_Chapter.m_Pictures[object.m_Index])),
+            atts);
         break;
     case ObjectKind::NoteReference: {
         // A note within a note is set in brackets at its place: notes have one level.
@@ -491,7 +507,8 @@ void StoryWriter::WriteInline(InlineText const & text)
     }
 }
 
-Kernel::Counted<Story::Story> WriteTitlePage(std::string const & title, std::string const & subtitle, std::string const & author)
+Kernel::Counted<Story::Story> WriteTitlePage(std::string const & title, std::string const & subtitle,
+                                             std::string const & author)
 {
     Story::StoryBuilder builder;
     auto const write = [&](std::string const & text, char const * style) {

@@ -53,7 +53,8 @@ private:
     [[nodiscard]] Kernel::Counted<Story::Story> WriteCell(InlineText const & text, bool isHead);
 
     [[nodiscard]] std::string StyleOf(Block const & block, Block const * before, bool isNote) const;
-    [[nodiscard]] ParagraphAttsPtr AttsOf(Block const & block, std::string const & style, Block const * before, Block const * next);
+    [[nodiscard]] ParagraphAttsPtr AttsOf(Block const & block, std::string const & style, Block const * before,
+                                          Block const * next);
     [[nodiscard]] Kernel::Counted<Story::ListAtt const> ListAttOf(Block const & block);
     [[nodiscard]] GlyphAttsPtr AttsOf(Mark marks, std::int32_t link);
     [[nodiscard]] Kernel::Counted<Story::HyperlinkData const> LinkOf(std::int32_t link);
@@ -76,6 +77,6 @@ private:
 
 /// The story of a title page.
 [[nodiscard]] Kernel::Counted<Story::Story> WriteTitlePage(std::string const & title, std::string const & subtitle,
-                                                          std::string const & author);
+                                                           std::string const & author);
 
 }

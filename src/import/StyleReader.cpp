@@ -11,7 +11,10 @@ namespace
 
 int HexDigit(char c)
 {
-    return '0' <= c && c <= '9' ? c - '0' : 'a' <= c && c <= 'f' ? c - 'a' + 10 : 'A' <= c && c <= 'F' ? c - 'A' + 10 : -1;
+    return '0' <= c && c <= '9'   ? c - '0'
+           : 'a' <= c && c <= 'f' ? c - 'a' + 10
+           : 'A' <= c && c <= 'F' ? c - 'A' + 10
+                                  : -1;
 }
 
 /// "0.1, 0.2)" into numbers from 0 to 1; how many there were, or -1.
@@ -51,7 +54,9 @@ void SetColour(TomlReader & reader, std::string_view key, ColourTable const & co
     if (auto const colour = ReadColour(text, colours)) {
         atts.SetColour(id, *colour);
     } else {
-        reader.Refuse(*reader.Find(key), key, "a colour such as \"#8a1c1c\", \"grey(0.4)\" or \"cmyk(0, 0.9, 0.8, 0.2)\", or a name from [colours]");
+        reader.Refuse(
+            *reader.Find(key), key,
+            "a colour such as \"#8a1c1c\", \"grey(0.4)\" or \"cmyk(0, 0.9, 0.8, 0.2)\", or a name from [colours]");
     }
 }
 
@@ -151,10 +156,14 @@ void ReadParagraphAttributes(TomlReader & reader, ColourTable const & colours, S
     if (reader.Texts("border", sides)) {
         int bits = 0;
         for (std::string const & side : sides) {
-            int const bit = "left" == side ? Att::BorderLeft : "top" == side ? Att::BorderTop : "right" == side ? Att::BorderRight
-                            : "bottom" == side ? Att::BorderBottom : 0;
+            int const bit = "left" == side     ? Att::BorderLeft
+                            : "top" == side    ? Att::BorderTop
+                            : "right" == side  ? Att::BorderRight
+                            : "bottom" == side ? Att::BorderBottom
+                                               : 0;
             if (0 == bit) {
-                reader.Refuse(*reader.Find("border"), "border", "a list of \"left\", \"top\", \"right\" and \"bottom\"");
+                reader.Refuse(*reader.Find("border"), "border",
+                              "a list of \"left\", \"top\", \"right\" and \"bottom\"");
             }
             bits |= bit;
         }

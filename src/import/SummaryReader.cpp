@@ -11,8 +11,10 @@ namespace
 class SummaryReader
 {
 public:
-    SummaryReader(std::string const & file, BookPlan & plan, MessageList & messages) :
-        m_File(file), m_Plan(plan), m_Messages(messages)
+    SummaryReader(std::string const & file, BookPlan & plan, MessageList & messages)
+        : m_File(file),
+          m_Plan(plan),
+          m_Messages(messages)
     {
     }
 
@@ -95,7 +97,8 @@ private:
             return;
         }
         if (std::string::npos != target.find("://")) {
-            m_Messages.Warn("chapter-remote", place, "\"" + target + "\" is not a file of this folder and is left out.");
+            m_Messages.Warn("chapter-remote", place,
+                            "\"" + target + "\" is not a file of this folder and is left out.");
             return;
         }
         if (std::size_t const hash = target.find('#'); std::string::npos != hash) {

@@ -62,7 +62,8 @@ inline constexpr char const * Link = "Link";
 /// Reads a template. Nothing comes back if the file cannot be read or has an error; `messages` says what and where.
 /// Unknown keys are warnings.
 std::optional<Template> ReadTemplate(std::filesystem::path const & path, MessageList & messages);
-std::optional<Template> ReadTemplateText(std::string const & text, std::string const & shownName, MessageList & messages);
+std::optional<Template> ReadTemplateText(std::string const & text, std::string const & shownName,
+                                         MessageList & messages);
 
 /// The file of a template. A name with a slash or the ending ".toml" is a path from `folder`; any other is looked for
 /// as NAME.toml in `folder`, beside the program (share/korvane-book/templates) and in the source tree. An unknown one

@@ -63,7 +63,9 @@ std::optional<fs::path> FindTemplate(std::string const & name, fs::path const & 
     for (std::string const & candidate : ListTemplates()) {
         known += (known.empty() ? "" : ", ") + candidate;
     }
-    messages.Error("template-missing", {}, "There is no template \"" + name + "\". Known are: " + known + "; or give the path of a .toml file.");
+    messages.Error("template-missing", {},
+                   "There is no template \"" + name + "\". Known are: " + known +
+                       "; or give the path of a .toml file.");
     return std::nullopt;
 }
 

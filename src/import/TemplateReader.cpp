@@ -23,7 +23,7 @@ constexpr double g_Millimetre = 72 / 25.4;
 
 /// ISO 216 and the two American sizes, upright, in millimetres.
 constexpr std::array g_Papers{
-    PaperSize{"A4", 210, 297}, PaperSize{"A5", 148, 210},       PaperSize{"A6", 105, 148},
+    PaperSize{"A4", 210, 297}, PaperSize{"A5", 148, 210},         PaperSize{"A6", 105, 148},
     PaperSize{"B5", 176, 250}, PaperSize{"letter", 215.9, 279.4}, PaperSize{"halfletter", 139.7, 215.9},
 };
 
@@ -71,8 +71,10 @@ bool SplitFields(std::string_view text, std::vector<RunningTextPart> & parts)
 class TemplateReader
 {
 public:
-    TemplateReader(toml::table const & table, std::string const & file, MessageList & messages) :
-        m_Reader(table, "", file, messages), m_File(file), m_Messages(messages)
+    TemplateReader(toml::table const & table, std::string const & file, MessageList & messages)
+        : m_Reader(table, "", file, messages),
+          m_File(file),
+          m_Messages(messages)
     {
     }
 
@@ -118,7 +120,8 @@ private:
                 m_Colours.emplace(key.str(), *colour);
                 m_Result.m_Settings.m_Swatches.push_back({String(key.str()), ToRaster(*colour)});
             } else {
-                reader.Refuse(node, key.str(), "a colour such as \"#8a1c1c\", \"grey(0.4)\" or \"cmyk(0, 0.9, 0.8, 0.2)\"");
+                reader.Refuse(node, key.str(),
+                              "a colour such as \"#8a1c1c\", \"grey(0.4)\" or \"cmyk(0, 0.9, 0.8, 0.2)\"");
             }
         }
     }
@@ -130,7 +133,8 @@ private:
             return;
         }
         if (auto const * name = node->as_string()) {
-            auto const paper = std::find_if(g_Papers.begin(), g_Papers.end(), [&](PaperSize const & p) { return p.m_Name == name->get(); });
+            auto const paper = std::find_if(g_Papers.begin(), g_Papers.end(),
+                                            [&](PaperSize const & p) { return p.m_Name == name->get(); });
             if (paper != g_Papers.end()) {
                 setup.m_PageSize = {paper->m_Width * g_Millimetre, paper->m_Height * g_Millimetre};
                 return;
@@ -140,12 +144,14 @@ private:
             double height = 0;
             auto const first = (*pair)[0].value<std::string>();
             auto const second = (*pair)[1].value<std::string>();
-            if (first && second && ReadLength(*first, width) && ReadLength(*second, height) && 72 <= width && 72 <= height) {
+            if (first && second && ReadLength(*first, width) && ReadLength(*second, height) && 72 <= width &&
+                72 <= height) {
                 setup.m_PageSize = {width, height};
                 return;
             }
         }
-        reader.Refuse(*node, "size", "\"A4\", \"A5\", \"A6\", \"B5\", \"letter\", \"halfletter\" or two lengths of at least an inch");
+        reader.Refuse(*node, "size",
+                      "\"A4\", \"A5\", \"A6\", \"B5\", \"letter\", \"halfletter\" or two lengths of at least an inch");
     }
 
     void ReadPage()
@@ -201,8 +207,10 @@ private:
             reader.ReportUnknown();
         }
         sheet->SetDefaults(glyphAtts, paragraphAtts);
-        ReadStyleList("paragraph", [&](Story::TextStyle style) { sheet->SetParagraphStyle(std::move(style)); }, true);
-        ReadStyleList("character", [&](Story::TextStyle style) { sheet->SetCharacterStyle(std::move(style)); }, false);
+        ReadStyleList(
+            "paragraph", [&](Story::TextStyle style) { sheet->SetParagraphStyle(std::move(style)); }, true);
+        ReadStyleList(
+            "character", [&](Story::TextStyle style) { sheet->SetCharacterStyle(std::move(style)); }, false);
         m_Result.m_Settings.m_Styles = sheet;
     }
 
@@ -226,7 +234,8 @@ private:
             if (reader.Text("based-on", base)) {
                 style.m_BasedOn = String(base);
                 if (!list->contains(base)) {
-                    reader.Refuse(*reader.Find("based-on"), "based-on", "the name of another style under [" + kind + "]");
+                    reader.Refuse(*reader.Find("based-on"), "based-on",
+                                  "the name of another style under [" + kind + "]");
                 }
             }
             ReadStyleAttributes(reader, m_Colours, style.m_GlyphAtts, hasParagraph ? &style.m_ParagraphAtts : nullptr);
@@ -247,7 +256,8 @@ private:
                 if (auto const * table = node.as_table()) {
                     ReadMaster(*table, std::string(key.str()), master);
                 } else {
-                    m_Messages.Error("toml-value", m_Reader.PlaceOf(node), "\"master." + std::string(key.str()) + "\" has to be a table.");
+                    m_Messages.Error("toml-value", m_Reader.PlaceOf(node),
+                                     "\"master." + std::string(key.str()) + "\" has to be a table.");
                 }
             }
         }
@@ -287,14 +297,16 @@ private:
             auto const * node = reader.Find(kind);
             auto const * items = node ? node->as_array() : nullptr;
             if (node && !items) {
-                reader.Refuse(*node, kind, std::string("a list of tables, written [[master.") + name + "." + kind + "]]");
+                reader.Refuse(*node, kind,
+                              std::string("a list of tables, written [[master.") + name + "." + kind + "]]");
                 continue;
             }
             for (std::size_t at = 0; items && at < items->size(); ++at) {
                 if (auto const * item = (*items)[at].as_table()) {
                     ReadItem(*item, "master." + name + "." + kind + ".", 'u' == kind[1] && 'l' == kind[2], master);
                 } else {
-                    reader.Refuse(*node, kind, std::string("a list of tables, written [[master.") + name + "." + kind + "]]");
+                    reader.Refuse(*node, kind,
+                                  std::string("a list of tables, written [[master.") + name + "." + kind + "]]");
                 }
             }
         }
@@ -334,7 +346,8 @@ private:
             reader.Choice("align", {"left", "centre", "right", "outside", "inside"}, alignment);
             if (!reader.Text("text", pattern) || !SplitFields(pattern, text.m_Parts)) {
                 m_Messages.Error("toml-value", reader.PlaceOf(table),
-                                 "\"" + prefix + "text\" has to be a text in which {book}, {chapter} and {page} stand for those.");
+                                 "\"" + prefix +
+                                     "text\" has to be a text in which {book}, {chapter} and {page} stand for those.");
             }
         }
         reader.ReportUnknown();
@@ -367,7 +380,8 @@ private:
 
 }
 
-std::optional<Template> ReadTemplateText(std::string const & text, std::string const & shownName, MessageList & messages)
+std::optional<Template> ReadTemplateText(std::string const & text, std::string const & shownName,
+                                         MessageList & messages)
 {
     auto const table = ParseToml(text, shownName, messages);
     if (!table) {

@@ -23,7 +23,11 @@ bool ReadLength(std::string_view text, double & points)
     double number = 0;
     auto const [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
     std::string_view const unit(end, static_cast<std::size_t>(text.data() + text.size() - end));
-    double const factor = "pt" == unit ? 1 : "mm" == unit ? 72 / 25.4 : "cm" == unit ? 72 / 2.54 : "in" == unit ? 72 : 0;
+    double const factor = "pt" == unit   ? 1
+                          : "mm" == unit ? 72 / 25.4
+                          : "cm" == unit ? 72 / 2.54
+                          : "in" == unit ? 72
+                                         : 0;
     if (std::errc() != error || 0 == factor || !(std::abs(number * factor) < 20000)) {
         return false;
     }
@@ -31,8 +35,11 @@ bool ReadLength(std::string_view text, double & points)
     return true;
 }
 
-TomlReader::TomlReader(toml::table const & table, std::string prefix, std::string const & file, MessageList & messages) :
-    m_Table(table), m_Prefix(std::move(prefix)), m_File(file), m_Messages(messages)
+TomlReader::TomlReader(toml::table const & table, std::string prefix, std::string const & file, MessageList & messages)
+    : m_Table(table),
+      m_Prefix(std::move(prefix)),
+      m_File(file),
+      m_Messages(messages)
 {
 }
 
@@ -49,15 +56,18 @@ Place TomlReader::PlaceOf(toml::node const & node) const
 
 void TomlReader::Refuse(toml::node const & node, std::string_view key, std::string_view wanted)
 {
-    m_Messages.Error("toml-value", PlaceOf(node), "\"" + m_Prefix + std::string(key) + "\" has to be " + std::string(wanted) + ".");
+    m_Messages.Error("toml-value", PlaceOf(node),
+                     "\"" + m_Prefix + std::string(key) + "\" has to be " + std::string(wanted) + ".");
 }
 
 void TomlReader::ReportUnknown()
 {
     for (auto const & [key, node] : m_Table) {
         if (std::find(m_Known.begin(), m_Known.end(), std::string(key.str())) == m_Known.end()) {
-            Place const place{m_File, static_cast<int>(key.source().begin.line), static_cast<int>(key.source().begin.column)};
-            m_Messages.Warn("toml-key", place, "The key \"" + m_Prefix + std::string(key.str()) + "\" is not known and has no effect.");
+            Place const place{m_File, static_cast<int>(key.source().begin.line),
+                              static_cast<int>(key.source().begin.column)};
+            m_Messages.Warn("toml-key", place,
+                            "The key \"" + m_Prefix + std::string(key.str()) + "\" is not known and has no effect.");
         }
     }
 }
@@ -121,7 +131,8 @@ bool TomlReader::Length(std::string_view key, double & value)
     if (!node) {
         return false;
     }
-    if (auto const number = node->is_number() ? node->value<double>() : std::optional<double>(); number && std::abs(*number) < 20000) {
+    if (auto const number = node->is_number() ? node->value<double>() : std::optional<double>();
+        number && std::abs(*number) < 20000) {
         value = *number;
         return true;
     }

@@ -45,8 +45,12 @@ KnownFile FileFrom(Json const & json)
 
 Json ToJson(Message const & message)
 {
-    return {static_cast<int>(message.m_Severity), message.m_Kind, message.m_Place.m_File, message.m_Place.m_Line,
-            message.m_Place.m_Column, message.m_Text};
+    return {static_cast<int>(message.m_Severity),
+            message.m_Kind,
+            message.m_Place.m_File,
+            message.m_Place.m_Line,
+            message.m_Place.m_Column,
+            message.m_Text};
 }
 
 Message MessageFrom(Json const & json)
@@ -68,9 +72,15 @@ Json ToJson(KnownChapter const & chapter)
     for (Message const & message : chapter.m_Messages) {
         messages.push_back(ToJson(message));
     }
-    return {{"document", chapter.m_Document}, {"title", chapter.m_Title},     {"facts", chapter.m_Facts},
-            {"source", ToJson(chapter.m_Source)}, {"pictures", pictures},     {"anchors", chapter.m_Anchors},
-            {"links", links},                 {"messages", messages},         {"documentStamp", ToJson(chapter.m_DocumentStamp)}};
+    return {{"document", chapter.m_Document},
+            {"title", chapter.m_Title},
+            {"facts", chapter.m_Facts},
+            {"source", ToJson(chapter.m_Source)},
+            {"pictures", pictures},
+            {"anchors", chapter.m_Anchors},
+            {"links", links},
+            {"messages", messages},
+            {"documentStamp", ToJson(chapter.m_DocumentStamp)}};
 }
 
 KnownChapter ChapterFrom(Json const & json)
@@ -103,7 +113,9 @@ std::int64_t Nanoseconds(timespec const & time)
 
 FileStamp FileStamp::Of(std::filesystem::path const & path)
 {
-    struct stat facts{};
+    struct stat facts
+    {
+    };
     if (0 != stat(path.c_str(), &facts) || !S_ISREG(facts.st_mode)) {
         return {};
     }
@@ -167,7 +179,8 @@ WorkState WorkState::Load(std::filesystem::path const & folder)
 
 bool WorkState::Save(std::filesystem::path const & folder, std::string & problem)
 {
-    m_Saved = std::chrono::duration_cast<std::chrono::nanoseconds>(std::chrono::system_clock::now().time_since_epoch()).count();
+    m_Saved = std::chrono::duration_cast<std::chrono::nanoseconds>(std::chrono::system_clock::now().time_since_epoch())
+                  .count();
     Json chapters = Json::object();
     for (auto const & [name, chapter] : m_Chapters) {
         chapters[name] = ToJson(chapter);

@@ -12,8 +12,8 @@
 namespace Import
 {
 
-/// What tells one state of a file from another without reading it: size, times and inode. Two stamps that are equal mean
-/// the same content, unless the file was written within the same tick of the clock; see `IsTrustworthy`.
+/// What tells one state of a file from another without reading it: size, times and inode. Two stamps that are equal
+/// mean the same content, unless the file was written within the same tick of the clock; see `IsTrustworthy`.
 struct FileStamp
 {
     std::int64_t m_Size = -1;

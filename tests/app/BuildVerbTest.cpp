@@ -41,7 +41,8 @@ TEST_F(BuildVerbTest, OnlyWhatChangedIsMadeAnewAndNumbersFollow)
     }
     EXPECT_FALSE(before.at("3.kvdoc") == after.at("3.kvdoc"));
     EXPECT_EQ(result["chapters"][1]["startPage"], 1);
-    EXPECT_EQ(result["chapters"][3]["startPage"], result["chapters"][2]["startPage"].get<int>() + result["chapters"][2]["pageCount"].get<int>());
+    EXPECT_EQ(result["chapters"][3]["startPage"],
+              result["chapters"][2]["startPage"].get<int>() + result["chapters"][2]["pageCount"].get<int>());
 }
 
 TEST_F(BuildVerbTest, TheBookFollowsItsList)

@@ -67,7 +67,8 @@ void ProgramTest::WriteBook(int count) const
     for (int chapter = 1; chapter <= count; ++chapter) {
         std::string text = "# Chapter " + std::to_string(chapter) + "\n\n";
         for (int paragraph = 0; paragraph < 30; ++paragraph) {
-            text += "The wind went round to the north, and the boat that had come in at dusk lay with its keel on the sand until the "
+            text += "The wind went round to the north, and the boat that had come in at dusk lay with its keel on the "
+                    "sand until the "
                     "tide took it, as it had taken others before and would take them again.\n\n";
         }
         Write("book/" + std::to_string(chapter) + ".md", text);
@@ -80,7 +81,8 @@ std::map<std::string, std::string> ProgramTest::Documents() const
     for (auto const & entry : fs::directory_iterator(m_Folder / "book/.korvane")) {
         if (".kvdoc" == entry.path().extension()) {
             std::string const name = entry.path().filename().string();
-            documents[name] = std::to_string(fs::last_write_time(entry.path()).time_since_epoch().count()) + Read("book/.korvane/" + name);
+            documents[name] = std::to_string(fs::last_write_time(entry.path()).time_since_epoch().count()) +
+                              Read("book/.korvane/" + name);
         }
     }
     return documents;

@@ -23,7 +23,8 @@ TEST_F(StatusAndShowTest, StatusGivesTheKeysThatTheHandbookLists)
     EXPECT_EQ(KeysOf(status), (Keys{"book", "chapters", "messages", "name", "ok", "pageCount"}));
     ASSERT_EQ(status["chapters"].size(), 3u) << status.dump(1);
     auto const & title = status["chapters"][0];
-    EXPECT_EQ(KeysOf(title), (Keys{"cachedStartPage", "index", "key", "name", "pageCount", "pages", "path", "preflight", "startFromPage", "status"}));
+    EXPECT_EQ(KeysOf(title), (Keys{"cachedStartPage", "index", "key", "name", "pageCount", "pages", "path", "preflight",
+                                   "startFromPage", "status"}));
     EXPECT_EQ(title["key"], true);
     EXPECT_EQ(status["chapters"][1]["startFromPage"], 1);
     EXPECT_EQ(status["chapters"][2]["startFromPage"], 0);
@@ -35,7 +36,8 @@ TEST_F(StatusAndShowTest, StatusGivesTheKeysThatTheHandbookLists)
 
 TEST_F(StatusAndShowTest, ShowTellsADocumentFromAChapter)
 {
-    Write("book/a.md", "---\nlang: fr\nauthor: Ich\n---\n# Titel {#t}\n\nText mit Note[^1] und *Nachdruck*.\n\n- eins\n\n|a|b|\n|-|-|\n|c|d|\n\n![Bild](weg.png)\n\n[^1]: Die Note.\n");
+    Write("book/a.md", "---\nlang: fr\nauthor: Ich\n---\n# Titel {#t}\n\nText mit Note[^1] und *Nachdruck*.\n\n- "
+                       "eins\n\n|a|b|\n|-|-|\n|c|d|\n\n![Bild](weg.png)\n\n[^1]: Die Note.\n");
     ASSERT_EQ(Run({"import", "@book/a.md", "-o", "@docs"}).m_Code, 0);
     auto const show = RunJson({"show", "@docs/a.kvdoc"});
     EXPECT_EQ(show["kind"], "document");
@@ -43,7 +45,8 @@ TEST_F(StatusAndShowTest, ShowTellsADocumentFromAChapter)
     EXPECT_EQ(show["metadata"]["language"], "fr");
     EXPECT_EQ(show["metadata"]["author"], "Ich");
     ASSERT_EQ(show["sections"].size(), 1u);
-    EXPECT_EQ(KeysOf(show["sections"][0]), (Keys{"format", "included", "prefix", "restart", "startNumber", "startPageIndex"}));
+    EXPECT_EQ(KeysOf(show["sections"][0]),
+              (Keys{"format", "included", "prefix", "restart", "startNumber", "startPageIndex"}));
     EXPECT_EQ(show["spreads"][0]["pages"][0]["label"], "1");
     EXPECT_NEAR(show["spreads"][0]["pages"][0]["rect"]["right"].get<double>(), 419.528, 0.01);
     auto const & story = show["stories"][0];
@@ -85,7 +88,8 @@ TEST_F(StatusAndShowTest, ShowTellsABookWithoutOpeningItsChapters)
     ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
     auto const documents = Documents();
     auto const show = RunJson({"show", "@book/.korvane/book.kvbook"});
-    EXPECT_EQ(KeysOf(show), (Keys{"chapters", "kind", "mergeStrays", "messages", "name", "ok", "padStrays", "path", "synchronise"}));
+    EXPECT_EQ(KeysOf(show),
+              (Keys{"chapters", "kind", "mergeStrays", "messages", "name", "ok", "padStrays", "path", "synchronise"}));
     EXPECT_EQ(show["chapters"].size(), 2u);
     EXPECT_EQ(Documents(), documents);
 }

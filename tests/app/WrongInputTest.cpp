@@ -47,8 +47,14 @@ TEST_F(WrongInputTest, EachWrongSourceGetsItsSentenceAndAsMuchAsCanBeIsSet)
 {
     std::string const png = "\x89PNG\r\n\x1a\n" + std::string(40, '\0');
     std::vector<Case> const cases{
-        {"a chapter is missing", {{"book.toml", "chapters = ['a.md',\n'b.md']"}, {"a.md", "# A"}}, 1, {"book.toml:2:1: error: ", "b.md"}},
-        {"a chapter is listed twice", {{"book.toml", "chapters = ['a.md', 'a.md']"}, {"a.md", "# A"}}, 0, {"book.toml:1:21: warning: "}},
+        {"a chapter is missing",
+         {{"book.toml", "chapters = ['a.md',\n'b.md']"}, {"a.md", "# A"}},
+         1,
+         {"book.toml:2:1: error: ", "b.md"}},
+        {"a chapter is listed twice",
+         {{"book.toml", "chapters = ['a.md', 'a.md']"}, {"a.md", "# A"}},
+         0,
+         {"book.toml:1:21: warning: "}},
         {"a syntax error", {{"book.toml", "title = \n"}, {"a.md", "# A"}}, 1, {"book.toml:1:"}},
         {"an unknown key", {{"book.toml", "colour = 'red'\n"}, {"a.md", "# A"}}, 0, {"book.toml:1:1: warning: "}},
         {"an unknown template", {{"book.toml", "template = 'nvoel'\n"}, {"a.md", "# A"}}, 1, {"nvoel", "novel"}},
@@ -63,12 +69,17 @@ TEST_F(WrongInputTest, EachWrongSourceGetsItsSentenceAndAsMuchAsCanBeIsSet)
         {"a missing picture", {{"a.md", "x\n\n![P](gone.png)"}}, 0, {"a.md:3: warning: ", "gone.png"}},
         {"a picture cut short", {{"a.md", "![P](p.png)"}, {"p.png", png}}, 0, {"a.md:1: warning: ", "p.png"}},
         {"a picture that is none", {{"a.md", "![P](p.jpg)"}, {"p.jpg", "hello"}}, 0, {"a.md:1: warning: ", "p.jpg"}},
-        {"links to nowhere", {{"a.md", "# A\n\n[x](#gone) [y](b.md#gone) [z](c.md)"}, {"b.md", "# B"}}, 0,
+        {"links to nowhere",
+         {{"a.md", "# A\n\n[x](#gone) [y](b.md#gone) [z](c.md)"}, {"b.md", "# B"}},
+         0,
          {"a.md:3: warning: The link to #gone", "b.md has no anchor #gone", "The link to c.md"}},
         {"an anchor twice", {{"a.md", "# A {#x}\n\n# B {#x}\n"}}, 0, {"a.md:3: warning: "}},
         {"a file in place of the work folder", {{"a.md", "# A"}, {".korvane", "x"}}, 1, {"work folder"}},
         {"a folder in place of the output", {{"a.md", "# A"}, {"book.pdf/x", "x"}}, 1, {"book.pdf"}},
-        {"a template with a mistake", {{"book.toml", "template = 'x.toml'"}, {"a.md", "# A"}, {"x.toml", "[page]\nsize = 'A0'"}}, 1, {"x.toml:2:"}},
+        {"a template with a mistake",
+         {{"book.toml", "template = 'x.toml'"}, {"a.md", "# A"}, {"x.toml", "[page]\nsize = 'A0'"}},
+         1,
+         {"x.toml:2:"}},
     };
     for (Case const & row : cases) {
         SCOPED_TRACE(row.m_Why);

@@ -38,7 +38,8 @@ protected:
         m_Plan = ReadBookPlan(m_Folder, m_Messages);
         std::string text;
         for (PlannedChapter const & chapter : m_Plan ? m_Plan->m_Chapters : std::vector<PlannedChapter>()) {
-            text += (text.empty() ? "" : " ") + chapter.m_Number + (chapter.m_Part.empty() ? "" : "<" + chapter.m_Part + ">") + chapter.m_Name;
+            text += (text.empty() ? "" : " ") + chapter.m_Number +
+                    (chapter.m_Part.empty() ? "" : "<" + chapter.m_Part + ">") + chapter.m_Name;
         }
         return text;
     }
@@ -54,12 +55,14 @@ TEST_F(BookPlanTest, ManifestFactsAreRead)
 {
     Write("a.md", "");
     Write("part/b.md", "");
-    Write("book.toml", "title = 'T'\nsubtitle = 'S'\nauthor = ['A', 'B', 'C']\nlang = 'de'\ntemplate = 'manual'\nsmart = false\n"
-                       "chapters = ['part/b.md', './a.md']\n[output]\nfile = 'x.pdf'\nmarks = true\n");
+    Write("book.toml",
+          "title = 'T'\nsubtitle = 'S'\nauthor = ['A', 'B', 'C']\nlang = 'de'\ntemplate = 'manual'\nsmart = false\n"
+          "chapters = ['part/b.md', './a.md']\n[output]\nfile = 'x.pdf'\nmarks = true\n");
     EXPECT_EQ(Chapters(), "part/b.md a.md");
     ASSERT_TRUE(m_Plan);
     EXPECT_EQ(m_Plan->AuthorsAsText(), "A, B and C");
-    EXPECT_EQ(m_Plan->m_Title + m_Plan->m_Subtitle + m_Plan->m_Language + m_Plan->m_Template + m_Plan->m_OutputFile, "TSdemanualx.pdf");
+    EXPECT_EQ(m_Plan->m_Title + m_Plan->m_Subtitle + m_Plan->m_Language + m_Plan->m_Template + m_Plan->m_OutputFile,
+              "TSdemanualx.pdf");
     EXPECT_TRUE(!m_Plan->m_Smart && m_Plan->m_HasMarks && !m_Plan->m_IncludesBleed);
     EXPECT_EQ(Describe(m_Messages), "");
 }
@@ -97,8 +100,9 @@ TEST_F(BookPlanTest, SummaryInMdBookLayoutIsRead)
     for (char const * name : {"pre.md", "a.md", "a/one.md", "a/two.md", "b.md", "c d.md", "post.md"}) {
         Write(name, "");
     }
-    Write("SUMMARY.md", "# The Title\n\n[Pre](pre.md)\n\n- [A `x`](a.md)\n  - [One](a/one.md)\n  - [Draft]()\n  - [Two](a/two.md)\n\n"
-                        "# Part\n\n- [B](b.md#sec)\n- [C](c%20d.md)\n\n---\n\n[Post](post.md)\n[Web](http://x.org)\n\n# Empty\n");
+    Write("SUMMARY.md",
+          "# The Title\n\n[Pre](pre.md)\n\n- [A `x`](a.md)\n  - [One](a/one.md)\n  - [Draft]()\n  - [Two](a/two.md)\n\n"
+          "# Part\n\n- [B](b.md#sec)\n- [C](c%20d.md)\n\n---\n\n[Post](post.md)\n[Web](http://x.org)\n\n# Empty\n");
     EXPECT_EQ(Chapters(), "pre.md 1a.md 1.1a/one.md 1.3a/two.md 2<Part>b.md 3c d.md post.md");
     ASSERT_TRUE(m_Plan);
     EXPECT_EQ(m_Plan->m_Title, "The Title");
@@ -108,7 +112,8 @@ TEST_F(BookPlanTest, SummaryInMdBookLayoutIsRead)
 
 TEST_F(BookPlanTest, MdBookManifestLeadsToItsSources)
 {
-    Write("book.toml", "[book]\ntitle = 'R'\nauthors = ['X']\nlanguage = 'fr'\n[output.html]\ngit-repository-url = 'x'\n[build]\nx = 1\n");
+    Write("book.toml", "[book]\ntitle = 'R'\nauthors = ['X']\nlanguage = 'fr'\n[output.html]\ngit-repository-url = "
+                       "'x'\n[build]\nx = 1\n");
     Write("src/SUMMARY.md", "- [A](a.md)\n");
     Write("src/a.md", "");
     EXPECT_EQ(Chapters(), "1a.md");
@@ -138,7 +143,18 @@ TEST_F(BookPlanTest, AFolderWithoutChaptersIsRefused)
 
 TEST(NaturalOrderTest, NumbersCountByValue)
 {
-    std::vector<std::string> const ordered{"a", "a1", "a01", "a2", "a2b", "a10", "A11", "b", "chapter 9", "chapter 10", "z99999999999999999999999", "z100000000000000000000000"};
+    std::vector<std::string> const ordered{"a",
+                                           "a1",
+                                           "a01",
+                                           "a2",
+                                           "a2b",
+                                           "a10",
+                                           "A11",
+                                           "b",
+                                           "chapter 9",
+                                           "chapter 10",
+                                           "z99999999999999999999999",
+                                           "z100000000000000000000000"};
     for (std::size_t i = 0; i < ordered.size(); ++i) {
         for (std::size_t j = 0; j < ordered.size(); ++j) {
             EXPECT_EQ(ComesBefore(ordered[i], ordered[j]), i < j) << ordered[i] << " and " << ordered[j];
@@ -157,8 +173,15 @@ TEST(SourceTextTest, EncodingsAreRecognisedOrRefusedWithTheirPlace)
         int m_Column;
     };
     for (auto const & row : std::vector<Case>{
-             {"mark", "\xEF\xBB\xBF" "a", "a", 0, 0},
-             {"UTF-16, little", std::string("\xFF\xFE" "a\0\xe9\0", 6), "aé", 0, 0},
+             {"mark",
+              "\xEF\xBB\xBF"
+              "a",
+              "a", 0, 0},
+             {"UTF-16, little",
+              std::string("\xFF\xFE"
+                          "a\0\xe9\0",
+                          6),
+              "aé", 0, 0},
              {"UTF-16, big, with a pair", std::string("\xFE\xFF\xD8\x3D\xDE\0", 6), "😀", 0, 0},
              {"bad byte", "a\nbé\xE9 c", nullptr, 2, 3},
              {"overlong", "\xC0\x80", nullptr, 1, 1},

@@ -10,8 +10,8 @@ namespace
 
 std::string MarksText(Mark marks)
 {
-    static char const * const names[] = {"em",  "strong", "strike", "code",      "sub",      "sup",
-                                         "u",   "kbd",    "small",  "smallcaps", "highlight"};
+    static char const * const names[] = {"em", "strong", "strike", "code",      "sub",      "sup",
+                                         "u",  "kbd",    "small",  "smallcaps", "highlight"};
     std::string text;
     for (int bit = 0; bit < 11; ++bit) {
         if (Has(marks, static_cast<Mark>(1 << bit))) {
@@ -92,7 +92,8 @@ std::string Describe(ChapterText const & chapter, InlineText const & text)
     std::size_t object = 0;
     for (Span const & span : text.m_Spans) {
         std::string const marks = MarksText(span.m_Marks);
-        std::string const link = 0 <= span.m_Link ? "](" + chapter.m_Links[static_cast<std::size_t>(span.m_Link)].m_Target + ")" : "";
+        std::string const link =
+            0 <= span.m_Link ? "](" + chapter.m_Links[static_cast<std::size_t>(span.m_Link)].m_Target + ")" : "";
         std::string inner;
         for (std::uint32_t at = span.m_Start; at < span.m_Start + span.m_Length;) {
             bool covered = false;

@@ -6,7 +6,8 @@
 #include <string>
 
 /// A chapter as text, one line a block, so that a failing test shows what was read:
-/// `h1 Title`, `p one *two* [three](0)`, `- bullet`, `#1. numbered`. Objects are `<note 0>`, `<picture 0>`, `<anchor id>`,
+/// `h1 Title`, `p one *two* [three](0)`, `- bullet`, `#1. numbered`. Objects are `<note 0>`, `<picture 0>`, `<anchor
+/// id>`,
 /// `<index A!B>`; looks stand in braces: `{em text}`, `{em+strong text}`.
 std::string Describe(Import::ChapterText const & chapter);
 std::string Describe(Import::ChapterText const & chapter, Import::InlineText const & text);

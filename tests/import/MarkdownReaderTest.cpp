@@ -62,7 +62,8 @@ TEST(MarkdownReaderTest, LooksLinksAndPictures)
         {"html marks", "<em>a</em><br>H<sub>2</sub>O <kbd>Esc</kbd> x<sup>2</sup><!-- no -->",
          "p {em a}/H{sub 2}O {kbd Esc} x{sup 2}\n"},
         {"html link and anchor", "<a id=\"q\"></a><a href=\"z.md\">t</a>", "p [<anchor q>t](z.md)\n"},
-        {"html block with picture and caption", "<figure>\n<img src=\"p.png\" alt=\"x\">\n<figcaption>Cap</figcaption>\n</figure>",
+        {"html block with picture and caption",
+         "<figure>\n<img src=\"p.png\" alt=\"x\">\n<figcaption>Cap</figcaption>\n</figure>",
          "figure <picture p.png>\ncaption Cap\n"},
         {"caption span", "<span class=\"caption\">Table 1</span>", "caption Table 1\n"},
         {"listing with file name and caption",
@@ -77,7 +78,8 @@ TEST(MarkdownReaderTest, AttributeLists)
     Check({
         {"heading", "# A b {#my-id .x}\n\n## A b {y=1}", "h1 <anchor my-id>A b\nh2 <anchor a-b>A b\n"},
         {"spans", "[a *b*]{#i .smallcaps} c", "p {smallcaps <anchor i>a }{em+smallcaps b} c\n"},
-        {"index marks", "[dog]{.index} [cat]{.index topic=\"Animal!Cat\" see=\"Pet\"}", "p <index dog>dog <index Animal!Cat see Pet>cat\n"},
+        {"index marks", "[dog]{.index} [cat]{.index topic=\"Animal!Cat\" see=\"Pet\"}",
+         "p <index dog>dog <index Animal!Cat see Pet>cat\n"},
         {"picture width", "![A](p.png){width=60%}", "figure <picture p.png>A\n"},
         {"nested brackets", "[a [b] c]{.mark}", "p {highlight a [b] c}\n"},
         {"in code they are text", "`[a]{.index}` `x`{.y", "p {code [a]{.index}} {code x}{.y\n"},
@@ -90,19 +92,25 @@ TEST(MarkdownReaderTest, AttributeLists)
 TEST(MarkdownReaderTest, WhatCannotBeHonouredIsToldWithItsLine)
 {
     Check({
-        {"mark without note, note without mark", "a\nb[^x]\n\n[^y]: z\n", "p a b[^x]\n", "2 note-missing\n4 note-unused\n"},
+        {"mark without note, note without mark", "a\nb[^x]\n\n[^y]: z\n", "p a b[^x]\n",
+         "2 note-missing\n4 note-unused\n"},
         {"note defined twice", "a[^x]\n\n[^x]: b\n\n[^x]: c\n", "p a<note 0>\nnote 0 x\n  p b\n", "5 note-twice\n"},
         {"definitions in code are code", "```\n[^y]: z\n```\n", "code {code [^y]: z}\n"},
         {"duplicate anchors", "# A {#x}\n\n[b]{#x}\n", "h1 <anchor x>A\np b\n", "3 anchor-twice\n"},
         {"generated blocks", "a\n\n::: {.toc}\n:::\n\n::: warning\nb\n:::\n", "p a\nbox Table of contents\np b\n",
          "3 later-block\n6 class-unknown\n"},
-        {"references without text", "[](b.md) [t](c.md){.page}", "p [b.md](b.md) [t](c.md)\n", "1 later-reference\n1 later-reference\n"},
-        {"include directives", "x\n\n```\ny\n{{#include a.rs}}\n```\n", "p x\ncode {code y/{{#include a.rs}}}\n", "5 directive\n"},
+        {"references without text", "[](b.md) [t](c.md){.page}", "p [b.md](b.md) [t](c.md)\n",
+         "1 later-reference\n1 later-reference\n"},
+        {"include directives", "x\n\n```\ny\n{{#include a.rs}}\n```\n", "p x\ncode {code y/{{#include a.rs}}}\n",
+         "5 directive\n"},
         {"unknown tag", "a <blink>b</blink>", "p a b\n", "1 html-unknown\n"},
         {"unclosed tag", "a <b>b\n\nc", "p a {strong b}\np c\n", "1 html-open\n"},
         {"raw table", "<table>\n<tr><td>a</td><td>b</td></tr>\n</table>", "p a\np b\n", "1 html-structure\n"},
         {"script", "<script>\nx < y\n</script>\n", "", "1 html-unknown\n"},
-        {"control characters", "a\x01" "b\x02", "p ab\n", "1 control-character\n"},
+        {"control characters",
+         "a\x01"
+         "b\x02",
+         "p ab\n", "1 control-character\n"},
         {"front matter counts as lines", "---\ntitle: T\n---\n\n[^x]", "p [^x]\n", "5 note-missing\n"},
     });
 }
@@ -119,7 +127,9 @@ TEST(MarkdownReaderTest, FrontMatterGivesTitleAuthorsAndLanguage)
     MessageList messages;
     ReadOptions options;
     options.m_ShownName = "a.md";
-    ChapterText const chapter = ReadMarkdown("---\ntitle: \"A: b\" # c\nauthor: [X, 'Y ''Z''']\nlang: de\nother:\n  - 1\nlonely\n---\n# H \"q\"\n", options, messages);
+    ChapterText const chapter = ReadMarkdown(
+        "---\ntitle: \"A: b\" # c\nauthor: [X, 'Y ''Z''']\nlang: de\nother:\n  - 1\nlonely\n---\n# H \"q\"\n", options,
+        messages);
     EXPECT_EQ(chapter.Title(), "A: b");
     EXPECT_EQ(chapter.m_FrontMatter.m_Authors, (std::vector<std::string>{"X", "Y 'Z'"}));
     EXPECT_EQ(chapter.m_FrontMatter.m_Language, "de");
@@ -142,7 +152,8 @@ TEST(MarkdownReaderTest, ExtremeInputIsReadWithoutHarm)
 
     ChapterText const quotes = ReadMarkdown(std::string(30000, '>') + "x", {"a.md", "en", true}, messages);
     EXPECT_EQ(quotes.m_Blocks.size(), 1u);
-    ChapterText const brackets = ReadMarkdown(std::string(60000, '[') + "]{.x}" + std::string(60000, '*'), {"a.md", "en", true}, messages);
+    ChapterText const brackets =
+        ReadMarkdown(std::string(60000, '[') + "]{.x}" + std::string(60000, '*'), {"a.md", "en", true}, messages);
     EXPECT_EQ(brackets.m_Blocks.size(), 1u);
     ChapterText const line = ReadMarkdown(std::string(3000000, 'a') + " \"b\"", {"a.md", "en", true}, messages);
     ASSERT_EQ(line.m_Blocks.size(), 1u);

@@ -1,5 +1,5 @@
-#include "import/InlineBuilder.h"
 #include "import/SmartTypography.h"
+#include "import/InlineBuilder.h"
 #include "import/SourceText.h"
 
 #include <gtest/gtest.h>
@@ -32,7 +32,8 @@ TEST(SmartTypographyTest, EachLanguageGetsItsOwnMarks)
              Case{"en", "the '90s, 'tis, dogs' tails, rock 'n' roll", "the ’90s, ’tis, dogs’ tails, rock ’n’ roll"},
              Case{"en", "a--b --- c... d.... e..", "a–b — c… d…. e.."},
              Case{"en", "use --quiet or -o", "use --quiet or -o"},
-             Case{"en", "pp. 12-34, 1939-45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1-2", "pp. 12–34, 1939–45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1–2"},
+             Case{"en", "pp. 12-34, 1939-45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1-2",
+                  "pp. 12–34, 1939–45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1–2"},
              Case{"de-DE", "\"Das ist 'so'\"", "„Das ist ‚so‘“"},
              Case{"de-CH", "\"So\"", "«So»"},
              Case{"fr", "\"Oui\" : non ! l'eau", "«\u202FOui\u202F»\u00A0: non\u202F! l’eau"},
@@ -67,6 +68,7 @@ TEST(InlineBuilderTest, EditsMoveLooksAndObjectsAlong)
     builder.Apply({{3, 3, u"-"}, {9, 3, u"!"}});
     InlineText const text = builder.Finish();
     EXPECT_EQ(ToUtf8(text.m_Text), "one-two!x");
-    EXPECT_EQ(text.m_Spans, (std::vector<Span>{{0, 4, Mark::None, -1}, {4, 4, Mark::Emphasis, -1}, {8, 1, Mark::None, -1}}));
+    EXPECT_EQ(text.m_Spans,
+              (std::vector<Span>{{0, 4, Mark::None, -1}, {4, 4, Mark::Emphasis, -1}, {8, 1, Mark::None, -1}}));
     EXPECT_EQ(text.m_Objects, (std::vector<InlineObject>{{8, ObjectKind::Anchor, 7}}));
 }

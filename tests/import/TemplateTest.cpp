@@ -27,12 +27,31 @@ TEST(TemplateTest, ShippedTemplatesHaveNoMessagesAndEveryStyleThatTextUses)
         auto const read = ReadTemplate(*path, messages);
         ASSERT_TRUE(read) << Describe(messages);
         EXPECT_EQ(Describe(messages), "");
-        for (char const * style : {StyleName::Body, StyleName::First, StyleName::ChapterTitle, StyleName::PartTitle, "Heading 1",
-                                   "Heading 6", StyleName::Quotation, StyleName::ListItem, StyleName::LooseListItem, StyleName::Code,
-                                   StyleName::Figure, StyleName::Caption, StyleName::FileName, StyleName::Rule, StyleName::TableText,
-                                   StyleName::TableHead, StyleName::MarkedBox, StyleName::BookTitle, StyleName::BookSubtitle,
-                                   StyleName::BookAuthor, Story::StyleSheet::NotesHeadingStyle, Story::StyleSheet::NoteTextStyle,
-                                   Story::StyleSheet::MissingPictureStyle, "Running head", "Folio"}) {
+        for (char const * style : {StyleName::Body,
+                                   StyleName::First,
+                                   StyleName::ChapterTitle,
+                                   StyleName::PartTitle,
+                                   "Heading 1",
+                                   "Heading 6",
+                                   StyleName::Quotation,
+                                   StyleName::ListItem,
+                                   StyleName::LooseListItem,
+                                   StyleName::Code,
+                                   StyleName::Figure,
+                                   StyleName::Caption,
+                                   StyleName::FileName,
+                                   StyleName::Rule,
+                                   StyleName::TableText,
+                                   StyleName::TableHead,
+                                   StyleName::MarkedBox,
+                                   StyleName::BookTitle,
+                                   StyleName::BookSubtitle,
+                                   StyleName::BookAuthor,
+                                   Story::StyleSheet::NotesHeadingStyle,
+                                   Story::StyleSheet::NoteTextStyle,
+                                   Story::StyleSheet::MissingPictureStyle,
+                                   "Running head",
+                                   "Folio"}) {
             EXPECT_TRUE(read->m_Settings.m_Styles->FindParagraphStyle(style)) << style;
         }
         // A line of text holds 60 to 75 characters at 0.42 to 0.53 of the size each, so 26 to 36 times the size.
@@ -57,7 +76,8 @@ outside = "30mm"
 [[master.body.running]]
 text = "Page {page}"
 align = "outside"
-)", "t.toml", messages);
+)",
+                                       "t.toml", messages);
     ASSERT_TRUE(read) << Describe(messages);
     auto const & body = read->m_Settings.m_Masters.front();
     double const mm = 72 / 25.4;
