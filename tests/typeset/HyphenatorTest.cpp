@@ -104,7 +104,7 @@ TEST(HyphenPatternsTest, WordsAreDividedAsLibhyphenDividesThem)
             char marks[520] = {};
             error = U_ZERO_ERROR;
             int const length = ucnv_fromUChars(converter, bytes, 500, word.data(), static_cast<int>(word.size()), &error);
-            if (U_FAILURE(error) || word.size() < 4) {
+            if (U_FAILURE(error) || word.size() < 4 || word.size() > HyphenPatterns::LongestWord) {
                 continue; // Not a word that the dictionary could know.
             }
             char ** replacements = nullptr;
@@ -112,7 +112,7 @@ TEST(HyphenPatternsTest, WordsAreDividedAsLibhyphenDividesThem)
             int * cuts = nullptr;
             hnj_hyphen_hyphenate3(dictionary, bytes, length, marks, nullptr, &replacements, &positions, &cuts, 1, 1, 1,
                                   1);
-            std::vector<bool> const found = patterns.Find(word);
+            auto const found = patterns.Find(word);
             std::u16string ours;
             std::u16string theirs;
             for (std::size_t i = 0; i < word.size(); ++i) {

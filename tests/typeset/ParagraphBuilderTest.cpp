@@ -1,9 +1,12 @@
 #include "framework/typeset/ParagraphBuilder.h"
 
+#include "framework/typeset/FontLibrary.h"
+#include "framework/typeset/ShapingContext.h"
 #include "typeset/TypesetSupport.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <hb.h>
 
 #include <cmath>
 
@@ -368,4 +371,62 @@ TEST(ParagraphBuilderTest, WhatCannotBeSetIsReported)
     EXPECT_EQ(3U, paragraph.m_Arena.m_Problems[1].m_Position);
     EXPECT_EQ(U'\U0010FFFD', paragraph.m_Arena.m_Problems[1].m_Character);
     EXPECT_TRUE(paragraph.m_Arena.m_Glyphs.back().m_Flags & PlacedGlyph::Missing);
+}
+
+TEST(ParagraphBuilderTest, TextCutIntoWordsLooksAsIfShapedInOneGo)
+{
+    std::vector<std::u16string> texts = ReadCorpus("prose-variation");
+    texts.resize(std::min<std::size_t>(texts.size(), 300));
+    texts.push_back(rabbits);
+    texts.push_back(u"AV To Wave, “Ta” f. (f) To, V. A quick fjord of officers");
+    struct Case
+    {
+        char const * m_Family;
+        bool m_Italic;
+        ShapingMode m_Mode; ///< How this font's text is cut.
+    };
+    for (Case const & row : {Case{"EB Garamond", false, ShapingMode::Words},
+                             Case{"EB Garamond", true, ShapingMode::SpacedWords}, // Forms at the ends of words.
+                             Case{"Liberation Serif", false, ShapingMode::SpacedWords}, // Kerned spaces.
+                             Case{"Liberation Serif", true, ShapingMode::SpacedWords},
+                             Case{"Linux Libertine O", false, ShapingMode::Words}}) {
+        SetParagraph paragraph;
+        paragraph.m_Style.m_Families = {row.m_Family};
+        paragraph.m_Style.m_Italic = row.m_Italic;
+        paragraph.m_Settings.m_Width = 1e6;
+        paragraph.m_Settings.m_Alignment = Alignment::Start;
+        Kernel::Counted<FontFace const> const face =
+            FontLibrary::GetInstance().Find(row.m_Family, 400, row.m_Italic).m_Face;
+        hb_buffer_t * buffer = hb_buffer_create();
+        ShapingContext const context(face, {}, HB_SCRIPT_LATIN, hb_language_from_string("en", -1), false, buffer);
+        EXPECT_EQ(row.m_Mode, context.GetMode()) << row.m_Family;
+        for (std::u16string text : texts) {
+            text.erase(text.find_last_not_of(u' ') + 1);
+            paragraph.Set(text);
+            if (paragraph.m_Arena.m_Faces.size() != 1) {
+                continue; // Characters that this font has not.
+            }
+            hb_buffer_clear_contents(buffer);
+            hb_buffer_add_utf16(buffer, reinterpret_cast<std::uint16_t const *>(text.data()),
+                                static_cast<int>(text.size()), 0, -1);
+            hb_buffer_set_direction(buffer, HB_DIRECTION_LTR);
+            hb_buffer_set_script(buffer, HB_SCRIPT_LATIN);
+            hb_buffer_set_language(buffer, hb_language_from_string("en", -1));
+            hb_shape(face->GetHbFont(), buffer, nullptr, 0);
+            unsigned count = 0;
+            hb_glyph_info_t const * infos = hb_buffer_get_glyph_infos(buffer, &count);
+            hb_glyph_position_t const * positions = hb_buffer_get_glyph_positions(buffer, &count);
+            ASSERT_EQ(count, paragraph.m_Arena.m_Glyphs.size()) << ToUtf8(text);
+            double ours = 0;
+            double theirs = 0;
+            for (unsigned i = 0; i < count; ++i) {
+                ASSERT_EQ(infos[i].codepoint, paragraph.m_Arena.m_Glyphs[i].m_Glyph)
+                    << row.m_Family << " at " << i << " of " << ToUtf8(text);
+                ours += paragraph.m_Arena.m_Glyphs[i].m_Advance;
+                theirs += positions[i].x_advance * 10.5 / face->GetUnitsPerEm();
+                ASSERT_NEAR(theirs, ours, 0.02) << row.m_Family << " at " << i << " of " << ToUtf8(text);
+            }
+        }
+        hb_buffer_destroy(buffer);
+    }
 }

@@ -275,28 +275,27 @@ SpaceUse FontFace::FindSpaceUse() const
         HB_TAG('c', 'a', 'l', 't'), HB_TAG('r', 'l', 'i', 'g'), HB_TAG('r', 'c', 'l', 't'), HB_TAG('s', 'm', 'c', 'p'),
         HB_TAG('c', '2', 's', 'c'), HB_TAG('k', 'e', 'r', 'n'), HB_TAG('d', 'i', 's', 't'), HB_TAG_NONE};
     hb_set_t * lookups = hb_set_create();
-    hb_set_t * glyphs = hb_set_create();
-    auto const takesPart = [&](hb_tag_t table) {
+    hb_set_t * input = hb_set_create();
+    hb_set_t * context = hb_set_create();
+    SpaceUse use = SpaceUse::None;
+    for (hb_tag_t const table : {HB_OT_TAG_GSUB, HB_OT_TAG_GPOS}) {
         hb_set_clear(lookups);
         hb_ot_layout_collect_lookups(m_HbFace, table, nullptr, nullptr, features.data(), lookups);
         hb_codepoint_t lookup = HB_SET_VALUE_INVALID;
-        while (hb_set_next(lookups, &lookup)) {
-            hb_set_clear(glyphs);
-            hb_ot_layout_lookup_collect_glyphs(m_HbFace, table, lookup, glyphs, glyphs, glyphs, nullptr);
-            if (hb_set_has(glyphs, space)) {
-                return true;
+        while (use != SpaceUse::Substitution && hb_set_next(lookups, &lookup)) {
+            hb_set_clear(input);
+            hb_set_clear(context);
+            hb_ot_layout_lookup_collect_glyphs(m_HbFace, table, lookup, context, input, context, nullptr);
+            if (hb_set_has(input, space) && table == HB_OT_TAG_GSUB) {
+                use = SpaceUse::Substitution;
+            } else if (hb_set_has(input, space) || hb_set_has(context, space)) {
+                use = SpaceUse::Neighbour;
             }
         }
-        return false;
-    };
-    SpaceUse use = SpaceUse::None;
-    if (takesPart(HB_OT_TAG_GSUB)) {
-        use = SpaceUse::Substitution;
-    } else if (takesPart(HB_OT_TAG_GPOS)) {
-        use = SpaceUse::Positioning;
     }
-    hb_set_destroy(lookups);
-    hb_set_destroy(glyphs);
+    for (hb_set_t * set : {lookups, input, context}) {
+        hb_set_destroy(set);
+    }
     return use;
 }
 

@@ -44,8 +44,8 @@ struct FaceMetrics
 enum class SpaceUse : std::uint8_t
 {
     None,
-    Positioning, ///< It is kerned.
-    Substitution ///< It is replaced, or decides what is: such text must be shaped with its spaces.
+    Neighbour,   ///< It is kerned, or decides how the letter beside it looks.
+    Substitution ///< It is replaced, perhaps together with others: such text must be shaped in one go.
 };
 
 /// Receives a glyph's outline in font units, y up.

@@ -220,18 +220,20 @@ void HyphenPatterns::Mark(Level const & level, std::u16string_view word, std::ui
         std::size_t m_At;
         std::uint64_t m_Hash;
     };
-    std::vector<Start> starts; // Of all patterns that may still be under way.
+    std::array<Start, LongestWord + 2> starts; // Of all patterns that may still be under way.
+    std::size_t count = 0;
     std::size_t const length = word.size() + 2;
     for (std::size_t at = 0; at < length; ++at) {
         bool const isEdge = at == 0 || at + 1 == length;
         char16_t const unit = isEdge || IsDigit(word[at - 1]) ? u'.' : word[at - 1];
-        starts.push_back({at, hashStart});
+        starts[count++] = {at, hashStart};
         // Only the longest pattern that ends here, or that has come this far, counts: the dictionaries are made so
         // that it holds what the shorter ones say.
         Slot const * longest = nullptr;
         std::size_t longestStart = 0;
         std::size_t kept = 0;
-        for (Start start : starts) {
+        for (std::size_t i = 0; i < count; ++i) {
+            Start start = starts[i];
             start.m_Hash = HashOn(start.m_Hash, unit);
             if (Slot const * slot = Look(level, start.m_Hash)) {
                 if (!longest) {
@@ -241,7 +243,7 @@ void HyphenPatterns::Mark(Level const & level, std::u16string_view word, std::ui
                 starts[kept++] = start;
             }
         }
-        starts.resize(kept);
+        count = kept;
         if (!longest || !longest->m_Values) {
             continue;
         }
@@ -255,13 +257,13 @@ void HyphenPatterns::Mark(Level const & level, std::u16string_view word, std::ui
     }
 }
 
-std::vector<bool> HyphenPatterns::Find(std::u16string_view word) const
+std::bitset<HyphenPatterns::LongestWord> HyphenPatterns::Find(std::u16string_view word) const
 {
     std::size_t const length = word.size();
-    std::vector<std::uint8_t> seams(length);
-    std::vector<std::uint8_t> inner(length);
-    std::vector<bool> found(length);
-    if (length == 0) {
+    std::array<std::uint8_t, LongestWord> seams;
+    std::array<std::uint8_t, LongestWord> inner;
+    std::bitset<LongestWord> found;
+    if (length == 0 || length > LongestWord) {
         return found;
     }
     Mark(m_Levels.front(), word, seams.data());

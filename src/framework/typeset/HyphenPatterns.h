@@ -1,5 +1,6 @@
 #pragma once
 
+#include <bitset>
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -19,8 +20,9 @@ public:
     [[nodiscard]] bool Load(std::string const & path);
 
     /// For each letter of a lower-case word: whether a hyphen may stand after it, the minima not considered.
-    /// Apostrophes are U+0027.
-    [[nodiscard]] std::vector<bool> Find(std::u16string_view word) const;
+    /// Apostrophes are U+0027. Nowhere in longer words.
+    static constexpr std::size_t LongestWord = 200;
+    [[nodiscard]] std::bitset<LongestWord> Find(std::u16string_view word) const;
 
     /// Least number of letters before and after a hyphen that the dictionary declares; 0 if it does not.
     [[nodiscard]] int GetLeftMinimum() const noexcept { return m_LeftMinimum; }

@@ -5,6 +5,7 @@
 #include <unicode/utf16.h>
 
 #include <algorithm>
+#include <array>
 #include <cctype>
 #include <cstdlib>
 #include <map>
@@ -107,15 +108,16 @@ Hyphenator const * Hyphenator::Get(String const & language)
 
 void Hyphenator::Hyphenate(std::u16string_view word, std::vector<std::uint16_t> & positions) const
 {
-    constexpr std::size_t longest = 200; // Longer strings are no words.
-    if (word.size() < static_cast<std::size_t>(m_LeftMinimum + m_RightMinimum) || word.size() > longest) {
+    if (word.size() < static_cast<std::size_t>(m_LeftMinimum + m_RightMinimum) ||
+        word.size() > HyphenPatterns::LongestWord) {
         return;
     }
     // One letter at a time, so that places in the lower-cased word lead back to the text.
-    std::u16string letters;
-    std::vector<std::uint16_t> starts; // Offset in the word of each letter.
+    std::array<char16_t, HyphenPatterns::LongestWord> letters;
+    std::array<std::uint16_t, HyphenPatterns::LongestWord> starts; // Offset in the word of each letter.
+    std::size_t count = 0;
     for (std::size_t i = 0; i < word.size();) {
-        starts.push_back(static_cast<std::uint16_t>(i));
+        starts[count] = static_cast<std::uint16_t>(i);
         UChar32 character = 0;
         U16_NEXT(word.data(), i, word.size(), character);
         character = character == 0x2019 ? '\'' : u_tolower(character);
@@ -125,21 +127,21 @@ void Hyphenator::Hyphenate(std::u16string_view word, std::vector<std::uint16_t> 
             // Polytonic Greek in a monotonic dictionary: accents do not matter to the syllables.
             UErrorCode error = U_ZERO_ERROR;
             UChar decomposed[8];
-            std::int32_t const count =
+            std::int32_t const length =
                 unorm2_getDecomposition(unorm2_getNFDInstance(&error), character, decomposed, 8, &error);
-            if (U_SUCCESS(error) && count > 0 && m_Patterns.Knows(decomposed[0])) {
+            if (U_SUCCESS(error) && length > 0 && m_Patterns.Knows(decomposed[0])) {
                 character = decomposed[0];
             }
         }
-        letters += static_cast<char16_t>(character);
+        letters[count++] = static_cast<char16_t>(character);
     }
-    std::vector<bool> const allowed = m_Patterns.Find(letters);
-    auto const count = static_cast<int>(letters.size());
-    for (int i = m_LeftMinimum; i + m_RightMinimum <= count; ++i) {
+    auto const allowed = m_Patterns.Find(std::u16string_view(letters.data(), count));
+    auto const left = static_cast<std::size_t>(m_LeftMinimum);
+    auto const right = static_cast<std::size_t>(m_RightMinimum);
+    for (std::size_t i = left; i + right <= count; ++i) {
         // Marks stay with their letter.
-        bool const beforeMark = u_charType(letters[static_cast<std::size_t>(i)]) == U_NON_SPACING_MARK;
-        if (allowed[static_cast<std::size_t>(i) - 1] && !beforeMark) {
-            positions.push_back(starts[static_cast<std::size_t>(i)]);
+        if (allowed[i - 1] && u_charType(letters[i]) != U_NON_SPACING_MARK) {
+            positions.push_back(starts[i]);
         }
     }
 }

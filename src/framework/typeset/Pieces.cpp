@@ -72,47 +72,63 @@ void PieceMaker::MakeWords(std::uint32_t index, std::vector<Piece> & pieces)
 {
     TextItem const & item = m_Items[index];
     ShapingContext & context = *item.m_Context;
-    std::int32_t trailKern = 0;
+    std::size_t const firstPiece = pieces.size();
+    m_Keys.clear();
     for (std::uint32_t at = item.m_Start; at < item.m_End;) {
         Piece & piece = pieces.emplace_back();
         piece.m_Start = at;
         piece.m_Item = index;
-        char16_t const first = m_Text[at];
+        piece.m_ShapeStart = at;
+        char16_t const first = m_Text[at++];
         if (IsWordSpace(first)) {
             while (at < item.m_End && m_Text[at] == first) {
                 ++at;
             }
             piece.m_Kind = Piece::Kind::Space;
-            piece.m_End = at;
+            m_Keys.push_back(0);
+        } else {
+            while (at < item.m_End && !IsWordSpace(m_Text[at])) {
+                ++at;
+            }
+            if (at - piece.m_Start <= longestWord) {
+                bool const spaceBefore = piece.m_Start > item.m_Start && IsWordSpace(m_Text[piece.m_Start - 1]);
+                m_Keys.push_back(context.GetKey(m_Text.substr(piece.m_Start, at - piece.m_Start), spaceBefore,
+                                                at < item.m_End));
+            } else {
+                at = static_cast<std::uint32_t>(EndOfStretch(m_Text, piece.m_Start, at));
+                m_Keys.push_back(0);
+            }
+        }
+        piece.m_End = at;
+    }
+
+    constexpr std::size_t ahead = 6;
+    double const spaceWidth = context.GetSpaceAdvance() * item.m_Scale + item.m_Tracking;
+    std::int32_t trailKern = 0;
+    for (std::size_t i = 0; i < m_Keys.size(); ++i) {
+        if (i + ahead < m_Keys.size()) {
+            context.BringNear(m_Keys[i + ahead]);
+        }
+        Piece & piece = pieces[firstPiece + i];
+        if (piece.m_Kind == Piece::Kind::Space) {
             piece.m_Clusters = piece.m_End - piece.m_Start;
-            piece.m_Width = piece.m_Clusters * (context.GetSpaceAdvance() * item.m_Scale + item.m_Tracking) +
-                            trailKern * item.m_Scale;
+            piece.m_Width = piece.m_Clusters * spaceWidth + trailKern * item.m_Scale;
             trailKern = 0;
             continue;
         }
-        std::uint32_t end = at + 1;
-        while (end < item.m_End && !IsWordSpace(m_Text[end])) {
-            ++end;
-        }
-        if (end - at <= longestWord) {
-            bool const spaceBefore = at > item.m_Start && IsWordSpace(m_Text[at - 1]);
-            bool const spaceAfter = end < item.m_End;
-            piece.m_Shape = context.GetWord(m_Text.substr(at, end - at), spaceBefore, spaceAfter, m_Scratch);
-            if (spaceBefore && piece.m_Shape->m_LeadKern) {
-                pieces[pieces.size() - 2].m_Width += piece.m_Shape->m_LeadKern * item.m_Scale;
-            }
-            trailKern = piece.m_Shape->m_TrailKern;
+        if (piece.m_End - piece.m_Start <= longestWord) {
+            piece.m_Shape = context.GetWord(m_Text.substr(piece.m_Start, piece.m_End - piece.m_Start), m_Keys[i],
+                                            m_Scratch);
         } else {
-            end = static_cast<std::uint32_t>(EndOfStretch(m_Text, at, end));
-            piece.m_Shape = context.ShapeStretch(m_Text, at, end, m_Scratch);
-            trailKern = 0;
+            piece.m_Shape = context.ShapeStretch(m_Text, piece.m_Start, piece.m_End, m_Scratch);
         }
-        piece.m_End = end;
-        piece.m_ShapeStart = at;
+        if (piece.m_Shape->m_LeadKern) {
+            pieces[firstPiece + i - 1].m_Width += piece.m_Shape->m_LeadKern * item.m_Scale;
+        }
+        trailKern = piece.m_Shape->m_TrailKern;
         piece.m_LastGlyph = piece.m_Shape->m_GlyphCount;
         piece.m_Clusters = piece.m_Shape->m_Clusters;
         piece.m_Width = piece.m_Shape->m_Width * item.m_Scale + piece.m_Clusters * item.m_Tracking;
-        at = end;
     }
 }
 

@@ -61,6 +61,7 @@ private:
     std::vector<TextItem> const & m_Items;
     BumpArena & m_Scratch;
     std::u16string m_Hyphenated;
+    std::vector<std::uint32_t> m_Keys; ///< Of the pieces of the item at work.
 };
 
 /// Goes through the clusters of a piece in the order of the text.

@@ -49,7 +49,7 @@ ShapingContext::ShapingContext(Kernel::Counted<FontFace const> face, std::vector
     case SpaceUse::None:
         m_Mode = ShapingMode::Words;
         break;
-    case SpaceUse::Positioning:
+    case SpaceUse::Neighbour:
         m_Mode = ShapingMode::SpacedWords;
         break;
     case SpaceUse::Substitution:
@@ -94,11 +94,20 @@ void ShapingContext::GrowTable()
     }
 }
 
-Shape * ShapingContext::GetWord(std::u16string_view word, bool spaceBefore, bool spaceAfter, BumpArena & scratch)
+std::uint32_t ShapingContext::GetKey(std::u16string_view word, bool spaceBefore, bool spaceAfter) const
 {
     bool const spaced = m_Mode == ShapingMode::SpacedWords;
-    bool const lead = spaced && spaceBefore;
-    bool const trail = spaced && spaceAfter;
+    unsigned const variant = (spaced && spaceBefore ? 1U : 0U) | (spaced && spaceAfter ? 2U : 0U);
+    // The variant is part of the key in whole, so that words that differ in it alone are told apart by the key.
+    std::uint32_t const key = (HashWord(word, variant) & ~3U) | variant;
+    __builtin_prefetch(&m_Slots[(key >> 2) & (m_Slots.size() - 1)]);
+    return key;
+}
+
+Shape * ShapingContext::GetWord(std::u16string_view word, std::uint32_t key, BumpArena & scratch)
+{
+    bool const lead = (key & 1) != 0;
+    bool const trail = (key & 2) != 0;
     auto const shapeInto = [&](BumpArena & arena) {
         if (!lead && !trail) {
             return Execute(word, 0, word.size(), 0, word.size(), arena);
@@ -117,13 +126,10 @@ Shape * ShapingContext::GetWord(std::u16string_view word, bool spaceBefore, bool
         return shapeInto(scratch);
     }
 
-    unsigned const variant = (lead ? 1U : 0U) | (trail ? 2U : 0U);
-    // The variant is part of the hash in whole, so that words that differ in it alone are told apart by the hash.
-    std::uint32_t const hash = (HashWord(word, variant) & ~3U) | variant;
     std::size_t const mask = m_Slots.size() - 1;
-    std::size_t at = (hash >> 2) & mask;
+    std::size_t at = (key >> 2) & mask;
     while (Shape * known = m_Slots[at].m_Shape) {
-        if (m_Slots[at].m_Hash == hash && known->m_Length == word.size() &&
+        if (m_Slots[at].m_Hash == key && known->m_Length == word.size() &&
             std::memcmp(known->GetText(), word.data(), word.size() * 2) == 0) {
             return known;
         }
@@ -132,7 +138,7 @@ Shape * ShapingContext::GetWord(std::u16string_view word, bool spaceBefore, bool
     Shape * made = shapeInto(m_Arena);
     std::memcpy(made->GetText(), word.data(), word.size() * 2);
     made->m_Cached = true;
-    m_Slots[at] = {hash, made};
+    m_Slots[at] = {key, made};
     if (++m_Used * 3 > m_Slots.size() * 2) {
         GrowTable();
     }
@@ -163,8 +169,8 @@ Shape * ShapingContext::Execute(std::u16string_view text, std::size_t start, std
     hb_glyph_position_t const * positions = hb_buffer_get_glyph_positions(m_Buffer, &count);
 
     // Room for the text behind the shape: a look-up in the cache then touches one place.
-    std::size_t const textShapes = (wordLength <= longestCachedWord ? wordLength * 2 : 0) / sizeof(Shape) + 1;
-    auto * shape = new (arena.Allocate<Shape>(1 + textShapes)) Shape;
+    std::size_t const textSize = wordLength <= longestCachedWord ? wordLength * sizeof(char16_t) : 0;
+    auto * shape = new (arena.Allocate<std::byte>(sizeof(Shape) + textSize)) Shape;
     auto * glyphs = arena.Allocate<ShapeGlyph>(count);
     std::uint32_t kept = 0;
     std::uint32_t lastCluster = 0xFFFFFFFF;

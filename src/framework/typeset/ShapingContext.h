@@ -16,7 +16,7 @@ namespace Typeset
 enum class ShapingMode : std::uint8_t
 {
     Words,       ///< Words by themselves, spaces apart.
-    SpacedWords, ///< Words together with the spaces beside them, which are kerned.
+    SpacedWords, ///< Words together with the spaces beside them, which matter to them.
     WholeRuns    ///< Everything at once.
 };
 
@@ -41,10 +41,19 @@ public:
     [[nodiscard]] char16_t GetHyphen() const noexcept { return m_Hyphen; }
     [[nodiscard]] std::int32_t GetHyphenAdvance() const noexcept { return m_HyphenAdvance; }
 
-    /// A word by itself, from the cache if it was met before. The flags tell of spaces beside it and count only in
-    /// the mode SpacedWords. Long strings are put into `scratch`, not into the cache. Valid as long as the arena that
-    /// it lies in.
-    [[nodiscard]] Shape * GetWord(std::u16string_view word, bool spaceBefore, bool spaceAfter, BumpArena & scratch);
+    /// Key of a word among those that were shaped. The flags tell of spaces beside it and count only in the mode
+    /// SpacedWords. Starts to bring what is known of the word near: ask for keys first, for words afterwards.
+    [[nodiscard]] std::uint32_t GetKey(std::u16string_view word, bool spaceBefore, bool spaceAfter) const;
+    /// The second step of bringing near, worth taking a few words ahead.
+    void BringNear(std::uint32_t key) const { __builtin_prefetch(m_Slots[(key >> 2) & (m_Slots.size() - 1)].m_Shape); }
+
+    /// A word by itself, from the cache if it was met before. Long strings are put into `scratch`, not into the cache.
+    /// Valid as long as the arena that it lies in.
+    [[nodiscard]] Shape * GetWord(std::u16string_view word, std::uint32_t key, BumpArena & scratch);
+    [[nodiscard]] Shape * GetWord(std::u16string_view word, bool spaceBefore, bool spaceAfter, BumpArena & scratch)
+    {
+        return GetWord(word, GetKey(word, spaceBefore, spaceAfter), scratch);
+    }
 
     /// The stretch [start, end) of a text with what stands around it as context (joining scripts need it).
     [[nodiscard]] Shape * ShapeStretch(std::u16string_view text, std::size_t start, std::size_t end,
