@@ -20,7 +20,6 @@ pkg_check_modules(deflate REQUIRED IMPORTED_TARGET libdeflate)
 pkg_check_modules(cmarkgfm REQUIRED IMPORTED_TARGET libcmark-gfm)
 pkg_check_modules(tomlplusplus REQUIRED IMPORTED_TARGET tomlplusplus)
 
-find_library(KORVANE_HYPHEN hyphen REQUIRED)
 find_library(KORVANE_CMARK_EXTENSIONS cmark-gfm-extensions REQUIRED)
 find_package(CLI11 REQUIRED)
 find_package(nlohmann_json REQUIRED)
