@@ -34,81 +34,88 @@ constexpr unsigned short FormatVersion = 1;
 constexpr char const * ItemName = "doc.dat";
 
 /// The result code of a save for a reason why the target could not be created.
-int SaveResultFor(Kernel::Archive::CreateResult const & result)
+enum DocumentSaveResult::Result SaveResultFor(Kernel::Archive::CreateResult const & result)
 {
-    switch (static_cast<int>(result.m_Code)) {
-    case 1:
-        return 20;
-    case 2:
-        return 28;
-    case 3:
-        return 27;
-    case 4:
-        return 30;
-    case 5:
-        return 29;
-    case 6:
-        return 2;
-    case 10:
-        return 21;
-    case 11:
-        return 22;
-    case 12:
-        return 23;
-    case 16:
-        return 40;
-    case 17:
-        return 41;
-    case 18:
-        return 42;
-    case 19:
-        return 3;
-    case 20:
-        return 43;
-    default:
-        return 44;
+    using Code = Kernel::Archive::CreateResult::Code;
+    switch (result.m_Code) {
+    case Code::Unknown:
+        return DocumentSaveResult::CannotCreate;
+    case Code::FolderMissing:
+        return DocumentSaveResult::FolderMissing;
+    case Code::Locked:
+        return DocumentSaveResult::LockedByOther;
+    case Code::IsFolder:
+        return DocumentSaveResult::BadName;
+    case Code::NameTooLong:
+        return DocumentSaveResult::NameTooLong;
+    case Code::OutOfMemory:
+        return DocumentSaveResult::OutOfMemory;
+    case Code::AccessDenied:
+        return DocumentSaveResult::AccessDenied;
+    case Code::PermissionDenied:
+        return DocumentSaveResult::PermissionDenied;
+    case Code::ReadOnlyVolume:
+        return DocumentSaveResult::ReadOnlyDevice;
+    case Code::TooManyOpenFiles:
+        return DocumentSaveResult::TooManyOpenFiles;
+    case Code::QuotaExceeded:
+        return DocumentSaveResult::QuotaUsedUp;
+    case Code::Busy:
+        return DocumentSaveResult::Busy;
+    case Code::OutOfSpace:
+        return DocumentSaveResult::DiskFull;
+    case Code::DeviceError:
+        return DocumentSaveResult::DeviceError;
+    case Code::Success:
+        break;
     }
+    return DocumentSaveResult::Unknown;
 }
 
 /// For a failure with a file while the item was stored.
-int SaveResultFor(Kernel::ArchiveFileException const & exception)
+enum DocumentSaveResult::Result SaveResultFor(Kernel::ArchiveFileException const & exception)
 {
-    switch (static_cast<int>(exception.GetReason())) {
-    case 0:
-    case 7:
-        return exception.GetWhatFile() == Kernel::ArchiveFileException::WhatFile::Read ? 15 : 10;
-    case 1:
-        return 3;
-    case 2:
-        return 4;
-    case 3:
-        return 5;
-    case 4:
-        return 22;
-    case 5:
-        return 21;
-    case 6:
-        return 27;
-    default:
-        return 44;
+    using Reason = Kernel::ArchiveFileException::Reason;
+    switch (exception.GetReason()) {
+    case Reason::Unknown:
+    case Reason::DeviceError:
+        return exception.GetWhatFile() == Kernel::ArchiveFileException::WhatFile::Read
+                   ? DocumentSaveResult::SourceDamaged
+                   : DocumentSaveResult::WriteFailed;
+    case Reason::OutOfSpace:
+        return DocumentSaveResult::DiskFull;
+    case Reason::QuotaExceeded:
+        return DocumentSaveResult::QuotaExceeded;
+    case Reason::FileTooLarge:
+        return DocumentSaveResult::TooLarge;
+    case Reason::PermissionDenied:
+        return DocumentSaveResult::PermissionDenied;
+    case Reason::AccessDenied:
+        return DocumentSaveResult::AccessDenied;
+    case Reason::Locked:
+        return DocumentSaveResult::LockedByOther;
     }
+    return DocumentSaveResult::Unknown;
 }
 
-int SaveResultFor(Kernel::FileIOException const & exception)
+enum DocumentSaveResult::Result SaveResultFor(Kernel::FileIOException const & exception)
 {
-    switch (static_cast<int>(exception.GetReason())) {
-    case 1:
-    case 5:
-        return 10;
-    case 2:
-        return 21;
-    case 3:
-        return 22;
-    case 4:
-        return 3;
-    default:
-        return 44;
+    using Reason = Kernel::FileIOException::Reason;
+    switch (exception.GetReason()) {
+    case Reason::WriteFailed:
+    case Reason::DeviceError:
+        return DocumentSaveResult::WriteFailed;
+    case Reason::AccessDenied:
+        return DocumentSaveResult::AccessDenied;
+    case Reason::PermissionDenied:
+        return DocumentSaveResult::PermissionDenied;
+    case Reason::OutOfSpace:
+        return DocumentSaveResult::DiskFull;
+    case Reason::Unknown:
+    case Reason::ReadFailed:
+        break;
     }
+    return DocumentSaveResult::Unknown;
 }
 
 void SetOtherArchive(DocumentSaveResult & result, Kernel::Counted<Kernel::Archive const> const & archive)
@@ -266,7 +273,7 @@ void BookController::SaveBookAsCopy(DocumentSaveResult & result, String const & 
     auto const archive = Kernel::Archive::CreateWithTemporary(path, FileType, created);
     if (!archive) {
         result.SetConcernsFile(true);
-        result.SetResult(static_cast<enum DocumentSaveResult::Result>(SaveResultFor(created)), created.m_Text);
+        result.SetResult(SaveResultFor(created), created.m_Text);
         return;
     }
     try {
@@ -287,8 +294,7 @@ void BookController::SaveBookAsCopy(DocumentSaveResult & result, String const & 
     } catch (Kernel::ArchiveFileException const & exception) {
         result.SetConcernsFile(true);
         if (exception.GetArchive() == archive) {
-            result.SetResult(static_cast<enum DocumentSaveResult::Result>(SaveResultFor(exception)),
-                             exception.GetMessage());
+            result.SetResult(SaveResultFor(exception), exception.GetMessage());
             SetOtherArchive(result, exception.GetArchiveOther());
         } else {
             result.SetResult(DocumentSaveResult::OtherArchive, exception.GetMessage());
@@ -297,11 +303,10 @@ void BookController::SaveBookAsCopy(DocumentSaveResult & result, String const & 
         return;
     } catch (Kernel::FileIOException const & exception) {
         result.SetConcernsFile(true);
-        result.SetResult(static_cast<enum DocumentSaveResult::Result>(SaveResultFor(exception)),
-                         exception.GetMessage());
+        result.SetResult(SaveResultFor(exception), exception.GetMessage());
         return;
     } catch (std::bad_alloc const &) {
-        result.SetResult(2);
+        result.SetResult(DocumentSaveResult::OutOfMemory);
         return;
     } catch (Kernel::Exception const & exception) {
         result.SetResult(DocumentSaveResult::ItemFailed, exception.GetMessage());

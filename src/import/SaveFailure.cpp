@@ -12,9 +12,8 @@ char const * ReasonOf(int result)
 {
     switch (result) {
     case DocumentSaveResult::AccessDenied:
+    case DocumentSaveResult::PermissionDenied:
         return "access is denied";
-    case DocumentSaveResult::CannotReplace:
-        return "the old file cannot be replaced";
     case DocumentSaveResult::LockedByOther:
         return "another program has it open";
     case DocumentSaveResult::FolderMissing:
@@ -24,17 +23,24 @@ char const * ReasonOf(int result)
     case DocumentSaveResult::DiskFull:
         return "the disk is full";
     case DocumentSaveResult::QuotaExceeded:
+    case DocumentSaveResult::QuotaUsedUp:
         return "your share of the disk is used up";
+    case DocumentSaveResult::TooLarge:
+        return "it is too large for the disk";
     case DocumentSaveResult::ReadOnlyDevice:
         return "the disk is read-only";
-    case DocumentSaveResult::NoDevice:
-        return "the disk is gone";
     case DocumentSaveResult::NameTooLong:
         return "its name is too long";
-    case DocumentSaveResult::Interrupted:
-        return "the work was interrupted";
+    case DocumentSaveResult::BadName:
+        return "its name is that of a folder";
+    case DocumentSaveResult::TooManyOpenFiles:
+        return "too many files are open";
+    case DocumentSaveResult::OutOfMemory:
+        return "there is not enough memory";
+    case DocumentSaveResult::Busy:
+        return "the disk is busy";
     case DocumentSaveResult::WriteFailed:
-    case DocumentSaveResult::CannotFlush:
+    case DocumentSaveResult::DeviceError:
         return "writing failed";
     default:
         return "the reason is not known";
@@ -51,7 +57,7 @@ std::string DescribeSaveFailure(DocumentSaveResult const & result, std::string c
         return text.ends_with('.') ? text : text + ".";
     }
     text += ReasonOf(result.GetResult());
-    if (DocumentSaveResult::Unknown == result.GetResult() || DocumentSaveResult::OtherReason == result.GetResult()) {
+    if (DocumentSaveResult::Unknown == result.GetResult()) {
         text += " (code " + std::to_string(result.GetResult()) + ")";
     }
     return text + ".";

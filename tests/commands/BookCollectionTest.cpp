@@ -1,0 +1,106 @@
+#include "core/BookCollection.h"
+#include "commands/EngageBookLockCommand.h"
+#include "commands/UpdateChapterSettingsCommand.h"
+#include "core/BookNotification.h"
+#include "framework/document/CloseDocumentCommand.h"
+#include "framework/document/VantraController.h"
+#include "support/BookBuilder.h"
+#include "support/NotificationRecorder.h"
+
+#include <gtest/gtest.h>
+
+using namespace Book;
+using Kernel::Counted;
+using Kernel::MakeCounted;
+
+namespace
+{
+
+class BookCollectionTest : public testing::Test
+{
+protected:
+    BookCollectionTest() { m_Collection.SetUpdatePageNumbersAutomatically(false); }
+    ~BookCollectionTest() override { m_Collection.SetUpdatePageNumbersAutomatically(true); }
+
+    BookCollection & m_Collection = BookCollection::GetInstance();
+    BookBuilder m_Builder;
+};
+
+}
+
+TEST_F(BookCollectionTest, RegistersABookOnceAndForgetsItWhole)
+{
+    auto const book = MakeCounted<BookController>();
+    book->SetPath("/books/one.kvbook");
+    int const before = m_Collection.GetNumberOfActiveBookControllers();
+    m_Collection.AddBookController(book);
+    m_Collection.AddBookController(book);
+    EXPECT_EQ(m_Collection.GetNumberOfActiveBookControllers(), before + 1);
+    EXPECT_EQ(m_Collection.GetActiveBookController(before), Counted<BookController const>(book));
+    EXPECT_EQ(m_Collection.GetActiveBookController(-1), nullptr);
+    EXPECT_EQ(m_Collection.GetActiveBookController(before + 1), nullptr);
+    EXPECT_EQ(m_Collection.GetMutableBookController(book), book);
+    EXPECT_EQ(m_Collection.GetBookFromPath("/books/one.kvbook"), Counted<BookController const>(book));
+    EXPECT_EQ(m_Collection.GetBookFromPath("/books/ONE.kvbook"), nullptr);
+    m_Collection.SetUIActiveBookController(book);
+    m_Collection.RemoveBookController(book);
+    EXPECT_EQ(m_Collection.GetMutableBookController(book), nullptr);
+    EXPECT_EQ(m_Collection.GetNumberOfActiveBookControllers(), before);
+    book->AddChapter("/nowhere/a.kvdoc", -1);
+    EXPECT_FALSE(m_Collection.IsInBook(String("/nowhere/a.kvdoc"))) << "nor is it in front any more";
+    EXPECT_FALSE(m_Collection.UpdateChapter(book, String("/nowhere/a.kvdoc")));
+    m_Collection.EnqueueCommand(MakeCounted<EngageBookLockCommand>(true), book);
+}
+
+TEST_F(BookCollectionTest, ADocumentBelongsToTheBookInFrontOrTheLastCommandedOne)
+{
+    String const path = m_Builder.WriteChapter("a.kvdoc");
+    auto const first = m_Builder.NewBook({path});
+    auto const second = m_Builder.NewBook({path});
+    OpenDocumentFailedNotification failure(path, true);
+    Counted<DocumentController const> const document = VantraController::GetInstance().OpenDocument(path, failure);
+    ASSERT_TRUE(document);
+    BookBuilder::Rest();
+
+    BookBuilder::Run(first, MakeCounted<EngageBookLockCommand>(false));
+    EXPECT_EQ(m_Collection.GetBookFromDocument(document), Counted<BookController const>(first));
+    m_Collection.SetUIActiveBookController(second);
+    EXPECT_EQ(m_Collection.GetBookFromDocument(document), Counted<BookController const>(second));
+    EXPECT_TRUE(m_Collection.IsInBook(document));
+    EXPECT_EQ(m_Collection.GetBookFromDocument(nullptr), nullptr);
+
+    // A book command that somebody meant for the document runs on that book.
+    Counted<BookChapter const> const chapter = second->GetChapterAtIndex(0);
+    EXPECT_TRUE(m_Collection.HandleCommand(document, MakeCounted<UpdateChapterSettingsCommand>(chapter, false, 17)));
+    BookBuilder::Rest();
+    EXPECT_EQ(chapter->GetStartFromPage(), 17);
+
+    m_Collection.SetPasswordForGuid("guid", "secret", document);
+    EXPECT_EQ(m_Collection.GetPasswordForGuid("guid", document), "secret");
+    EXPECT_EQ(first->GetChapterAtIndex(0)->GetPassword("guid"), "");
+    m_Collection.SetUIActiveBookController(nullptr);
+    VantraController::GetInstance().EnqueueCommandAndWait(
+        MakeCounted<CloseDocumentCommand>(document, nullptr, false, false));
+}
+
+TEST_F(BookCollectionTest, TellsWhichBookIsCurrentAndStoresNothing)
+{
+    auto const book = m_Builder.NewBook();
+    book->SetPath("/books/current.kvbook");
+    NotificationRecorder recorder;
+    m_Collection.SetActiveBookController("/books/none.kvbook");
+    m_Collection.SetActiveBookController("/books/current.kvbook");
+    auto const told = recorder.All<CurrentBookChangedNotification>();
+    ASSERT_EQ(told.size(), 1u);
+    EXPECT_EQ(told[0]->GetBookController(), Counted<BookController const>(book));
+}
+
+TEST_F(BookCollectionTest, AClosedBookTakesNoCommands)
+{
+    auto const book = m_Builder.NewBook({m_Builder.WriteChapter("a.kvdoc")});
+    Counted<BookChapter const> const chapter = book->GetChapterAtIndex(0);
+    m_Collection.DisableCommandEnqueueAndEmpty(book);
+    m_Collection.EnqueueCommand(MakeCounted<UpdateChapterSettingsCommand>(chapter, false, 17), book);
+    BookBuilder::Rest();
+    EXPECT_NE(chapter->GetStartFromPage(), 17);
+}
