@@ -1,7 +1,6 @@
 #pragma once
 
 #include "framework/document/DocumentCommand.h"
-#include "framework/kernel/ClassProperties.h"
 
 namespace Book
 {
@@ -20,7 +19,15 @@ public:
     void Notify(std::vector<Kernel::Counted<Kernel::Notification>> &) override {}
     [[nodiscard]] bool ShouldStackForUndo() const override { return false; }
 
+    void Save(Kernel::OutSerialiser &) const override {}
+    bool Load(Kernel::InSerialiser const &, Kernel::FileStore &, unsigned short) override { return true; }
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
+    static Kernel::ClassProperties const & GetTypeClassProperties();
+    static Kernel::Counted<Kernel::Serialisable> CreateObject();
+
 private:
+    static Kernel::ClassProperties const ms_ClassProperties;
+
     bool const m_Engage;
 };
 

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cxxabi.h>
 #include <memory>
+#include <thread>
 #include <typeinfo>
 
 namespace
@@ -38,16 +39,32 @@ void NotificationRecorder::Notify(Kernel::Counted<Kernel::Notification> notifica
     m_Notifications.push_back(std::move(notification));
 }
 
-std::vector<Kernel::Counted<Kernel::Notification>> NotificationRecorder::Rested()
+namespace
+{
+
+/// A question that waits for its answer ends the wait for rest early: what was posted by then has to be delivered all
+/// the same.
+void WaitForDelivery()
 {
     VantraController::GetInstance().WaitUntilIdle();
+    std::uint64_t const posted = BroadcastNotification::LastPostingNumber();
+    while (BroadcastNotification::DeliveredUpTo() < posted) {
+        std::this_thread::yield();
+    }
+}
+
+}
+
+std::vector<Kernel::Counted<Kernel::Notification>> NotificationRecorder::Rested()
+{
+    WaitForDelivery();
     std::lock_guard const lock(m_Lock);
     return m_Notifications;
 }
 
 void NotificationRecorder::Clear()
 {
-    VantraController::GetInstance().WaitUntilIdle();
+    WaitForDelivery();
     std::lock_guard const lock(m_Lock);
     m_Notifications.clear();
 }
