@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <hyphen.h>
 #include <unicode/uchar.h>
 #include <unicode/ucnv.h>
@@ -112,6 +113,12 @@ TEST(HyphenPatternsTest, WordsAreDividedAsLibhyphenDividesThem)
             int * cuts = nullptr;
             hnj_hyphen_hyphenate3(dictionary, bytes, length, marks, nullptr, &replacements, &positions, &cuts, 1, 1, 1,
                                   1);
+            for (std::size_t i = 0; replacements && i < static_cast<std::size_t>(length); ++i) {
+                std::free(replacements[i]);
+            }
+            std::free(replacements);
+            std::free(positions);
+            std::free(cuts);
             auto const found = patterns.Find(word);
             std::u16string ours;
             std::u16string theirs;
