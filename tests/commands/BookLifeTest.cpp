@@ -160,7 +160,8 @@ TEST(BookCommandTest, LeavesNoTraceInAStreamAndIsKnownByName)
             << row.m_Name;
         EXPECT_FALSE(command->ShouldStackForUndo()) << row.m_Name;
         EXPECT_EQ(command->GetDomainController(), nullptr) << row.m_Name << " has no book before it is dequeued";
-        char const * const name = CommandCoverage::Instance().FindName(typeid(*command));
+        BookCommand const & typed = *command;
+        char const * const name = CommandCoverage::Instance().FindName(typeid(typed));
         EXPECT_STREQ(name, row.m_Name);
     }
     EXPECT_EQ(CommandCoverage::Instance().FindName(typeid(UpdateChaptersCommand)), nullptr);
