@@ -1,5 +1,6 @@
 #include "commands/AddChapterCommand.h"
 #include "content/SetMasterIndexCommand.h"
+#include "core/BookCollection.h"
 #include "core/BookController.h"
 #include "framework/document/DocumentController.h"
 #include "framework/document/DocumentNode.h"
@@ -57,7 +58,15 @@ private:
     Kernel::Counted<DocumentController> m_Document;
 };
 
-TEST(IndexReconciliationTest, TheFirstChapterMakesTheMasterAndOthersJoinByName)
+/// Chapters are opened by the tests alone, not by renumbering behind their backs.
+class IndexReconciliationTest : public testing::Test
+{
+protected:
+    void SetUp() override { BookCollection::GetInstance().SetUpdatePageNumbersAutomatically(false); }
+    void TearDown() override { BookCollection::GetInstance().SetUpdatePageNumbersAutomatically(true); }
+};
+
+TEST_F(IndexReconciliationTest, TheFirstChapterMakesTheMasterAndOthersJoinByName)
 {
     BookBuilder builder;
     auto const book = builder.NewBook({builder.WriteChapter("a.kvdoc", {.m_Topics = {"Birds", "Birds!Pigeons"}}),
@@ -81,7 +90,7 @@ TEST(IndexReconciliationTest, TheFirstChapterMakesTheMasterAndOthersJoinByName)
     EXPECT_FALSE(book->IsInIndexUpdate());
 }
 
-TEST(IndexReconciliationTest, ReconcilingAgainChangesNothing)
+TEST_F(IndexReconciliationTest, ReconcilingAgainChangesNothing)
 {
     BookBuilder builder;
     auto const book = builder.NewBook({builder.WriteChapter("a.kvdoc", {.m_Topics = {"Birds!Pigeons!Fantails"}}),
@@ -97,7 +106,7 @@ TEST(IndexReconciliationTest, ReconcilingAgainChangesNothing)
     EXPECT_EQ(Topics(a.Index()).size(), topics);
 }
 
-TEST(IndexReconciliationTest, AMasterWithoutATopicTakesItFromTheChapters)
+TEST_F(IndexReconciliationTest, AMasterWithoutATopicTakesItFromTheChapters)
 {
     BookBuilder builder;
     auto const book = builder.NewBook({builder.WriteChapter("a.kvdoc", {.m_Topics = {"Birds", "Dogs"}})});

@@ -269,10 +269,10 @@ TEST(FlowComposerTest, ATableGoesOverWithItsHeader)
     AddLines(builder, "a", 1, "Body");
     AddObject(builder, MakeTable(7, 2, 1, 99, 0), "Body");
     AddLines(builder, "b", 1, "Body");
-    // Four rows fit, the header among them.
+    // Three rows fit, the header among them.
     auto const layout = Compose(*builder.Finish(), Frames(200, 60), {});
     EXPECT_EQ(Describe(*layout), "a1 r0c0 r0c1 r1c0 r1c1 r2c0 r2c1|"
-                                 "r0c0 r0c1 r3c0 r3c1 r4c0 r4c1 r5c0 r5c1|r0c0 r0c1 r6c0 r6c1 b1");
+                                 "r0c0 r0c1 r3c0 r3c1 r4c0 r4c1|r0c0 r0c1 r5c0 r5c1 r6c0 r6c1 b1");
     for (auto const & frame : layout->GetFrames()) {
         for (auto const & line : layout->GetLines(frame)) {
             EXPECT_LE(line.m_Baseline, 60);
