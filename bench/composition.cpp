@@ -87,7 +87,7 @@ std::vector<Counted<::Story::Story>> const & Chapters()
 {
     static auto const chapters = [] {
         char const * named = std::getenv("KORVANE_PROSE");
-        std::filesystem::path const folder = named ? named : "/work/shared/corpus/prose-variation";
+        std::filesystem::path const folder = named ? named : "../shared/corpus/prose-variation";
         std::vector<Counted<::Story::Story>> list;
         if (std::filesystem::is_directory(folder)) {
             for (auto const & entry : std::filesystem::directory_iterator(folder)) {
