@@ -13,6 +13,25 @@
 namespace Book
 {
 
+namespace
+{
+
+/// What is known of the finished file: its time, where the options fix it so that the same book gives the same bytes.
+ExportableInterface::ExportResult ResultFor(Kernel::Consolidated<Renderer::FileExportOptions> const & options,
+                                            String const & path)
+{
+    ExportableInterface::ExportResult result;
+    result.m_Path = path;
+    auto const pdf = Kernel::CountedCast<Renderer::FileExportOptionsPDF const>(options.GetCounted());
+    if (pdf && pdf->GetSettings().m_FixedTime) {
+        constexpr std::int64_t nanoseconds = 1'000'000'000;
+        result.m_Time = DocumentController::GetTimeText(Kernel::TimeStamp(*pdf->GetSettings().m_FixedTime * nanoseconds));
+    }
+    return result;
+}
+
+}
+
 ExportResult ExportBookCommand::EmbedMetadata(Kernel::Consolidated<Renderer::FileExportOptions> const & options,
                                               String const & path)
 {
@@ -33,7 +52,8 @@ ExportResult ExportBookCommand::EmbedMetadata(Kernel::Consolidated<Renderer::Fil
         Renderer::XmpFile file;
         if (file.Open(path)) {
             Kernel::Counted<DocumentMetadata const> const metadata = document->GetMetadata();
-            String const packet = metadata->GetCurrentXMPTreeForExport(document, nullptr, nullptr)->ToXML();
+            ExportableInterface::ExportResult const made = ResultFor(options, path);
+            String const packet = metadata->GetCurrentXMPTreeForExport(document, &made, nullptr)->ToXML();
             if (file.CanPut(packet)) {
                 file.Put(packet);
             }

@@ -73,7 +73,10 @@ TEST_F(ExportBookCommandTest, AllChaptersComeOutAsOneFile)
     EXPECT_NE(pdf.Text(4).find("Page 1"), std::string::npos) << "the second chapter's own first page";
     EXPECT_NE(pdf.Outline().find("First things -> page 1"), std::string::npos) << pdf.Outline();
     EXPECT_NE(pdf.Outline().find("Last things -> page 4"), std::string::npos) << pdf.Outline();
-    EXPECT_NE(pdf.Stream("Metadata").find("The whole"), std::string::npos) << "the key chapter's metadata";
+    std::string const metadata = pdf.Stream("Metadata");
+    EXPECT_NE(metadata.find("The whole"), std::string::npos) << "the key chapter's metadata";
+    EXPECT_NE(metadata.find("1970-01-01T00:00:01Z"), std::string::npos) << "at the time that the options fix";
+    EXPECT_EQ(metadata.find("Date=\"2"), std::string::npos) << metadata;
 }
 
 TEST_F(ExportBookCommandTest, AChapterThatIsGoneIsLeftOutOfTheFile)

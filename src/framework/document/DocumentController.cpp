@@ -304,7 +304,12 @@ String ToIsoTime(Kernel::TimeStamp time)
 
 String DocumentController::GetTimeText()
 {
-    return ToIsoTime(Kernel::Clock::Get().Now());
+    return GetTimeText(Kernel::Clock::Get().Now());
+}
+
+String DocumentController::GetTimeText(Kernel::TimeStamp time)
+{
+    return ToIsoTime(time);
 }
 
 namespace

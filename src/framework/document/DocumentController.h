@@ -87,8 +87,9 @@ public:
 
     /// Writes the document to a path that does not become its own; the document stays as dirty as it was.
     void SaveCopy(DocumentSaveResult & result, String const & path);
-    /// This moment, as metadata have it.
+    /// This moment, or another one, as metadata have it: UTC, to the second.
     [[nodiscard]] static String GetTimeText();
+    [[nodiscard]] static String GetTimeText(Kernel::TimeStamp time);
 
     /// Holds its file for the user alone, or lets others read it, for a document that comes in front or leaves it. False if
     /// others hold it as well: then it stays as it was. Under the writer lock.

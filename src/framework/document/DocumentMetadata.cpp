@@ -28,7 +28,7 @@ std::vector<String> SplitTags(std::string_view tags)
 }
 
 Kernel::Counted<XMPTree const> DocumentMetadata::GetCurrentXMPTreeForExport(Kernel::Counted<DocumentController const>,
-                                                                            ExportableInterface::ExportResult const *,
+                                                                            ExportableInterface::ExportResult const * result,
                                                                             Raster::ExportOptions const *) const
 {
     Kernel::Counted<XMPTree> const tree = Kernel::MakeCounted<XMPTree>();
@@ -45,8 +45,10 @@ Kernel::Counted<XMPTree const> DocumentMetadata::GetCurrentXMPTreeForExport(Kern
         add("pdf:Keywords", XMPTree::Form::Text, m_Values.m_Tags);
     }
     add("dc:language", XMPTree::Form::Bag, m_Values.m_Language);
-    add("xmp:CreateDate", XMPTree::Form::Text, m_Values.m_Created);
-    String const & changed = m_Values.m_Output.Empty() ? m_Values.m_Modified : m_Values.m_Output;
+    bool const isTimed = result && !result->m_Time.Empty();
+    String const & prepared = m_Values.m_Output.Empty() ? m_Values.m_Modified : m_Values.m_Output;
+    String const & changed = isTimed ? result->m_Time : prepared;
+    add("xmp:CreateDate", XMPTree::Form::Text, isTimed ? changed : m_Values.m_Created);
     add("xmp:ModifyDate", XMPTree::Form::Text, changed);
     add("xmp:MetadataDate", XMPTree::Form::Text, changed);
     add("xmp:CreatorTool", XMPTree::Form::Text, "Korvane Book");

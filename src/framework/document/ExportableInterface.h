@@ -43,6 +43,8 @@ public:
     {
         String m_Path;
         int m_PageCount = 0;
+        /// When it was made, UTC, as in 2026-11-21T06:30:00Z; empty: as the document was last prepared for output.
+        String m_Time;
     };
 
     /// Appends the pages. The caller holds the document's reader lock. `singlePages` divides spreads into their pages.

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "framework/kernel/Abortable.h"
 #include "framework/kernel/Counted.h"
 #include "framework/raster/ICCManager.h"
 #include "framework/render/FileExportOptions.h"
@@ -33,7 +34,7 @@ public:
     PdfSchema(Kernel::Counted<FileExportOptionsPDF const> options, bool * abort);
 
     [[nodiscard]] FileExportOptionsPDF const & GetOptions() const { return *m_Options; }
-    [[nodiscard]] bool IsAborted() const { return m_Abort && *m_Abort; }
+    [[nodiscard]] bool IsAborted() const { return Kernel::Abortable::IsFlagSet(m_Abort); }
 
 private:
     Kernel::Counted<FileExportOptionsPDF const> m_Options;
