@@ -2,8 +2,9 @@
 #include "app/BookFileLock.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
-#include "app/Verbs.h"
+#include "app/VerbList.h"
 #include "import/SourceText.h"
+#include "import/Text.h"
 
 #include <algorithm>
 
@@ -11,12 +12,24 @@ namespace App
 {
 
 namespace fs = std::filesystem;
+using Import::Text;
 
 namespace
 {
 
 constexpr char const * g_BookName = "book.kvbook";
 constexpr char const * g_DefaultTemplate = "novel";
+
+struct BuildOptions
+{
+    fs::path m_Folder;
+    /// Empty: what the manifest says, or FOLDER/NAME.pdf.
+    std::string m_Output;
+    std::string m_Template;
+    std::string m_Work;
+    bool m_IsForced = false;
+    long long m_FixedTime = -1;
+};
 
 /// One run of `korvane build`: the plan, the import, the book and its PDF, in that order.
 class Build
@@ -289,9 +302,30 @@ private:
 
 }
 
-int RunBuild(VerbContext & context, BuildOptions const & options)
+void AddBuildVerb(VerbList & verbs)
 {
-    return Build(context, options).Run();
+    auto const options = std::make_shared<BuildOptions>();
+    CLI::App & verb = verbs.Add("build", Text("Set a folder of Markdown chapters into a PDF", "Help"),
+                                "  korvane build docs/handbook -o handbook.pdf --template manual\n\n" +
+                                    Text("A second run takes only what has changed. Work in progress can be stopped "
+                                         "with Ctrl-C.",
+                                         "Help"),
+                                [options](VerbContext & context) { return Build(context, *options).Run(); });
+    verb.add_option("FOLDER", options->m_Folder,
+                    Text("Folder with book.toml, SUMMARY.md or Markdown files", "Help"))
+        ->required();
+    verb.add_option("-o,--output", options->m_Output,
+                    Text("The PDF; by default FOLDER/NAME.pdf, or what the manifest says", "Help"))
+        ->type_name("OUT.pdf");
+    verb.add_option("--template", options->m_Template,
+                    Text("Template by name (novel, manual, report) or a .toml file", "Help"))
+        ->type_name("NAME|FILE");
+    verb.add_option("--work", options->m_Work,
+                    Text("Folder for the documents in between; by default FOLDER/.korvane", "Help"))
+        ->type_name("DIR");
+    verb.add_flag("--force", options->m_IsForced, Text("Make the PDF anew even if nothing has changed", "Help"));
+    verbs.AddFixedTime(verb, options->m_FixedTime);
+    verbs.AddAnswers(verb);
 }
 
 }

@@ -1,5 +1,7 @@
 #include "app/Console.h"
 
+#include "import/Text.h"
+
 #include <algorithm>
 #include <ostream>
 #include <tuple>
@@ -15,10 +17,11 @@ constexpr int g_BarWidth = 30;
 
 }
 
-Console::Console(std::ostream & out, std::ostream & err, ConsoleSettings settings)
+Console::Console(std::ostream & out, std::ostream & err, ConsoleSettings settings, TerminalFacts terminal)
     : m_Out(out),
       m_Err(err),
-      m_Settings(settings)
+      m_Settings(settings),
+      m_Terminal(terminal)
 {
 }
 
@@ -87,7 +90,9 @@ void Console::Tell(Import::MessageList const & messages)
         Tell({Import::Severity::Note,
               std::get<1>(key),
               {std::get<0>(key)},
-              std::to_string(more) + " more of this kind (" + std::get<1>(key) + "); --json lists them all."});
+              Import::CountText("%1 more of this kind (%2); --json lists them all.",
+                                "%1 more of this kind (%2); --json lists them all.", "Program", more,
+                                std::get<1>(key))});
     }
 }
 
@@ -103,7 +108,7 @@ void Console::Progress(std::string const & step, double fraction)
         return;
     }
     int const percent = static_cast<int>(std::clamp(fraction, 0.0, 1.0) * 100);
-    if (!m_Settings.m_IsTerminal) {
+    if (!m_Terminal.m_HasProgress) {
         // Lines for logs: each step once.
         if (step != m_Step) {
             m_Step = step;

@@ -16,8 +16,17 @@ struct ConsoleSettings
     bool m_IsQuiet = false;
     /// The result is one JSON document on the output; nothing else goes there.
     bool m_IsJson = false;
+};
+
+/// What the program's streams lead to.
+struct TerminalFacts
+{
     /// The error stream is a terminal: progress is a bar that redraws itself.
-    bool m_IsTerminal = false;
+    bool m_HasProgress = false;
+    /// The output is a terminal that shows colours.
+    bool m_HasColour = false;
+    /// Columns of the output; 0 if it is no terminal, and lines may be as long as they like.
+    int m_Columns = 0;
 };
 
 /// What the program says to its user. Results go to the output, messages and progress to the error stream. Safe on any
@@ -25,10 +34,11 @@ struct ConsoleSettings
 class Console
 {
 public:
-    Console(std::ostream & out, std::ostream & err, ConsoleSettings settings);
+    Console(std::ostream & out, std::ostream & err, ConsoleSettings settings, TerminalFacts terminal);
     ~Console();
 
     [[nodiscard]] ConsoleSettings const & Settings() const { return m_Settings; }
+    [[nodiscard]] TerminalFacts const & Terminal() const { return m_Terminal; }
 
     /// A line of the result; nothing when the result is JSON or quiet.
     void Say(std::string const & line);
@@ -52,6 +62,7 @@ private:
     std::ostream & m_Out;
     std::ostream & m_Err;
     ConsoleSettings m_Settings;
+    TerminalFacts m_Terminal;
     std::string m_Step;
     int m_Percent = -1;
     bool m_HasBar = false;

@@ -2,17 +2,29 @@
 #include "app/BookFileLock.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
-#include "app/Verbs.h"
+#include "app/VerbList.h"
 #include "core/BookChapter.h"
 #include "framework/document/DocumentMetadata.h"
+#include "import/Text.h"
 
 namespace App
 {
 
 namespace fs = std::filesystem;
+using Import::Text;
 
 namespace
 {
+
+struct ExportOptions
+{
+    std::string m_Book;
+    std::string m_Output;
+    bool m_HasMarks = false;
+    bool m_IncludesBleed = false;
+    bool m_SkipsUpdates = false;
+    long long m_FixedTime = -1;
+};
 
 /// The language of the first chapter that names one.
 std::string LanguageOf(BookSession const & session)
@@ -24,8 +36,6 @@ std::string LanguageOf(BookSession const & session)
         }
     }
     return {};
-}
-
 }
 
 int RunExport(VerbContext & context, ExportOptions const & options)
@@ -93,6 +103,23 @@ int RunExport(VerbContext & context, ExportOptions const & options)
         console.Say("Wrote " + target.string() + ": " + std::to_string(pages) + " pages");
     }
     return isGood ? ExitFine : ExitFailed;
+}
+
+}
+
+void AddExportVerb(VerbList & verbs)
+{
+    auto const options = std::make_shared<ExportOptions>();
+    CLI::App & verb = verbs.Add("export", Text("Write a book (.kvbook) into a PDF", "Help"),
+                                "  korvane export my-book/.korvane/book.kvbook -o print.pdf --marks",
+                                [options](VerbContext & context) { return RunExport(context, *options); });
+    verb.add_option("BOOK", options->m_Book, Text("The book file", "Help"))->required();
+    verb.add_option("-o,--output", options->m_Output, Text("The PDF", "Help"))->required()->type_name("OUT.pdf");
+    verb.add_flag("--marks", options->m_HasMarks, Text("Crop marks round each page, with the bleed", "Help"));
+    verb.add_flag("--bleed", options->m_IncludesBleed, Text("Include the bleed", "Help"));
+    verb.add_flag("--no-update", options->m_SkipsUpdates, Text("Leave numbers and references as they are", "Help"));
+    verbs.AddFixedTime(verb, options->m_FixedTime);
+    verbs.AddAnswers(verb);
 }
 
 }

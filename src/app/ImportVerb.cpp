@@ -1,16 +1,25 @@
 #include "app/BookFileLock.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
-#include "app/Verbs.h"
+#include "app/VerbList.h"
 #include "import/Importer.h"
+#include "import/Text.h"
 
 namespace App
 {
 
 namespace fs = std::filesystem;
+using Import::Text;
 
 namespace
 {
+
+struct ImportOptions
+{
+    std::vector<std::string> m_Sources;
+    std::string m_Output;
+    std::string m_Template;
+};
 
 /// A plan of single files, in the order in which they were named.
 std::optional<Import::BookPlan> PlanFiles(std::vector<std::string> const & sources, Import::MessageList & messages)
@@ -31,8 +40,6 @@ std::optional<Import::BookPlan> PlanFiles(std::vector<std::string> const & sourc
         return std::nullopt;
     }
     return plan;
-}
-
 }
 
 int RunImport(VerbContext & context, ImportOptions const & options)
@@ -91,6 +98,22 @@ int RunImport(VerbContext & context, ImportOptions const & options)
         console.Say(chapter.m_Document.string() + (chapter.m_IsFresh ? "" : " (unchanged)"));
     }
     return isGood ? ExitFine : ExitFailed;
+}
+
+}
+
+void AddImportVerb(VerbList & verbs)
+{
+    auto const options = std::make_shared<ImportOptions>();
+    CLI::App & verb = verbs.Add("import", Text("Make chapter documents (.kvdoc) of Markdown", "Help"),
+                                "  korvane import chapter1.md chapter2.md -o documents",
+                                [options](VerbContext & context) { return RunImport(context, *options); });
+    verb.add_option("SOURCE", options->m_Sources, Text("Markdown files, or one folder", "Help"))->required();
+    verb.add_option("-o,--output", options->m_Output,
+                    Text("Folder for the documents; by default .korvane beside the first source", "Help"))
+        ->type_name("DIR");
+    verb.add_option("--template", options->m_Template, Text("Template by name or a .toml file", "Help"))
+        ->type_name("NAME|FILE");
 }
 
 }

@@ -1,10 +1,11 @@
 #include "app/BookSession.h"
 #include "app/DescribeDocument.h"
-#include "app/Verbs.h"
+#include "app/VerbList.h"
 #include "core/BookChapter.h"
 #include "framework/document/DocumentController.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/kernel/FileSystem.h"
+#include "import/Text.h"
 
 #include <fstream>
 
@@ -12,6 +13,7 @@ namespace App
 {
 
 namespace fs = std::filesystem;
+using Import::Text;
 
 namespace
 {
@@ -101,8 +103,6 @@ std::vector<std::string> Summarise(Json const & json)
     return lines;
 }
 
-}
-
 int RunShow(VerbContext & context, std::string const & file)
 {
     Import::MessageList messages;
@@ -161,6 +161,17 @@ int RunShow(VerbContext & context, std::string const & file)
         }
     }
     return isGood ? ExitFine : ExitFailed;
+}
+
+}
+
+void AddShowVerb(VerbList & verbs)
+{
+    auto const file = std::make_shared<std::string>();
+    CLI::App & verb = verbs.Add("show", Text("Tell what is in a book or document file", "Help"),
+                                "  korvane show my-book/.korvane/chapter1.kvdoc --json",
+                                [file](VerbContext & context) { return RunShow(context, *file); });
+    verb.add_option("FILE", *file, Text("A .kvbook or .kvdoc file", "Help"))->required();
 }
 
 }

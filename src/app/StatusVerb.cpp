@@ -1,7 +1,8 @@
 #include "app/BookSession.h"
 #include "app/Json.h"
-#include "app/Verbs.h"
+#include "app/VerbList.h"
 #include "core/BookChapter.h"
+#include "import/Text.h"
 
 #include <algorithm>
 
@@ -9,6 +10,7 @@ namespace App
 {
 
 namespace fs = std::filesystem;
+using Import::Text;
 
 namespace
 {
@@ -41,8 +43,6 @@ std::string Padded(std::string text, std::size_t width)
     }
     text.append(length < width ? width - length : 0, ' ');
     return text;
-}
-
 }
 
 int RunStatus(VerbContext & context, std::string const & file)
@@ -98,6 +98,18 @@ int RunStatus(VerbContext & context, std::string const & file)
         console.Say(line.substr(0, line.find_last_not_of(' ') + 1));
     }
     return isGood ? ExitFine : ExitFailed;
+}
+
+}
+
+void AddStatusVerb(VerbList & verbs)
+{
+    auto const book = std::make_shared<std::string>();
+    CLI::App & verb = verbs.Add("status", Text("Tell the state of a book's chapters", "Help"),
+                                "  korvane status my-book/.korvane/book.kvbook",
+                                [book](VerbContext & context) { return RunStatus(context, *book); });
+    verb.add_option("BOOK", *book, Text("The book file", "Help"))->required();
+    verbs.AddAnswers(verb);
 }
 
 }

@@ -32,7 +32,7 @@ ProgramTest::Outcome ProgramTest::Run(std::vector<std::string> arguments) const
     std::ostringstream out;
     std::ostringstream err;
     Outcome outcome;
-    outcome.m_Code = App::RunProgram(arguments, out, err, false, nullptr);
+    outcome.m_Code = App::RunProgram(arguments, out, err, {}, nullptr);
     outcome.m_Out = out.str();
     outcome.m_Err = err.str();
     return outcome;

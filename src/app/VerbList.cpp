@@ -1,0 +1,61 @@
+#include "app/VerbList.h"
+
+#include "import/Text.h"
+
+namespace App
+{
+
+using Import::Text;
+
+VerbList::VerbList(CLI::App & program) : m_Program(program)
+{
+}
+
+CLI::App & VerbList::Add(std::string const & name, std::string const & purpose, std::string const & example, Runner run)
+{
+    CLI::App & verb = *m_Program.add_subcommand(name, purpose);
+    verb.group(Text("Verbs", "Help"));
+    verb.set_help_flag("-h,--help", Text("Print this help and end", "Help"));
+    verb.add_flag("--json", m_Settings.m_IsJson, Text("Give the result as one JSON document", "Help"));
+    verb.add_flag("--quiet,-q", m_Settings.m_IsQuiet, Text("Say nothing but errors", "Help"));
+    verb.footer(Text("Example:", "Help") + "\n" + example);
+    m_Runners.emplace_back(&verb, std::move(run));
+    return verb;
+}
+
+void VerbList::AddAnswers(CLI::App & verb)
+{
+    auto const set = [](StandingAnswers::Choice & choice, StandingAnswers::Choice value) {
+        return [&choice, value](std::int64_t) { choice = value; };
+    };
+    using Choice = StandingAnswers::Choice;
+    verb.add_flag_function("--upgrade", set(m_Answers.m_Upgrade, Choice::Yes),
+                           Text("Bring documents of an older version up to date", "Help"));
+    verb.add_flag_function("--no-upgrade", set(m_Answers.m_Upgrade, Choice::No),
+                           Text("Leave out documents of an older version", "Help"));
+    verb.add_flag_function("--locate", set(m_Answers.m_Locate, Choice::Yes),
+                           Text("Look for chapters whose files are gone", "Help"));
+    verb.add_flag_function("--no-locate", set(m_Answers.m_Locate, Choice::No),
+                           Text("Go on without chapters whose files are gone", "Help"));
+}
+
+void VerbList::AddFixedTime(CLI::App & verb, long long & time)
+{
+    verb.add_option("--fixed-time", time,
+                    Text("Seconds since 1970 that stand for now in the output, for files that are the same to the byte",
+                         "Help"))
+        ->type_name(Text("SECONDS", "Help"))
+        ->check(CLI::NonNegativeNumber);
+}
+
+int VerbList::RunParsed(VerbContext & context) const
+{
+    for (auto const & [verb, run] : m_Runners) {
+        if (verb->parsed()) {
+            return run(context);
+        }
+    }
+    return ExitWrongUse;
+}
+
+}

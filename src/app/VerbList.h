@@ -1,0 +1,39 @@
+#pragma once
+
+#include "app/Verbs.h"
+
+#include <CLI/CLI.hpp>
+#include <functional>
+
+namespace App
+{
+
+/// The verbs as the command line knows them. Each verb's source adds its own, with its options; what the options say
+/// lies in a value that the verb's runner holds.
+class VerbList
+{
+public:
+    using Runner = std::function<int(VerbContext &)>;
+
+    explicit VerbList(CLI::App & program);
+
+    /// A new verb with the options that every verb has. `example` is the text below its help.
+    CLI::App & Add(std::string const & name, std::string const & purpose, std::string const & example, Runner run);
+    /// Options that answer the questions which opening documents may raise.
+    void AddAnswers(CLI::App & verb);
+    /// Option for the moment that stands for now in the output; `time` stays as it is without it.
+    void AddFixedTime(CLI::App & verb, long long & time);
+
+    /// Runs the verb that the arguments named.
+    int RunParsed(VerbContext & context) const;
+    [[nodiscard]] ConsoleSettings const & Settings() const { return m_Settings; }
+    [[nodiscard]] StandingAnswers const & Answers() const { return m_Answers; }
+
+private:
+    CLI::App & m_Program;
+    std::vector<std::pair<CLI::App *, Runner>> m_Runners;
+    ConsoleSettings m_Settings;
+    StandingAnswers m_Answers;
+};
+
+}
