@@ -4,7 +4,6 @@
 #include "commands/UpdateChapterSettingsCommand.h"
 #include "core/BookCollection.h"
 #include "framework/document/DocumentController.h"
-#include "framework/kernel/Semaphore.h"
 
 namespace Book
 {
@@ -22,10 +21,13 @@ void BookCollection::EnqueueCommand(Kernel::Counted<BookCommand> command, Kernel
 void BookCollection::EnqueueCommandAndWait(Kernel::Counted<BookCommand> command,
                                            Kernel::Counted<BookController const> book)
 {
-    Kernel::Semaphore done(0);
-    command->SetCompletionCallback([&done] { done.Signal(); });
-    EnqueueCommand(std::move(command), std::move(book));
-    done.Wait(0);
+    auto const mutableBook = GetMutableBookController(book);
+    if (!mutableBook) {
+        return;
+    }
+    MarkRecent(book);
+    // Not a semaphore: the queue's own wait knows who is blocked on whom, and comes back when the command is refused.
+    mutableBook->DomainController::EnqueueCommandAndWait(std::move(command));
 }
 
 bool BookCollection::HandleCommand(Kernel::Counted<DocumentController const> document,

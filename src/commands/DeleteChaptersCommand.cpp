@@ -24,8 +24,9 @@ Kernel::LocalisedString DeleteChaptersCommand::GetDescription() const
 void DeleteChaptersCommand::Do()
 {
     for (Kernel::Counted<BookChapter const> const & chapter : m_Chapters) {
-        m_NextChapter = GetBookController()->GetNextChapter(chapter);
-        if (std::find(m_Chapters.begin(), m_Chapters.end(), m_NextChapter) == m_Chapters.end()) {
+        auto const next = GetBookController()->GetNextChapter(chapter);
+        if (std::find(m_Chapters.begin(), m_Chapters.end(), next) == m_Chapters.end()) {
+            m_NextChapter = next;
             break;
         }
     }
@@ -40,7 +41,9 @@ void DeleteChaptersCommand::Notify(std::vector<Kernel::Counted<Kernel::Notificat
     }
     std::vector<String> paths;
     for (Kernel::Counted<BookChapter const> const & chapter : m_Chapters) {
-        paths.push_back(chapter->GetPath());
+        if (chapter) {
+            paths.push_back(chapter->GetPath());
+        }
     }
     auto const documents = GetBookController()->GetForegroundControllers(paths);
     if (!documents.empty()) {

@@ -33,7 +33,7 @@ void MoveChaptersCommand::Do()
     book->GetChapters(all);
     auto const firstMoved = std::find_if(all.begin(), all.end(), isMoved);
     bool const isTowardsFront =
-        m_Before && firstMoved != all.end() && std::find(all.begin(), firstMoved, m_Before) != firstMoved;
+        m_Before && !m_Chapters.empty() && std::find(all.begin(), firstMoved, m_Before) != firstMoved;
 
     book->MoveChapters(m_Before, m_Chapters);
 

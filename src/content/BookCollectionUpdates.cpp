@@ -68,11 +68,19 @@ void BookCollection::UpdateAnchors(Kernel::Counted<BookController const> book,
 
 void BookCollection::PreOutput(Kernel::Counted<BookController const> book, ChapterList chapters)
 {
-    if (!m_UpdateNumbersBeforeOutput) {
+    // One after the other on the book's queue. Numbers come first: what the others show depends on them. Chapters hold
+    // no cross-references into others, collated endnotes, tables of contents or index of the book that a command could
+    // bring up to date.
+    bool const isAnythingUpdated = m_UpdateNumbersBeforeOutput || m_UpdateCrossReferencesBeforeOutput ||
+                                   m_UpdateEndnotesBeforeOutput || m_UpdateTocsBeforeOutput ||
+                                   m_UpdateIndexBeforeOutput;
+    if (!isAnythingUpdated) {
         return;
     }
     EnqueueCommand(Kernel::MakeCounted<EngageBookLockCommand>(true), book);
-    EnqueueCommand(Kernel::MakeCounted<UpdateNumbersCommand>(std::move(chapters), true, true, true), book);
+    if (m_UpdateNumbersBeforeOutput) {
+        EnqueueCommand(Kernel::MakeCounted<UpdateNumbersCommand>(std::move(chapters), true, true, true), book);
+    }
     EnqueueCommand(Kernel::MakeCounted<EngageBookLockCommand>(false), book);
 }
 
@@ -139,6 +147,9 @@ bool BookCollection::IsAnchorPointValid(Kernel::Counted<AnchorInstance const> in
     book->GetChapters(chapters);
     String const uid = instance->GetUid();
     for (Kernel::Counted<BookChapter const> const & chapter : chapters) {
+        if (!chapter) {
+            continue;
+        }
         Snapshot<std::vector<AnchorInfo>> const anchors = chapter->GetAnchors();
         for (AnchorInfo const & info : anchors) {
             if (!(info.m_Uid == uid)) {

@@ -122,6 +122,9 @@ void BookController::UpdateAnchorsForForegroundChapters()
 {
     Snapshot<ChapterList> const chapters = Chapters();
     for (Kernel::Counted<BookChapter> const & chapter : chapters) {
+        if (!chapter) {
+            continue;
+        }
         if (Kernel::Counted<DocumentController> const document =
                 VantraController::GetInstance().GetRegisteredDocumentControllerFromPath(chapter->GetPath())) {
             UpdateChapterAnchors(chapter, document, nullptr);
@@ -147,13 +150,17 @@ void BookController::EnsureChapterAnchors(Kernel::Counted<BookChapter const> cha
 
 AnchorInfo const * BookController::GetAnchorInfo(String const & uid) const
 {
-    // What the answer points into lives on here until this thread asks again.
+    // What the answer points into lives on to the end of the turn; on a thread without one, until it asks again.
     static thread_local Snapshot<std::vector<AnchorInfo>> answered;
     Snapshot<ChapterList> const chapters = Chapters();
     for (Kernel::Counted<BookChapter> const & chapter : chapters) {
+        if (!chapter) {
+            continue;
+        }
         EnsureChapterAnchors(chapter);
         Snapshot<std::vector<AnchorInfo>> const anchors = chapter->GetAnchors();
         if (AnchorInfo const * const info = FindInfo(*anchors, uid)) {
+            anchors.KeepForTurn();
             answered = anchors;
             return info;
         }
@@ -165,6 +172,9 @@ Kernel::Counted<BookChapter const> BookController::GetChapterContainingAnchor(St
 {
     Snapshot<ChapterList> const chapters = Chapters();
     for (Kernel::Counted<BookChapter> const & chapter : chapters) {
+        if (!chapter) {
+            continue;
+        }
         EnsureChapterAnchors(chapter);
         if (FindInfo(*chapter->GetAnchors(), uid)) {
             return chapter;
@@ -180,7 +190,7 @@ void BookController::AddBlindAnchors(Kernel::Counted<Anchors> anchors, Kernel::C
     Snapshot<ChapterList> const chapters = Chapters();
     for (Kernel::Counted<BookChapter> const & other : chapters) {
         ++index;
-        if (other == chapter) {
+        if (!other || other == chapter) {
             continue;
         }
         EnsureChapterAnchors(other);

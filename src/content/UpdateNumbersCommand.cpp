@@ -84,7 +84,7 @@ void UpdateNumbersCommand::Do()
     int const count = book->ChapterCount();
     for (int index = 0; index < count; ++index) {
         Kernel::Counted<BookChapter> const chapter = book->GetChapterAtIndex(index);
-        if (!chapter->IsValid()) {
+        if (!chapter || !chapter->IsValid()) {
             continue;
         }
         bool const isUpdated = std::find(m_Chapters.begin(), m_Chapters.end(), chapter) != m_Chapters.end();

@@ -73,6 +73,14 @@ String BookChapter::GetPath() const
     return Now()->m_Path;
 }
 
+bool BookChapter::HasPath(String const & path) const
+{
+    if (m_DraftOwner.load() == std::this_thread::get_id()) {
+        return m_Draft->m_Path == path;
+    }
+    return m_Facts.Look([&path](Facts const & facts) { return facts->m_Path == path; });
+}
+
 int BookChapter::GetCachedStartPage() const
 {
     return Now()->m_CachedStartPage;

@@ -79,14 +79,17 @@ public:
 
     /// An empty record, as `Load` expects it: cached start page 1, no endnotes (-1, -1), status `Ok`.
     BookChapter();
-    /// A record for the file at `path`, named after it. Knows nothing of the document yet. Its cached start page is 0,
-    /// which as a start page means "goes on from the chapter before", as the record does until the first update.
+    /// A record for the file at `path`, named after it. Knows nothing of the document yet. Its cached start page is 0:
+    /// if it comes to stand first before its file was ever opened, it takes that over as its start page, and so goes on
+    /// from the chapter before like any record that nobody has looked into. It contains no index.
     explicit BookChapter(String const & path);
     ~BookChapter() override;
 
     [[nodiscard]] String GetName() const;
     /// Full path of the chapter's file: the key by which a chapter is found, compared byte for byte.
     [[nodiscard]] String GetPath() const;
+    /// The chapter's path is this one. What look-ups by path ask every chapter of every book: it copies nothing.
+    [[nodiscard]] bool HasPath(String const & path) const;
     /// Number of the document's first page as last seen.
     [[nodiscard]] int GetCachedStartPage() const;
     /// The page number that the chapter is fixed to, 0 if it goes on from the chapter before.
@@ -96,6 +99,8 @@ public:
     [[nodiscard]] int GetEndnoteSequenceStart() const;
     /// The number that the next chapter's endnotes start with, -1 before the first update.
     [[nodiscard]] int GetEndnoteSequenceEnd() const;
+    // A record whose document never opened says RGB, points, no bleed and single pages: what a new document has. There
+    // are no spreads in it to which any of that would apply.
     [[nodiscard]] Raster::Format GetColourFormat() const;
     [[nodiscard]] Kernel::UnitValue::UnitType GetUnitType() const;
     [[nodiscard]] Kernel::Counted<Kernel::UnitValueConverter const> GetUnitConverter() const;

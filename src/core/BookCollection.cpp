@@ -138,6 +138,9 @@ void BookCollection::DisableCommandEnqueueAndEmpty(Kernel::Counted<BookControlle
 void BookCollection::MarkRecent(const Kernel::Counted<BookController const> & book)
 {
     Kernel::ScopedLock const lock(m_RecentBooksLock);
+    if (!m_RecentBooks.empty() && m_RecentBooks.back() == book) {
+        return;
+    }
     const auto found =
         std::find_if(m_RecentBooks.begin(), m_RecentBooks.end(), [&](const auto & entry) { return entry == book; });
     if (found != m_RecentBooks.end()) {

@@ -68,8 +68,10 @@ public:
     /// Queues a command on the book and makes it the most recently commanded one. Dropped in silence if the book is no
     /// longer registered.
     void EnqueueCommand(Kernel::Counted<BookCommand> command, Kernel::Counted<BookController const> book);
-    /// The same, and returns at the end of this command. The book must be registered for as long; the caller must
-    /// neither hold its writer lock nor be its queue.
+    /// The same, and returns when this command has run and its completion callback has returned: not the queue's end.
+    /// Returns at once if the book is not registered or its queue refuses the command; what the command would have left
+    /// in its fields is then not there. A caller that is the book's own turn, or blocks it, gets the command run in
+    /// place, as with any wait for a queue.
     void EnqueueCommandAndWait(Kernel::Counted<BookCommand> command, Kernel::Counted<BookController const> book);
     /// The book's queue refuses commands from now on, and runs empty.
     void DisableCommandEnqueueAndEmpty(Kernel::Counted<BookController const> book);
@@ -88,13 +90,12 @@ public:
                               Kernel::Counted<DocumentController const> document);
     void UpdateChapterPreflight(Kernel::Counted<BookController const> book,
                                 Kernel::Counted<DocumentController const> document);
-    void UpdateCrossReferences(Kernel::Counted<BookController const> book, ChapterList chapters);
     void UpdateChapters(Kernel::Counted<BookController const> book);
     /// Stores where the chapter's numbers start, and renumbers from there if updates are automatic.
     void SetPageNumberOptions(Kernel::Counted<BookController const> book, Kernel::Counted<BookChapter const> chapter,
                               bool continueFromPrevious, int startPage);
     /// Hands in what has to be brought up to date before output, by the switches below, between an engage and a release
-    /// of the book lock. With all switches off, nothing.
+    /// of the book lock. With all five switches for output off, nothing, not even the lock.
     void PreOutput(Kernel::Counted<BookController const> book, ChapterList chapters);
     void UpdateAnchors(Kernel::Counted<BookController const> book, Kernel::Counted<DocumentController const> document);
     /// The chapter's document has closed. Under the book's writer lock. True if the file has changed while the book was

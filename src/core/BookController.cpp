@@ -130,7 +130,7 @@ Kernel::Counted<BookChapter> BookController::GetMutableChapter(Kernel::Counted<B
 
 Kernel::Counted<BookChapter> BookController::GetChapterFromPath(String const & path)
 {
-    return FindFirst(Chapters(), [&](BookChapter const & chapter) { return chapter.GetPath() == path; });
+    return FindFirst(Chapters(), [&](BookChapter const & chapter) { return chapter.HasPath(path); });
 }
 
 Kernel::Counted<BookChapter const> BookController::GetChapterFromPath(String const & path) const

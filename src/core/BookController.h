@@ -269,7 +269,8 @@ public:
                              bool adoptStartPage);
     /// Updates each chapter that the user has open, from the open document.
     void UpdateForegroundChapterStatus();
-    /// The same for readers, under the reader lock.
+    /// The same for readers, under the reader lock, so that no command of the book is half done meanwhile. It composes
+    /// nothing: where a chapter's text is not laid out, that is left to the document's queue, without waiting.
     void UpdateForegroundChapterStatus() const;
     /// Takes over the document's preflight results, after running the check if `run` says so.
     void UpdatePreflightStatus(Kernel::Counted<BookChapter const> chapter,

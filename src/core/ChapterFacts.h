@@ -14,8 +14,7 @@ struct ChapterFacts
     Kernel::Consolidated<Raster::ICCProfile> m_Profile;
     Raster::ICCManager::ICCProfileSet m_Profiles;
     Snapshot<std::vector<SpreadInfo>> m_SpreadInfo;
-    // Unit, format and the three flags of the layout say nothing until a document has been looked at: nobody asks for
-    // them before.
+    // Until a document has been looked at, unit, format and the three flags of the layout are those of a new one.
     Kernel::UnitValue::UnitType m_UnitType = Kernel::UnitValue::UnitType::Points;
     Raster::Format m_ColourFormat = Raster::Format::Rgba8;
     bool m_AnchorsDirty = false;

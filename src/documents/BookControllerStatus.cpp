@@ -49,10 +49,9 @@ SpreadInfo ReadSpread(DocumentNode const & root, SpreadNode const & spread, int 
     return info;
 }
 
-/// Under the document's reader lock, in one stretch.
+/// Under the document's reader lock.
 PageFacts ReadPages(DocumentController const & document)
 {
-    DocumentControllerSession const session{Kernel::NonCounted<DocumentController const>(&document)};
     DocumentNode const & root = *document.GetDocument();
     PageFacts facts;
     if (auto const section = root.GetSection(0)) {
@@ -119,16 +118,23 @@ bool BookController::UpdateChapterStatus(Kernel::Counted<BookChapter> chapter,
         }
     }
 
-    PageFacts const pages = ReadPages(*document);
-    bool const containsIndex = IndexVisitor::ContainsIndex(document);
-    bool const hasEndnotesMarker = static_cast<bool>(BookEndnoteVisitor::FindCollatedBookEndnotes(document));
     int const index = IndexFromChapter(chapter);
     Kernel::Counted<BookChapter const> const previous = GetPreviousChapter(chapter);
     int const firstNote = previous ? previous->GetEndnoteSequenceEnd() : 1;
     int nextNote = firstNote;
-    InvestigateEndnotes(document, nextNote);
-    Kernel::Counted<Story::Story const> const endnotes =
-        BookEndnoteVisitor::CollateBookEndnotesForChapter(document, index, !HasEndnotesBefore(chapter));
+    PageFacts pages;
+    bool containsIndex = false;
+    bool hasEndnotesMarker = false;
+    Kernel::Counted<Story::Story const> endnotes;
+    {
+        // One stretch, so that an edit of a chapter in the user's hands comes before all of these facts or after them.
+        DocumentControllerSession const session(document);
+        pages = ReadPages(*document);
+        containsIndex = IndexVisitor::ContainsIndex(document);
+        hasEndnotesMarker = static_cast<bool>(BookEndnoteVisitor::FindCollatedBookEndnotes(document));
+        InvestigateEndnotes(document, nextNote);
+        endnotes = BookEndnoteVisitor::CollateBookEndnotesForChapter(document, index, !HasEndnotesBefore(chapter));
+    }
 
     bool changed = false;
     {

@@ -194,32 +194,6 @@ void DocumentController::AppendComposeNotifications(
     }
 }
 
-namespace
-{
-
-void SetFailure(OpenDocumentFailedNotification & failure, Kernel::Archive::OpenResult opened)
-{
-    using Opened = Kernel::Archive::OpenResult;
-    using Failure = OpenDocumentFailedNotification;
-    static constexpr struct
-    {
-        Opened m_Opened;
-        Failure::Result m_Result;
-    } table[] = {{Opened::Missing, Failure::FileNotFound},          {Opened::IsFolder, Failure::NotADocument},
-                 {Opened::PermissionDenied, Failure::AccessDenied}, {Opened::AccessDenied, Failure::AccessDenied},
-                 {Opened::Locked, Failure::LockedByOther},          {Opened::TooManyOpenFiles, Failure::OutOfResources},
-                 {Opened::ReadError, Failure::CannotReadFile},      {Opened::NotAnArchive, Failure::NotADocument},
-                 {Opened::OtherType, Failure::OtherFileType},       {Opened::NewerVersion, Failure::FutureVersion},
-                 {Opened::Truncated, Failure::Truncated},           {Opened::Corrupt, Failure::Corrupt}};
-    for (auto const & row : table) {
-        if (opened == row.m_Opened) {
-            failure.SetResult(row.m_Result, Kernel::Archive::GetResultText(opened, failure.GetPath()), String());
-        }
-    }
-}
-
-}
-
 bool DocumentController::LoadDocument(String const & path, bool inFront, bool asCopy, enum LoadDocumentMode,
                                       Kernel::Counted<LoadDocumentOptions const>,
                                       OpenDocumentFailedNotification & failure, bool)
@@ -230,7 +204,7 @@ bool DocumentController::LoadDocument(String const & path, bool inFront, bool as
                                 : Kernel::Archive::OpenMode::Read;
     Kernel::Counted<Kernel::Archive> const archive = Kernel::Archive::Open(path, mode, FileType, opened);
     if (!archive) {
-        SetFailure(failure, opened);
+        SetNotifyResultFromError(failure, opened);
         return false;
     }
     failure.SetArchiveOpened(true);
