@@ -232,8 +232,13 @@ void BookController::UpdatePreflightStatus(Kernel::Counted<BookChapter> chapter,
     String text = PreflightNotRun();
     if (document) {
         if (run) {
-            VantraController::GetInstance().EnqueueCommandAndWait(
-                Kernel::MakeCounted<PreflightCheckDocumentCommand>(PreflightForOperation::Check), document, false);
+            auto const check = Kernel::MakeCounted<PreflightCheckDocumentCommand>(PreflightForOperation::Check);
+            // A key chapter that no pass has looked at yet tells nothing.
+            if (Kernel::Counted<BookChapter const> const key = GetKeyChapter(true);
+                key && !key->GetSpreadInfo().empty()) {
+                check->ExpectFormat(key->GetColourFormat());
+            }
+            VantraController::GetInstance().EnqueueCommandAndWait(check, document, false);
         }
         if (auto const results = document->GetPreflightResults()) {
             PreflightResults::Summary const summary = results->GetSummary();

@@ -4,6 +4,50 @@
 
 #include <algorithm>
 
+char const * PreflightResult::NameOf(Problem problem)
+{
+    switch (problem) {
+    case Problem::MissingPicture:
+        return "missing-picture";
+    case Problem::ChangedPicture:
+        return "changed-picture";
+    case Problem::LockedPicture:
+        return "locked-picture";
+    case Problem::PictureResolution:
+        return "picture-resolution";
+    case Problem::MissingFont:
+        return "missing-font";
+    case Problem::OversetText:
+        return "overset-text";
+    case Problem::ColourFormat:
+        return "colour-format";
+    case Problem::UnresolvedReference:
+        return "unresolved-reference";
+    case Problem::EmptyAnchorName:
+        return "empty-anchor-name";
+    case Problem::StaleTableOfContents:
+        return "stale-toc";
+    case Problem::StaleIndex:
+        break;
+    }
+    return "stale-index";
+}
+
+char const * PreflightResult::NameOf(Status status)
+{
+    switch (status) {
+    case Status::NotRun:
+        return "not-run";
+    case Status::Ok:
+        return "ok";
+    case Status::Warning:
+        return "warning";
+    case Status::Error:
+        break;
+    }
+    return "error";
+}
+
 PreflightResults::Summary PreflightResults::GetSummary() const
 {
     Summary summary;
