@@ -146,6 +146,11 @@ String BookChapter::GetPreflightDescription() const
     return Now()->m_PreflightDescription;
 }
 
+Kernel::Counted<PreflightResults const> BookChapter::GetPreflightResults() const
+{
+    return Now()->m_PreflightResults;
+}
+
 Kernel::TimeStamp BookChapter::GetTimeStamp() const
 {
     return Now()->m_TimeStamp;
@@ -380,6 +385,11 @@ bool BookChapter::SetPreflightStatus(PreflightResult::Status status, String cons
         bool const otherText = !(std::exchange(facts.m_PreflightDescription, description) == description);
         return otherStatus && otherText;
     });
+}
+
+void BookChapter::SetPreflightResults(Kernel::Counted<PreflightResults const> results)
+{
+    Change([&](ChapterFacts & facts) { facts.m_PreflightResults = std::move(results); });
 }
 
 bool BookChapter::UpdateTimeStamp()

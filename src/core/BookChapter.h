@@ -111,6 +111,8 @@ public:
     [[nodiscard]] Kernel::Counted<Story::Story const> GetEndnotes() const;
     [[nodiscard]] PreflightResult::Status GetPreflightStatus() const;
     [[nodiscard]] String GetPreflightDescription() const;
+    /// What the last check of the document found; null before the first. Not in the book file.
+    [[nodiscard]] Kernel::Counted<PreflightResults const> GetPreflightResults() const;
     /// Modification time of the file when the book last looked.
     [[nodiscard]] Kernel::TimeStamp GetTimeStamp() const;
     /// One entry for each spread, in document order.
@@ -171,6 +173,7 @@ public:
     /// Stores both. True only if both differ: a book does not become unsaved over a status whose text, which is what
     /// the user sees, stays the same.
     bool SetPreflightStatus(PreflightResult::Status status, String const & description);
+    void SetPreflightResults(Kernel::Counted<PreflightResults const> results);
     /// Asks the file for its modification time. True if it gave one and that differs from the stored one, which it then
     /// replaces. A file that gives none leaves the field alone and counts as unchanged.
     bool UpdateTimeStamp();

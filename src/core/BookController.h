@@ -219,14 +219,15 @@ public:
     /// if the file cannot be opened (the chapter's status then says why), or if it is restricted and `allowRestricted`
     /// is false. `reconcile` also brings the document's index and anchors in step with the book.
     ///
-    /// Loads on the calling thread. May wait for a close of the same chapter and for the user's passwords, never with
-    /// the book's writer lock held for the latter.
+    /// Loads on the calling thread. May wait for a close of the same chapter, for others that load the same file, and
+    /// for the user's passwords; never with the book's writer lock held for the last two.
     Kernel::Counted<DocumentController> LoadChapterDocument(Kernel::Counted<BookChapter const> chapter, bool reconcile,
                                                             bool allowRestricted);
     /// Ends one use. The last one saves the document if it has changes, and closes it in the background;
     /// `updateTimeStamp` then notes the file's time as looked at. False if the book holds no document for the chapter.
     bool ReleaseChapterDocument(Kernel::Counted<BookChapter const> chapter, bool updateTimeStamp) const;
-    /// The document that the book holds for the chapter, or null. With `preferForeground` the user's own comes first.
+    /// The document that the book holds for the chapter, or null; one that has closed under it, by another book's hand,
+    /// does not count. With `preferForeground` the user's own comes first.
     /// Counts no use.
     [[nodiscard]] Kernel::Counted<DocumentController>
     GetDocumentControllerForChapter(Kernel::Counted<BookChapter const> chapter, bool preferForeground) const;
@@ -288,7 +289,7 @@ public:
 
     /// Tries every chapter's file, and asks the user about those that do not open.
     void CollateMissingChapters();
-    /// Puts the one question that the state calls for, or none.
+    /// Puts the one question that the state calls for, or none. What has left the book meanwhile is not asked about.
     void NotifyMissingChapters();
     /// The user's answer whether to look for missing chapters.
     void RespondMissingChapterPrompt(bool locate);
@@ -371,6 +372,8 @@ private:
     /// Runs the queue of files until it is empty, or until there is a question to the user.
     void DoAddChapters();
     void AskAboutOldVersion(String const & path);
+    /// The user has agreed: writes the chapter's file in the present format, unless its owner forbids changing it.
+    void UpgradeChapter(Kernel::Counted<BookChapter const> const & chapter);
     bool ResolveChapterFilePath(String oldPath, String & newPath, Kernel::Counted<BookChapter> chapter) const;
 
     void MapIndexGUIDs(Kernel::Counted<DocumentController const> document, Kernel::Counted<Story::Index const> index);

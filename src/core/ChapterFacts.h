@@ -29,6 +29,7 @@ struct ChapterFacts
     int m_EndnoteSequenceEnd = -1;
     PreflightResult::Status m_PreflightStatus{};
     String m_PreflightDescription;
+    Kernel::Counted<PreflightResults const> m_PreflightResults;
     BookChapter::Status m_Status = BookChapter::Status::Ok;
     String m_Path;
     String m_Pages;

@@ -1,5 +1,6 @@
 #include "core/BookController.h"
 #include "core/BookNotification.h"
+#include "framework/commands/UpgradeDocumentCommand.h"
 #include "framework/document/DocumentController.h"
 #include "framework/document/DocumentPromptNotification.h"
 #include "framework/document/VantraController.h"
@@ -61,11 +62,25 @@ void BookController::AskAboutOldVersion(String const & path)
             }
             if (choice == PromptYes) {
                 // At the end, wherever the add inserts: by now the place may mean something else.
-                book->m_AddedChapters.push_back(book->AddChapter(path, -1));
+                Kernel::Counted<BookChapter> const added = book->AddChapter(path, -1);
+                book->m_AddedChapters.push_back(added);
+                if (added) {
+                    book->UpgradeChapter(added);
+                }
             }
             book->DoAddChapters();
         },
         Kernel::Counted<DomainController const>(book)));
+}
+
+void BookController::UpgradeChapter(Kernel::Counted<BookChapter const> const & chapter)
+{
+    Kernel::Counted<DocumentController const> const document = LoadChapterDocument(chapter, false, false);
+    if (document) {
+        VantraController::GetInstance().EnqueueCommandAndWait(Kernel::MakeCounted<UpgradeDocumentCommand>(), document,
+                                                              false);
+        ReleaseChapterDocument(chapter, true);
+    }
 }
 
 void BookController::CancelAddChapters()

@@ -30,7 +30,8 @@ BookController::GetDocumentControllerForChapter(Kernel::Counted<BookChapter cons
     }
     Snapshot<ChapterDocuments> const documents = m_ChapterDocuments.Get();
     auto const found = documents->find(chapter);
-    return found == documents->end() ? nullptr : found->second;
+    // Another book that used the same file may have been the last, and closed it.
+    return found == documents->end() || found->second->IsCommandEnqueueDisabled() ? nullptr : found->second;
 }
 
 bool BookController::IsThisChapterThisDocument(Kernel::Counted<BookChapter const> chapter,

@@ -12,6 +12,9 @@
 #include "framework/kernel/Semaphore.h"
 #include "framework/kernel/Trace.h"
 
+#include <optional>
+#include <utility>
+
 namespace Book
 {
 
@@ -74,7 +77,14 @@ Kernel::Counted<DocumentController> BookController::LoadChapterDocument(Kernel::
     // The claim comes before any look at who has the document: it keeps an open one open until it is registered here.
     VantraController & application = VantraController::GetInstance();
     auto document = Kernel::MakeCounted<DocumentController>();
-    if (application.RegisterLoadingController(path, document)) {
+    bool isLoader = false;
+    {
+        // Whoever loads the file may be asking the user for a password: other books and readers go on meanwhile.
+        std::optional<DomainWriterUnlockSession> unlocked;
+        isLoader = application.RegisterLoadingController(
+            path, document, [&] { unlocked.emplace(Kernel::Counted<DomainController>(this)); });
+    }
+    if (isLoader) {
         return OpenChapterDocument(chapter, document, reconcile);
     }
     if (!document) {
@@ -179,15 +189,18 @@ void BookController::AskForPasswords(Kernel::Counted<BookChapter> const & chapte
         return;
     }
     Kernel::Semaphore answered(0);
-    VantraController::GetInstance().Broadcast(Kernel::MakeCounted<RequestPdfPasswordsNotification>(
+    Kernel::Counted<DomainController> const self(const_cast<BookController *>(this));
+    auto question = Kernel::MakeCounted<RequestPdfPasswordsNotification>(
         unknown, document, [&](RequestPdfPasswordsNotification::Passwords const & passwords) {
             for (Kernel::JailCounted<EmbeddedDocumentNode> const & image : images) {
                 UnlockNode(*image, image->GetDataSource(), passwords, chapter);
             }
             answered.Signal();
-        }));
+        });
+    question->EndWith(self);
+    VantraController::GetInstance().Broadcast(std::exchange(question, nullptr));
     // The user may take any time, and whoever asks the user may have to read the book.
-    DomainWriterUnlockSession const unlocked(Kernel::Counted<DomainController>(const_cast<BookController *>(this)));
+    DomainWriterUnlockSession const unlocked(self);
     answered.Wait(0);
 }
 
@@ -196,6 +209,8 @@ void BookController::StoreChapterDocument(Kernel::Counted<BookChapter const> con
 {
     Kernel::ScopedLock const lock(m_ChapterDocumentsLock);
     ChapterDocuments documents = *m_ChapterDocuments.Get();
+    // What another book was the last to use, and closed, would otherwise stay in memory here.
+    std::erase_if(documents, [](auto const & entry) { return entry.second->IsCommandEnqueueDisabled(); });
     documents.insert_or_assign(chapter, std::move(document));
     m_ChapterDocuments.Set(Snapshot(std::move(documents)));
     if (adopted) {

@@ -74,6 +74,11 @@ void BookController::CollateMissingChapters()
 
 void BookController::NotifyMissingChapters()
 {
+    std::erase_if(m_MissingChapters,
+                  [this](Kernel::Counted<BookChapter> const & chapter) { return IndexFromChapter(chapter) < 0; });
+    if (m_ForbiddenChapter && IndexFromChapter(m_ForbiddenChapter) < 0) {
+        m_ForbiddenChapter = nullptr;
+    }
     if (m_MissingChapters.empty()) {
         return;
     }

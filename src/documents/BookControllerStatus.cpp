@@ -240,7 +240,9 @@ void BookController::UpdatePreflightStatus(Kernel::Counted<BookChapter> chapter,
             }
             VantraController::GetInstance().EnqueueCommandAndWait(check, document, false);
         }
-        if (auto const results = document->GetPreflightResults()) {
+        auto const results = document->GetPreflightResults();
+        chapter->SetPreflightResults(results);
+        if (results) {
             PreflightResults::Summary const summary = results->GetSummary();
             status = summary.m_Status;
             text = summary.m_Text;

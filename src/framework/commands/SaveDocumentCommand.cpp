@@ -3,6 +3,7 @@
 #include "framework/document/VantraController.h"
 #include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Format.h"
+#include "framework/kernel/Path.h"
 
 namespace
 {
@@ -30,21 +31,30 @@ void SaveDocumentCommand::Do()
 void SaveDocumentCommand::KeepBesideFile()
 {
     m_FailedPath = GetDocument()->GetPath();
-    for (int i = 1; i <= MaximumKeptNames && m_KeptPath.Empty(); ++i) {
-        String const candidate = Kernel::Format("%1.unsaved-%2", m_FailedPath, i);
+    if (!KeepAs(m_FailedPath)) {
+        // The disk is full, or the folder may not be written: another place is better than none.
+        KeepAs(Kernel::FileSystem::GetTemporaryFolder() + "/" + Kernel::Path::GetFileName(m_FailedPath));
+    }
+    // The document's own notifications are off when nobody has it in front, and this one has to be heard.
+    VantraController::GetInstance().Broadcast(
+        Kernel::MakeCounted<DocumentSaveFailedNotification>(Self(), m_FailedPath, m_Result.GetText(), m_KeptPath));
+}
+
+bool SaveDocumentCommand::KeepAs(String const & path)
+{
+    for (int i = 1; i <= MaximumKeptNames; ++i) {
+        String const candidate = Kernel::Format("%1.unsaved-%2", path, i);
         if (Kernel::FileSystem::Exists(candidate)) {
             continue;
         }
         DocumentSaveResult kept;
         GetDocument()->SaveCopy(kept, candidate);
-        if (!kept.IsSuccess()) {
-            break;
+        if (kept.IsSuccess()) {
+            m_KeptPath = candidate;
         }
-        m_KeptPath = candidate;
+        return kept.IsSuccess();
     }
-    // The document's own notifications are off when nobody has it in front, and this one has to be heard.
-    VantraController::GetInstance().Broadcast(
-        Kernel::MakeCounted<DocumentSaveFailedNotification>(Self(), m_FailedPath, m_Result.GetText(), m_KeptPath));
+    return false;
 }
 
 void SaveDocumentCommand::Notify(std::vector<Kernel::Counted<Kernel::Notification>> & notifications)

@@ -14,7 +14,8 @@ public:
     /// Shows progress, which a document that nobody has in front does not.
     bool m_ShowProgress = true;
     /// The document's last user has let go: if its file can't be written, a `DocumentSaveFailedNotification` tells so,
-    /// and the changed document is kept beside the file under a name that it states.
+    /// and the changed document is kept beside the file, or in the folder for temporary files, under a name that it
+    /// states.
     bool m_KeepOnFailure = false;
 
     [[nodiscard]] bool IsCloseAfterwards() const { return m_CloseAfterwards; }
@@ -27,6 +28,8 @@ public:
 
 private:
     void KeepBesideFile();
+    /// Under the path with a number behind it. False if it can't be written there.
+    bool KeepAs(String const & path);
 
     DocumentSaveResult m_Result;
     String m_FailedPath;

@@ -54,15 +54,20 @@ void DocumentController::SetFormatAndProfiles(enum Raster::Format format,
 void DocumentController::SetFormatOverride(enum Raster::Format format,
                                            Raster::ICCManager::ICCProfileSet const & profiles)
 {
-    m_Facts.Change([&](DocumentFacts & facts) { facts.m_Override = DocumentFacts::ColourSettings{format, profiles}; });
+    m_Facts.Change([&](DocumentFacts & facts) {
+        facts.m_Override = DocumentFacts::ColourSettings{format, profiles};
+        ++facts.m_OverrideUses;
+    });
 }
 
 bool DocumentController::RemoveFormatOverride()
 {
     bool removed = false;
     m_Facts.Change([&removed](DocumentFacts & facts) {
-        removed = facts.m_Override.has_value();
-        facts.m_Override.reset();
+        removed = facts.m_OverrideUses > 0;
+        if (removed && --facts.m_OverrideUses == 0) {
+            facts.m_Override.reset();
+        }
     });
     return removed;
 }
@@ -375,6 +380,7 @@ void DocumentController::SaveDocument(DocumentSaveResult & result, String const 
     if (target != ownPath) {
         SetPath(target);
     }
+    m_FromOlderVersion = false;
     m_SavedCount = changes;
     result.SetResult(DocumentSaveResult::Success);
     result.SetSuccess(true);

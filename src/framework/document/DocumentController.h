@@ -52,7 +52,7 @@ class DocumentController : public DomainController, public DocumentControllerArc
 public:
     static constexpr Kernel::IDTag FileType{"KvDc"};
     /// Version of the document format that this program writes.
-    static constexpr unsigned short FormatVersion = 1;
+    static constexpr unsigned short FormatVersion = 2;
 
     /// An empty document without pages: `LoadDocument` or `CreateDocument` fills one.
     DocumentController();
@@ -77,6 +77,9 @@ public:
                       bool recovering);
     /// True if the file is a document of a format older than this program's. Its version goes to `version` if that is
     /// not null. False for a file that can't be read or is none of ours.
+    ///
+    /// Loading brings an older document up to date in memory and leaves it clean: looking at a file must not take it
+    /// from those who have the older program. The next save writes the present format.
     [[nodiscard]] static bool CheckForOldArchiveVersion(String const & path, unsigned int * version);
 
     /// Writes the document to its file, or to another path, which becomes its own; an empty path means its own. On the
@@ -117,6 +120,8 @@ public:
     [[nodiscard]] bool IsDirty() const { return m_ChangeCount != m_SavedCount; }
     /// Something that a file holds has changed. Commands that enter the history need not call it.
     void MarkChanged() { ++m_ChangeCount; }
+    /// Its file is of a format older than this program's; false from the first save on. Safe on any thread.
+    [[nodiscard]] bool IsFromOlderVersion() const { return m_FromOlderVersion; }
     /// Its owner's mark in the document forbids changing it.
     [[nodiscard]] bool GetRestricted() const { return m_Restricted; }
     void SetRestricted(bool restricted) { m_Restricted = restricted; }
@@ -217,6 +222,7 @@ private:
     Kernel::Counted<Kernel::UnitValueConverter const> const m_UnitConverter;
     std::atomic<std::uint64_t> m_ChangeCount{0};
     std::atomic<std::uint64_t> m_SavedCount{0};
+    std::atomic<bool> m_FromOlderVersion{false};
     std::atomic<bool> m_Restricted{false};
     std::atomic<bool> m_TextDirty{false};
     std::atomic<bool> m_AnchorsCurrent{false};

@@ -38,6 +38,8 @@ public:
     ColourSettings m_Colours;
     /// Conversion for output, over the document's own settings; never saved.
     std::optional<ColourSettings> m_Override;
+    /// How many outputs have laid it on: it goes with the last of them.
+    int m_OverrideUses = 0;
     Kernel::Counted<PDFBookmarkManager const> m_Bookmarks;
     Kernel::Counted<PreflightResults const> m_Preflight;
     Kernel::Counted<Anchors const> m_Anchors;

@@ -88,7 +88,7 @@ public:
             throw Kernel::FutureVersionException(store.GetPath(), Kernel::ClassUID(RootTag.Value()), in->GetVersion(),
                                                  DocumentController::FormatVersion);
         }
-        return m_File.Read(*in);
+        return m_File.Read(*in, in->GetVersion());
     }
     [[nodiscard]] Kernel::FileStoreItemType const & GetObjectFileStoreItemType() const override
     {
@@ -196,8 +196,9 @@ void DocumentFile::LoadLayout(TextFlow & flow, std::size_t number, std::uint64_t
     }
 }
 
-bool DocumentFile::Read(Kernel::InSerialiser const & in)
+bool DocumentFile::Read(Kernel::InSerialiser const & in, unsigned short version)
 {
+    m_Document.m_FromOlderVersion = version < DocumentController::FormatVersion;
     DocumentNode & node = *m_Document.GetDocument();
 
     String guid;
@@ -305,6 +306,7 @@ bool DocumentFile::Read(Kernel::InSerialiser const & in)
         Kernel::Counted<MasterSpreadNode> const master = Kernel::MakeCounted<MasterSpreadNode>();
         master->SetName(record->m_Name);
         master->SetTextRects(record->m_TextRects);
+        record->CompleteBleed(setup->m_Setup.m_Bleed);
         record->FillNode(*master, frames);
         node.AppendChild(NodeChildListMasters, master);
     }
@@ -313,6 +315,7 @@ bool DocumentFile::Read(Kernel::InSerialiser const & in)
             return false;
         }
         Kernel::Counted<SpreadNode> const spread = Kernel::MakeCounted<SpreadNode>();
+        record->CompleteBleed(setup->m_Setup.m_Bleed);
         record->FillNode(*spread, frames);
         node.AppendChild(NodeChildListSpreads, spread);
     }

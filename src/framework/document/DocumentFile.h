@@ -48,7 +48,7 @@ public:
                                                                        DocumentSaveResult & result);
 
 private:
-    bool Read(Kernel::InSerialiser const & in);
+    bool Read(Kernel::InSerialiser const & in, unsigned short version);
     void LoadLayout(TextFlow & flow, std::size_t number, std::uint64_t hash, Kernel::Archive & archive);
 
     friend class DocumentStreamItem;

@@ -5,25 +5,35 @@
 #include "framework/document/ShapeNode.h"
 
 #include <cmath>
+#include <utility>
 
 using Kernel::IDTag;
 using Kernel::InSerialiser;
 using Kernel::OutSerialiser;
 
-#define KORVANE_DOCUMENT_RECORD(Record, uid)                                                                           \
-    Kernel::ClassProperties const Record::ms_ClassProperties(Kernel::ClassUID(uid), &Record::CreateObject, 1, {},      \
-                                                             nullptr);                                                 \
+namespace
+{
+
+/// From this version of the page setup and of spreads on, each side of a page has a bleed of its own; before, the
+/// document had one width for all sides of all pages.
+constexpr unsigned short FourBleedsVersion = 2;
+
+}
+
+#define KORVANE_DOCUMENT_RECORD(Record, uid, version)                                                                  \
+    Kernel::ClassProperties const Record::ms_ClassProperties(Kernel::ClassUID(uid), &Record::CreateObject, version,    \
+                                                             {}, nullptr);                                             \
     static Kernel::ClassPropertiesBase::Init const s_Init##Record(Record::ms_ClassProperties);
 
-KORVANE_DOCUMENT_RECORD(MetadataRecord, "DcMe")
-KORVANE_DOCUMENT_RECORD(PageSetupRecord, "DcPs")
-KORVANE_DOCUMENT_RECORD(SectionRecord, "DcSe")
-KORVANE_DOCUMENT_RECORD(SwatchRecord, "DcSw")
-KORVANE_DOCUMENT_RECORD(ItemRecord, "DcIt")
-KORVANE_DOCUMENT_RECORD(SpreadRecord, "DcSp")
-KORVANE_DOCUMENT_RECORD(FlowRecord, "DcFl")
-KORVANE_DOCUMENT_RECORD(BookmarkRecord, "DcBm")
-KORVANE_DOCUMENT_RECORD(PictureRecord, "DcPi")
+KORVANE_DOCUMENT_RECORD(MetadataRecord, "DcMe", 1)
+KORVANE_DOCUMENT_RECORD(PageSetupRecord, "DcPs", FourBleedsVersion)
+KORVANE_DOCUMENT_RECORD(SectionRecord, "DcSe", 1)
+KORVANE_DOCUMENT_RECORD(SwatchRecord, "DcSw", 1)
+KORVANE_DOCUMENT_RECORD(ItemRecord, "DcIt", 1)
+KORVANE_DOCUMENT_RECORD(SpreadRecord, "DcSp", FourBleedsVersion)
+KORVANE_DOCUMENT_RECORD(FlowRecord, "DcFl", 1)
+KORVANE_DOCUMENT_RECORD(BookmarkRecord, "DcBm", 1)
+KORVANE_DOCUMENT_RECORD(PictureRecord, "DcPi", 1)
 
 namespace
 {
@@ -123,10 +133,16 @@ void PageSetupRecord::Save(OutSerialiser & out) const
     out.SaveType(IDTag("nhed"), m_Setup.m_NotesHeading);
 }
 
-bool PageSetupRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short)
+bool PageSetupRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short version)
 {
     in.LoadType(IDTag("size"), m_Setup.m_PageSize);
-    in.LoadType(IDTag("bled"), m_Setup.m_Bleed);
+    if (version < FourBleedsVersion) {
+        double bleed = 0;
+        in.LoadType(IDTag("bled"), bleed);
+        m_Setup.m_Bleed = {bleed, bleed, bleed, bleed};
+    } else {
+        in.LoadType(IDTag("bled"), m_Setup.m_Bleed);
+    }
     in.LoadType(IDTag("facg"), m_Setup.m_FacingPages);
     in.LoadType(IDTag("vert"), m_Setup.m_VerticalStack);
     in.LoadType(IDTag("chst"), m_Setup.m_ChapterStart);
@@ -323,8 +339,10 @@ void SpreadRecord::Save(OutSerialiser & out) const
     out.SaveObjects(IDTag("item"), m_Items);
 }
 
-bool SpreadRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short)
+bool SpreadRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short version)
 {
+    m_LacksBleed = version < FourBleedsVersion;
+    std::size_t const perPage = m_LacksBleed ? 4 : 8;
     in.LoadType(IDTag("name"), m_Name);
     std::vector<double> numbers;
     std::vector<std::uint8_t> sides;
@@ -336,14 +354,16 @@ bool SpreadRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned s
     in.LoadArray(IDTag("text"), textRects);
     in.LoadType(IDTag("trbg"), m_TransparentBackground);
     in.LoadObjects(IDTag("item"), m_Items);
-    if (numbers.size() != 8 * sides.size() || masters.size() != sides.size() || 0 != textRects.size() % 4 ||
+    if (numbers.size() != perPage * sides.size() || masters.size() != sides.size() || 0 != textRects.size() % 4 ||
         sides.empty()) {
         return false;
     }
     for (std::size_t i = 0; i < sides.size(); ++i) {
         SpreadPage page;
-        page.m_Rect = RectAt(numbers, 8 * i);
-        page.m_Bleed = RectAt(numbers, 8 * i + 4);
+        page.m_Rect = RectAt(numbers, perPage * i);
+        if (!m_LacksBleed) {
+            page.m_Bleed = RectAt(numbers, perPage * i + 4);
+        }
         page.m_Side = static_cast<PageSide>(sides[i] & 0x7F);
         page.m_Blank = 0 != (sides[i] & 0x80);
         page.m_Master = masters[i];
@@ -369,6 +389,16 @@ void SpreadRecord::FromNode(SpreadNode const & spread, DocumentNode const & docu
         for (Kernel::JailCounted<Node> const & item : spread.GetChildren(list)) {
             m_Items.push_back(ItemRecord::FromNode(*item, document));
         }
+    }
+}
+
+void SpreadRecord::CompleteBleed(Kernel::RectT<double> const & bleed)
+{
+    if (!std::exchange(m_LacksBleed, false)) {
+        return;
+    }
+    for (SpreadPage & page : m_Pages) {
+        page.m_Bleed = bleed;
     }
 }
 

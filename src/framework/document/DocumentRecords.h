@@ -118,6 +118,8 @@ public:
     bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
 
     void FromNode(SpreadNode const & spread, DocumentNode const & document);
+    /// Pages of version 1 had no bleed of their own: they get the document's.
+    void CompleteBleed(Kernel::RectT<double> const & bleed);
     /// Gives the node its pages and those items that make sense.
     void FillNode(SpreadNode & spread, std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const;
 
@@ -128,6 +130,7 @@ private:
     std::vector<SpreadPage> m_Pages;
     std::vector<Kernel::Counted<ItemRecord>> m_Items;
     bool m_TransparentBackground = false;
+    bool m_LacksBleed = false;
 };
 
 /// One text flow: its story, and the hash of what its layout was made from. The layout itself lies in items of its own.

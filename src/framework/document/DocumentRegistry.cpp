@@ -37,9 +37,11 @@ void DocumentRegistry::Enter(RecordPointer const & record)
     }
 }
 
-bool DocumentRegistry::ClaimForLoading(String const & path, Document & controller)
+bool DocumentRegistry::ClaimForLoading(String const & path, Document & controller,
+                                       std::function<void()> const & beforeWaiting)
 {
     std::string const key = Key(path);
+    bool isPrepared = !beforeWaiting;
     std::thread::id const thread = std::this_thread::get_id();
     std::unique_lock lock(m_Lock);
     for (;;) {
@@ -61,6 +63,12 @@ bool DocumentRegistry::ClaimForLoading(String const & path, Document & controlle
         }
         KORVANE_ASSERT_MESSAGE(record->m_State != State::Loading || record->m_Loader != thread,
                                "a thread claims a path that it is loading itself");
+        if (record->m_State == State::Loading && !std::exchange(isPrepared, true)) {
+            lock.unlock();
+            beforeWaiting();
+            lock.lock();
+            continue;
+        }
         Document const closing = record->m_State == State::Closing ? record->m_Controller : nullptr;
         if (closing && closing->IsCommandEnqueueDisabled()) {
             // Its last turn is in the queue: run it here if nobody is at it.

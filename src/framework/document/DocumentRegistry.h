@@ -5,6 +5,7 @@
 
 #include <condition_variable>
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -22,8 +23,9 @@ class DocumentRegistry
 public:
     using Document = Kernel::Counted<DocumentController>;
 
-    /// See `VantraController::RegisterLoadingController`.
-    bool ClaimForLoading(String const & path, Document & controller);
+    /// See `VantraController::RegisterLoadingController`. `beforeWaiting`, if there is one, is called at most once, before
+    /// a wait for another loader.
+    bool ClaimForLoading(String const & path, Document & controller, std::function<void()> const & beforeWaiting);
     /// Ends the claim: null for a load that failed, or the document, which is open from now on, in front or kept for the
     /// calling thread until its `AddUse`.
     void EndLoading(String const & path, Document controller, bool inFront);

@@ -28,6 +28,10 @@ public:
 
     [[nodiscard]] Sources const & GetSources() const { return m_Sources; }
 
+    /// For whom the document is opened: if that closes, nobody needs the passwords any more, and the question answers
+    /// itself. Before it is sent.
+    void EndWith(Kernel::Counted<DomainController> const & asker) const { m_Question.EndWith(asker); }
+
     /// What the user entered. Safe on any thread; false if the question was answered before.
     bool Answer(Passwords const & passwords) const;
 

@@ -130,7 +130,7 @@ Counted<DocumentController> VantraController::OpenDocument(String const & path,
                                                            OpenDocumentFailedNotification & failure)
 {
     Counted<DocumentController> controller = Kernel::MakeCounted<DocumentController>();
-    if (m_Registry->ClaimForLoading(path, controller)) {
+    if (m_Registry->ClaimForLoading(path, controller, {})) {
         IncrementLoadingItems();
         bool const loaded = controller->LoadDocument(path, true, false, LoadWhole, nullptr, failure, false);
         DecrementLoadingItems();
@@ -197,7 +197,13 @@ std::vector<Counted<DocumentController const>> VantraController::GetDocumentCont
 
 bool VantraController::RegisterLoadingController(String const & path, Counted<DocumentController> & controller)
 {
-    return m_Registry->ClaimForLoading(path, controller);
+    return m_Registry->ClaimForLoading(path, controller, {});
+}
+
+bool VantraController::RegisterLoadingController(String const & path, Counted<DocumentController> & controller,
+                                                 std::function<void()> const & beforeWaiting)
+{
+    return m_Registry->ClaimForLoading(path, controller, beforeWaiting);
 }
 
 void VantraController::UnregisterLoadingController(String const & path, Counted<DocumentController> controller)

@@ -11,6 +11,7 @@
 
 #include <atomic>
 #include <concepts>
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -81,6 +82,10 @@ public:
     /// calling thread until its next `RegisterBackgroundController` on it, which must follow. Waits while another
     /// thread loads or closes the path.
     bool RegisterLoadingController(String const & path, Kernel::Counted<DocumentController> & controller);
+    /// The same. That other thread's load may itself wait for the user: `beforeWaiting` is called, at most once, before
+    /// the wait for it, and lets go of what must not be held so long.
+    bool RegisterLoadingController(String const & path, Kernel::Counted<DocumentController> & controller,
+                                   std::function<void()> const & beforeWaiting);
     /// Ends the claim. With the document it is open from now on, kept so for the calling thread until its
     /// `RegisterBackgroundController`; with null the load has failed.
     void UnregisterLoadingController(String const & path, Kernel::Counted<DocumentController> controller);
@@ -109,8 +114,9 @@ public:
     /// Previews of files are wanted: books and documents keep thumbnails. On at first.
     [[nodiscard]] bool ArePreviewsWanted() const { return m_PreviewsWanted; }
     void SetPreviewsWanted(bool wanted) { m_PreviewsWanted = wanted; }
-    /// The user can be asked to grant access to a file. Off at first: file permissions of this system are not granted
-    /// by answering a question.
+    /// The user can be asked to grant access to a file. On at first: the system shows no dialogue for it, but the file's
+    /// owner can change its mode while the question stands, and a retry then finds it open. A front end that nobody
+    /// watches turns it off, and gets the question about missing files instead.
     [[nodiscard]] bool CanAskForFilePermission() const { return m_CanAskForFilePermission; }
     void SetCanAskForFilePermission(bool can) { m_CanAskForFilePermission = can; }
 
@@ -133,7 +139,7 @@ private:
     Kernel::Counted<ApplicationQueue> const m_Queue;
     std::atomic<int> m_LoadingItems{0};
     std::atomic<bool> m_PreviewsWanted{true};
-    std::atomic<bool> m_CanAskForFilePermission{false};
+    std::atomic<bool> m_CanAskForFilePermission{true};
     std::atomic<enum Raster::ResamplerType> m_UpViewResampler;
     std::atomic<enum Raster::ResamplerType> m_DownViewResampler;
 };

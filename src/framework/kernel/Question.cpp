@@ -119,6 +119,13 @@ Question::Question(Counted<DomainController> controller, std::function<void()> n
     }
 }
 
+void Question::EndWith(Counted<DomainController> const & other) const
+{
+    if (!other->m_Queue->AddQuestion(m_Handle->m_State)) {
+        m_Handle->m_State->Answer(nullptr);
+    }
+}
+
 bool Question::Answer(std::function<void()> answer) const
 {
     return m_Handle->m_State->Answer(std::move(answer));

@@ -23,6 +23,9 @@ public:
     /// \param nothing what answering with nothing does
     Question(Counted<DomainController> controller, std::function<void()> nothing);
 
+    /// The question also answers itself with nothing when this other domain closes, for whose sake it is asked.
+    void EndWith(Counted<DomainController> const & other) const;
+
     /// False if it has been answered before.
     bool Answer(std::function<void()> answer) const;
     [[nodiscard]] bool IsAnswered() const;
