@@ -3,6 +3,7 @@
 #include "framework/kernel/FileStore.h"
 #include "framework/kernel/MemoryStreams.h"
 #include "framework/kernel/RawData.h"
+#include "framework/raster/DynamicBitmap.h"
 
 #include <cstdlib>
 
@@ -54,6 +55,13 @@ extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const * data, std::size_t siz
     auto const written = WriteBook(*book);
     auto const again = MakeCounted<Book::BookController>();
     if (!ReadBook(*again, written) || again->ChapterCount() != book->ChapterCount()) {
+        std::abort();
+    }
+    auto const preview = book->GetThumbnail();
+    auto const previewAgain = again->GetThumbnail();
+    if ((preview == nullptr) != (previewAgain == nullptr) ||
+        (preview && (preview->GetWidth() != previewAgain->GetWidth() ||
+                     preview->GetPixels() != previewAgain->GetPixels()))) {
         std::abort();
     }
     return 0;

@@ -8,6 +8,7 @@
 #include "framework/kernel/FileSystem.h"
 #include "framework/kernel/MemoryStreams.h"
 #include "framework/kernel/OutSerialiserFile.h"
+#include "framework/raster/DynamicBitmap.h"
 #include "framework/story/Index.h"
 #include "support/BookBuilder.h"
 
@@ -88,6 +89,21 @@ public:
 };
 Kernel::ClassProperties const FutureChapter::Ahead("BkCh", nullptr, 2, {}, nullptr);
 
+/// Stands for a preview in a file with whatever fields a test gives it.
+class ForgedBitmap final : public Stranger
+{
+public:
+    using Writer = std::function<void(Kernel::OutSerialiser &)>;
+    explicit ForgedBitmap(Writer fields) : m_Fields(std::move(fields)) {}
+    void Save(Kernel::OutSerialiser & out) const override { m_Fields(out); }
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override { return Forged; }
+    static Kernel::ClassProperties const Forged;
+
+private:
+    Writer m_Fields;
+};
+Kernel::ClassProperties const ForgedBitmap::Forged("DyBm", nullptr, 1, {}, nullptr);
+
 class BookFileTest : public testing::Test
 {
 protected:
@@ -151,6 +167,91 @@ TEST_F(BookFileTest, KeepsChaptersAndSettings)
     EXPECT_TRUE(loaded->IsPadStrays());
     EXPECT_FALSE(loaded->IsMergeStrays());
     EXPECT_EQ(loaded->GetSynchroniseSettings(), (BookController::SynchroniseSettings{true, false, true, false}));
+}
+
+TEST_F(BookFileTest, KeepsItsPreviewToTheBitInEveryPixelFormat)
+{
+    String const path = m_Folder / "book.kvbook";
+    for (int const format : {0, 1, 2, 3, 4, 5, 6, 7, 9, 10}) {
+        auto const bitmap = MakeCounted<Raster::DynamicBitmap>();
+        bitmap->Create(37, 11, static_cast<Raster::Format>(format), Raster::MipmapMode::OnDemand,
+                       Raster::HardwareCachePolicy::Default);
+        // Every byte value turns up, so floats hold infinities and no-numbers, too.
+        for (int y = 0; y < 11; ++y) {
+            for (std::size_t i = 0; i < bitmap->GetRowBytes(); ++i) {
+                bitmap->GetRow(y)[i] = static_cast<std::uint8_t>(i * i + static_cast<std::size_t>(y) * 91);
+            }
+        }
+        auto const book = MakeCounted<BookController>();
+        book->UpdateThumbnail(bitmap);
+        DocumentSaveResult saved;
+        book->SaveBookAsCopy(saved, path);
+        ASSERT_TRUE(saved.IsSuccess()) << saved.GetText();
+        auto const loaded = Load(path)->GetThumbnail();
+        ASSERT_TRUE(loaded) << "format " << format;
+        EXPECT_EQ(loaded->GetFormat(), bitmap->GetFormat());
+        EXPECT_EQ(loaded->GetWidth(), 37);
+        EXPECT_EQ(loaded->GetHeight(), 11);
+        EXPECT_EQ(loaded->GetMipmapMode(), Raster::MipmapMode::OnDemand);
+        EXPECT_EQ(loaded->GetPixels(), bitmap->GetPixels()) << "format " << format;
+    }
+}
+
+TEST_F(BookFileTest, PacksAWhitePreviewIntoLittle)
+{
+    String const path = m_Folder / "book.kvbook";
+    auto const bitmap = MakeCounted<Raster::DynamicBitmap>();
+    bitmap->Create(724, 1024, Raster::Format::Rgba8, Raster::MipmapMode::OnDemand,
+                   Raster::HardwareCachePolicy::Default);
+    bitmap->Fill(Raster::DynamicPixel({255, 255, 255, 255}, Raster::Format::Rgba8));
+    auto const book = MakeCounted<BookController>();
+    book->UpdateThumbnail(bitmap);
+    Kernel::MemoryOutStream stream;
+    Kernel::CollectingFileStoreOut store(true);
+    book->Save(stream, store);
+    EXPECT_LT(stream.GetBytes().size(), 20000U);
+    DocumentSaveResult saved;
+    book->SaveBookAsCopy(saved, path);
+    EXPECT_EQ(Load(path)->GetThumbnail()->GetPixels(), bitmap->GetPixels());
+}
+
+TEST_F(BookFileTest, RefusesAPreviewWhosePixelsDoNotFillItsSizeAndReadsTheRest)
+{
+    // Deflate's stored block of five bytes.
+    std::vector<std::uint8_t> const five{0x01, 5, 0, 0xFA, 0xFF, 'a', 'b', 'c', 'd', 'e'};
+    struct Row
+    {
+        char const * m_Why;
+        int m_Format;
+        int m_Width;
+        int m_Height;
+        std::vector<std::uint8_t> m_Packed;
+        bool m_Good;
+    };
+    String const path = m_Folder / "forged.kvbook";
+    for (Row const & row : {Row{"as it should be", 6, 5, 1, five, true},
+                            Row{"no such format", 8, 5, 1, five, false},
+                            Row{"a width below 0", 6, -5, -1, five, false},
+                            Row{"more pixels than were packed", 6, 5, 2, five, false},
+                            Row{"fewer", 6, 4, 1, five, false},
+                            Row{"not packed at all", 6, 3, 1, {0xFF, 0xFF, 0xFF}, false},
+                            Row{"no pixels for its size", 6, 3, 1, {}, false},
+                            Row{"more than the packed bytes can hold", 9, 32767, 32767, five, false},
+                            Row{"a side past every bound", 6, 2147483647, 1, five, false}}) {
+        auto const forged = MakeCounted<ForgedBitmap>([&row](Kernel::OutSerialiser & out) {
+            out.SaveType("frmt", row.m_Format);
+            out.SaveType("wdth", row.m_Width);
+            out.SaveType("hght", row.m_Height);
+            out.SaveData("pixl", row.m_Packed);
+        });
+        WriteArchive(path, "KvBk", "doc.dat", BookStream([&forged](Kernel::OutSerialiser & out) {
+                         out.SaveType("PStr", true);
+                         out.SaveObject("Thum", Counted<Kernel::Serialisable>(forged), true);
+                     }));
+        auto const book = Load(path);
+        EXPECT_TRUE(m_Loaded && book->IsPadStrays()) << row.m_Why;
+        EXPECT_EQ(book->GetThumbnail() != nullptr, row.m_Good) << row.m_Why;
+    }
 }
 
 TEST_F(BookFileTest, WritesItsFieldsInOneOrder)

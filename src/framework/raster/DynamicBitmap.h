@@ -3,8 +3,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "framework/kernel/Countable.h"
-#include "framework/kernel/Counted.h"
+#include "framework/kernel/Serialisable.h"
 #include "framework/raster/Format.h"
 
 namespace Raster
@@ -84,16 +83,29 @@ public:
     void Clear(bool const * abort);
 };
 
-/// A picture in memory that is kept and shared.
-class DynamicBitmap : public DynamicBase
+/// A picture in memory that is kept and shared, and can lie in a tagged stream, where its pixels are packed without loss.
+class DynamicBitmap : public DynamicBase, public Kernel::Serialisable
 {
 public:
+    /// Greatest width and height, and greatest number of bytes, of a bitmap that is read from a stream.
+    static constexpr int MaximumStoredSide = 32767;
+    static constexpr std::size_t MaximumStoredBytes = std::size_t(256) << 20;
+
     void Create(int width, int height, Format format, MipmapMode mipmaps, HardwareCachePolicy policy);
 
     [[nodiscard]] MipmapMode GetMipmapMode() const { return m_Mipmaps; }
     [[nodiscard]] HardwareCachePolicy GetHardwareCachePolicy() const { return m_Policy; }
 
+    void Save(Kernel::OutSerialiser & out) const override;
+    /// False if format, size and packed pixels do not belong together; nothing is allocated by a size that they could
+    /// not fill.
+    bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
+    [[nodiscard]] static Kernel::ClassProperties const & GetTypeClassProperties();
+
 private:
+    static Kernel::ClassProperties const ms_ClassProperties;
+
     MipmapMode m_Mipmaps = MipmapMode::None;
     HardwareCachePolicy m_Policy = HardwareCachePolicy::Default;
 };
