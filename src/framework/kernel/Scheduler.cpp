@@ -4,6 +4,7 @@
 #include "framework/kernel/Clock.h"
 
 #include <algorithm>
+#include <atomic>
 #include <condition_variable>
 #include <cstdint>
 #include <deque>
@@ -21,6 +22,13 @@ namespace
 
 constexpr int TurnBudget = 64;
 constexpr auto PatienceForAThread = std::chrono::milliseconds(1);
+/// A turn that was left to a thread which then took its time goes to another one after this.
+constexpr auto PatienceForASleeper = std::chrono::microseconds(200);
+/// Turns that follow each other more closely than this are a burst of short ones.
+constexpr auto GapInABurst = std::chrono::microseconds(20);
+/// How long a thread that has run out of turns looks out for the next one before it sleeps. To wake it costs more than
+/// most turns do, and turns come in bursts.
+constexpr auto LookOutTime = std::chrono::microseconds(20);
 constexpr auto IdleTimeOfAThread = std::chrono::seconds(2);
 /// No more threads than this are added in one step, so that a busy machine is not taken for a blocked pool.
 constexpr std::size_t ThreadsAtOnce = 4;
@@ -50,11 +58,18 @@ public:
     void GiveTurn(Counted<Schedulable> schedulable)
     {
         std::unique_lock lock(m_Lock);
-        m_Ready.push_back({std::move(schedulable), std::chrono::steady_clock::now()});
-        if (m_Sleeping >= m_Ready.size()) {
+        auto const now = std::chrono::steady_clock::now();
+        m_Ready.push_back({std::move(schedulable), now});
+        m_ReadyCount.store(m_Ready.size(), std::memory_order_relaxed);
+        if (m_LookingOut >= m_Ready.size()) {
+            return;
+        }
+        // In a burst, whoever has just begun a turn is back sooner than another thread would be awake.
+        bool const isBurst = now - m_LastTaken < GapInABurst && m_Threads > m_Sleeping + m_LookingOut;
+        if (!isBurst && m_Sleeping + m_LookingOut >= m_Ready.size()) {
             lock.unlock();
             m_TurnReady.notify_one();
-        } else if (m_Threads < m_FirstThreads) {
+        } else if (!isBurst && m_Threads < m_FirstThreads) {
             AddThread();
         } else if (!m_WatchesReady) {
             EnsureWatcher();
@@ -122,6 +137,15 @@ private:
         std::thread([this] { Work(); }).detach();
     }
 
+    /// Turns that have been ready since before then. With the lock held.
+    [[nodiscard]] std::size_t CountOlder(std::chrono::steady_clock::time_point since) const
+    {
+        // They stand in the order in which they came.
+        auto const younger = std::partition_point(m_Ready.begin(), m_Ready.end(),
+                                                  [since](Turn const & turn) { return turn.m_Since <= since; });
+        return static_cast<std::size_t>(younger - m_Ready.begin());
+    }
+
     /// With the lock held.
     void EnsureWatcher()
     {
@@ -134,6 +158,9 @@ private:
     {
         std::unique_lock lock(m_Lock);
         for (;;) {
+            if (m_Ready.empty() && m_LookingOut < m_FirstThreads) {
+                LookOut(lock);
+            }
             if (m_Ready.empty()) {
                 ++m_Sleeping;
                 bool const woken = m_TurnReady.wait_for(lock, IdleTimeOfAThread, [this] { return !m_Ready.empty(); });
@@ -145,6 +172,8 @@ private:
             }
             Counted<Schedulable> schedulable = std::move(m_Ready.front().m_Schedulable);
             m_Ready.pop_front();
+            m_LastTaken = std::chrono::steady_clock::now();
+            m_ReadyCount.store(m_Ready.size(), std::memory_order_relaxed);
             lock.unlock();
             schedulable->Fire(TurnBudget);
             schedulable.Reset();
@@ -152,7 +181,19 @@ private:
         }
     }
 
-    /// Adds threads for turns that found none, and gives turns whose time has come.
+    /// With the lock held, which it gives up meanwhile.
+    void LookOut(std::unique_lock<std::mutex> & lock)
+    {
+        ++m_LookingOut;
+        lock.unlock();
+        auto const until = std::chrono::steady_clock::now() + LookOutTime;
+        while (m_ReadyCount.load(std::memory_order_relaxed) == 0 && std::chrono::steady_clock::now() < until) {
+        }
+        lock.lock();
+        --m_LookingOut;
+    }
+
+    /// Wakes or adds threads for turns that found none, and gives turns whose time has come.
     void Watch()
     {
         std::unique_lock lock(m_Lock);
@@ -161,15 +202,17 @@ private:
             auto wake = std::chrono::steady_clock::time_point::max();
             if (!m_Ready.empty()) {
                 auto const now = std::chrono::steady_clock::now();
-                std::size_t const overdue = static_cast<std::size_t>(
-                    std::count_if(m_Ready.begin(), m_Ready.end(),
-                                  [&](Turn const & turn) { return now - turn.m_Since >= PatienceForAThread; }));
-                // A sleeping thread has been woken for its turn already and is on its way.
+                std::size_t const left = CountOlder(now - PatienceForASleeper);
+                for (std::size_t woken = 0; woken < std::min(left, m_Sleeping); ++woken) {
+                    m_TurnReady.notify_one();
+                }
+                // The sleeping ones are on their way.
+                std::size_t const overdue = CountOlder(now - PatienceForAThread);
                 std::size_t const missing = overdue > m_Sleeping ? overdue - m_Sleeping : 0;
                 for (std::size_t added = 0; added < std::min(missing, ThreadsAtOnce); ++added) {
                     AddThread();
                 }
-                wake = std::max(m_Ready.front().m_Since + PatienceForAThread, now + PatienceForAThread / 2);
+                wake = std::max(m_Ready.front().m_Since, now) + PatienceForASleeper;
             }
             if (!m_Timers.empty()) {
                 std::chrono::nanoseconds const now = Clock::Get().Steady();
@@ -201,8 +244,13 @@ private:
     std::condition_variable m_Watch;
     std::deque<Turn> m_Ready;
     std::multimap<std::chrono::nanoseconds, Counted<Schedulable>> m_Timers;
+    std::chrono::steady_clock::time_point m_LastTaken;
     std::size_t m_Threads = 0;
     std::size_t m_Sleeping = 0;
+    /// Threads that are awake without a turn, and will see one that comes.
+    std::size_t m_LookingOut = 0;
+    /// How many turns are ready, for who looks without the lock.
+    std::atomic<std::size_t> m_ReadyCount{0};
     bool m_HasWatcher = false;
     /// The watcher sleeps no longer than until the turn at the front has waited for too long.
     bool m_WatchesReady = false;
