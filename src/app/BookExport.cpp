@@ -1,9 +1,9 @@
 #include "app/BookExport.h"
 
+#include "app/BookSettings.h"
 #include "app/Interruption.h"
 #include "framework/document/VantraController.h"
 #include "framework/kernel/Progress.h"
-#include "framework/render/FileExportOptions.h"
 #include "output/ExportBookCommand.h"
 #include "output/ExportBookCompleteNotification.h"
 
@@ -13,22 +13,22 @@ namespace App
 namespace
 {
 
-Kernel::Consolidated<Renderer::FileExportOptions> MakeOptions(PdfWishes const & wishes)
+Kernel::Consolidated<Renderer::FileExportOptions> MakeOptions(Book::BookController const & book,
+                                                              PdfWishes const & wishes)
 {
-    auto const options = Kernel::MakeCounted<Renderer::FileExportOptionsPDF>();
-    Renderer::FileExportOptionsPDF::Settings settings;
-    settings.m_Language = String(wishes.m_Language);
+    BookSettings settings = BookSettings::Of(book);
+    if (settings.m_Pdf.m_Language.Empty()) {
+        settings.m_Pdf.m_Language = String(wishes.m_Language);
+    }
     if (0 <= wishes.m_FixedTime) {
-        settings.m_FixedTime = wishes.m_FixedTime;
+        settings.m_Pdf.m_FixedTime = wishes.m_FixedTime;
     }
-    if (wishes.m_HasMarks) {
-        settings.m_PrintersMarks.m_CropMarks = true;
-    }
-    options->SetSettings(settings);
-    options->SetIncludeBleed(wishes.m_IncludesBleed || wishes.m_HasMarks);
-    options->SetEmbedMetadata(wishes.m_EmbedsMetadata);
-    return Kernel::Consolidated<Renderer::FileExportOptions>(
-        Kernel::Counted<Renderer::FileExportOptions const>(options));
+    settings.m_Pdf.m_PrintersMarks.m_CropMarks = wishes.m_HasMarks.value_or(settings.m_Pdf.m_PrintersMarks.m_CropMarks);
+    // Marks without the bleed would stand round pages that can't be cut to them.
+    settings.m_IncludesBleed =
+        wishes.m_IncludesBleed.value_or(settings.m_IncludesBleed) || wishes.m_HasMarks.value_or(false);
+    settings.m_EmbedsMetadata = wishes.m_EmbedsMetadata.value_or(settings.m_EmbedsMetadata);
+    return settings.MakeExportOptions();
 }
 
 /// One sentence for results that have no text of their own; empty for those that have.
@@ -50,9 +50,9 @@ bool ExportBook(BookSession & session, Listener & listener, std::filesystem::pat
                 PdfWishes const & wishes, Import::MessageList & messages)
 {
     listener.Forget();
-    auto const command = Kernel::MakeCounted<Book::ExportBookCommand>(session.GetChapters(), String(target.string()),
-                                                                      MakeOptions(wishes), Kernel::SizeT<double>(),
-                                                                      false, false, false, true, nullptr);
+    auto const command = Kernel::MakeCounted<Book::ExportBookCommand>(
+        session.GetChapters(), String(target.string()), MakeOptions(*session.GetBook(), wishes),
+        Kernel::SizeT<double>(), false, false, false, true, nullptr);
     session.Run(command);
     VantraController::GetInstance().WaitUntilIdle();
     messages.Append(listener.TakeMessages());

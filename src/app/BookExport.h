@@ -3,17 +3,19 @@
 #include "app/BookSession.h"
 
 #include <filesystem>
+#include <optional>
 #include <string>
 
 namespace App
 {
 
-/// What the user wants of the PDF.
+/// What the user wants of the PDF. What is not said here is as the options say that the book keeps.
 struct PdfWishes
 {
-    bool m_HasMarks = false;
-    bool m_IncludesBleed = false;
-    bool m_EmbedsMetadata = true;
+    std::optional<bool> m_HasMarks;
+    std::optional<bool> m_IncludesBleed;
+    std::optional<bool> m_EmbedsMetadata;
+    /// Where the book names no language.
     std::string m_Language;
     /// Seconds since 1970 that stand for now in the file; negative for the clock.
     long long m_FixedTime = -1;

@@ -70,7 +70,6 @@ BookSession::~BookSession()
 
 void BookSession::WaitForRest()
 {
-    // A question that waits for its answer lets go of the wait: the answer will start work anew.
     while (Kernel::Activity::Rest::WaitingForUser == VantraController::GetInstance().WaitUntilIdle()) {
         std::this_thread::sleep_for(std::chrono::milliseconds(20));
     }
@@ -247,10 +246,12 @@ int BookSession::Update(Import::MessageList & messages)
 
 bool BookSession::Save(std::string const & path, Import::MessageList & messages)
 {
-    bool const isNew = m_Book->GetPath().Empty();
-    if (!isNew && !m_Book->IsDirty()) {
-        return true;
-    }
+    return m_Book->CanSave() ? SaveAnyway(path, messages) : true;
+}
+
+bool BookSession::SaveAnyway(std::string const & path, Import::MessageList & messages)
+{
+    bool const isNew = m_Book->GetPath().Empty() || m_Book->GetPath() != String(path);
     m_Listener.Forget();
     if (isNew) {
         Run(Kernel::MakeCounted<Book::SaveBookAsCommand>(String(path), false));

@@ -46,6 +46,11 @@ public:
     int Update(Import::MessageList & messages);
     /// Writes the book, to `path` if it has no file yet. False with a message if it failed.
     bool Save(std::string const & path, Import::MessageList & messages);
+    /// The same also for a book that has no unsaved work: settings reach the file without counting as such.
+    bool SaveAnyway(std::string const & path, Import::MessageList & messages);
+    /// Waits until nothing moves any more. A question that waits for its answer lets go of the wait: the answer starts
+    /// work anew.
+    void WaitForRest();
 
     /// Runs a command on the book's queue and waits for its end. If the user interrupts, the command's abort flag is
     /// raised.
@@ -64,7 +69,6 @@ private:
     };
 
     [[nodiscard]] std::vector<Extent> GetExtents() const;
-    void WaitForRest();
 
     Console & m_Console;
     Listener & m_Listener;

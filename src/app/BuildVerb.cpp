@@ -311,8 +311,7 @@ void AddBuildVerb(VerbList & verbs)
                                          "with Ctrl-C.",
                                          "Help"),
                                 [options](VerbContext & context) { return Build(context, *options).Run(); });
-    verb.add_option("FOLDER", options->m_Folder,
-                    Text("Folder with book.toml, SUMMARY.md or Markdown files", "Help"))
+    verb.add_option("FOLDER", options->m_Folder, Text("Folder with book.toml, SUMMARY.md or Markdown files", "Help"))
         ->required();
     verb.add_option("-o,--output", options->m_Output,
                     Text("The PDF; by default FOLDER/NAME.pdf, or what the manifest says", "Help"))

@@ -36,9 +36,8 @@ void TranslateHelp(CLI::App & program)
 int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, std::ostream & err,
                TerminalFacts const & terminal, AskUser ask)
 {
-    CLI::App app(
-        Text("Korvane sets folders of Markdown, and books of many documents, into print-ready PDF.", "Help"),
-        "korvane");
+    CLI::App app(Text("Korvane sets folders of Markdown, and books of many documents, into print-ready PDF.", "Help"),
+                 "korvane");
     TranslateHelp(app);
     app.require_subcommand(1);
     app.footer(Text("Example:", "Help") + "\n  korvane build my-book -o my-book.pdf\n\n" +
@@ -48,6 +47,15 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     AddBuildVerb(verbs);
     AddImportVerb(verbs);
     AddExportVerb(verbs);
+    AddNewVerb(verbs);
+    AddAddVerb(verbs);
+    AddRemoveVerb(verbs);
+    AddMoveVerb(verbs);
+    AddReplaceVerb(verbs);
+    AddKeyVerb(verbs);
+    AddStartPageVerb(verbs);
+    AddSetVerb(verbs);
+    AddSaveAsVerb(verbs);
     AddStatusVerb(verbs);
     AddShowVerb(verbs);
 

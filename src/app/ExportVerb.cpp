@@ -73,8 +73,12 @@ int RunExport(VerbContext & context, ExportOptions const & options)
         }
         if (isGood && !Interruption::IsRaised()) {
             PdfWishes wishes;
-            wishes.m_HasMarks = options.m_HasMarks;
-            wishes.m_IncludesBleed = options.m_IncludesBleed;
+            if (options.m_HasMarks) {
+                wishes.m_HasMarks = true;
+            }
+            if (options.m_IncludesBleed) {
+                wishes.m_IncludesBleed = true;
+            }
             wishes.m_Language = LanguageOf(session);
             wishes.m_FixedTime = options.m_FixedTime;
             isGood = ExportBook(session, listener, target, wishes, messages);

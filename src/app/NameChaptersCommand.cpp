@@ -8,9 +8,7 @@ namespace App
 
 Kernel::LocalisedString NameChaptersCommand::GetDescription() const
 {
-    constexpr char text[] = "Name chapters";
-    constexpr char context[] = "Book Commands";
-    return Kernel::LocalisedString(text, sizeof text - 1, context, sizeof context - 1);
+    return Kernel::LocalisedString("Name chapters", "Book Commands");
 }
 
 void NameChaptersCommand::Do()

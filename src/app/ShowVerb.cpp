@@ -1,13 +1,12 @@
 #include "app/BookSession.h"
 #include "app/DescribeDocument.h"
+#include "app/FileKind.h"
 #include "app/VerbList.h"
 #include "core/BookChapter.h"
 #include "framework/document/DocumentController.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/kernel/FileSystem.h"
 #include "import/Text.h"
-
-#include <fstream>
 
 namespace App
 {
@@ -17,29 +16,6 @@ using Import::Text;
 
 namespace
 {
-
-enum class FileKind
-{
-    Missing,
-    Book,
-    Document,
-    Other
-};
-
-/// The kind of a file by its first bytes, whatever its name says.
-FileKind KindOf(fs::path const & path)
-{
-    std::error_code error;
-    if (!fs::is_regular_file(path, error)) {
-        return FileKind::Missing;
-    }
-    char head[128] = {};
-    std::ifstream(path, std::ios::binary).read(head, sizeof head);
-    std::string_view const view(head, sizeof head);
-    return std::string_view::npos != view.find("KvBk")   ? FileKind::Book
-           : std::string_view::npos != view.find("KvDc") ? FileKind::Document
-                                                         : FileKind::Other;
-}
 
 Json DescribeBook(BookSession const & session, fs::path const & path)
 {
@@ -114,6 +90,7 @@ int RunShow(VerbContext & context, std::string const & file)
     case FileKind::Missing:
         messages.Error("file-missing", {file}, "There is no such file.");
         break;
+    case FileKind::Folder:
     case FileKind::Other:
         messages.Error("file-foreign", {file}, "This is neither a book (.kvbook) nor a document (.kvdoc).");
         break;

@@ -1,10 +1,10 @@
 #include "app/BookSession.h"
+#include "app/FileKind.h"
 #include "app/Json.h"
+#include "app/TextTable.h"
 #include "app/VerbList.h"
 #include "core/BookChapter.h"
 #include "import/Text.h"
-
-#include <algorithm>
 
 namespace App
 {
@@ -35,50 +35,99 @@ char const * NameOf(Book::BookChapter::Status status)
     return "restricted";
 }
 
-std::string Padded(std::string text, std::size_t width)
+/// The same for people, in a word or two.
+TableCell Describe(Book::BookChapter::Status status)
 {
-    std::size_t length = 0;
-    for (char const c : text) {
-        length += 0x80 != (static_cast<unsigned char>(c) & 0xC0) ? 1 : 0;
+    switch (status) {
+    case Book::BookChapter::Status::Ok:
+        return {Text("ok", "Chapter state"), CellLook::Good};
+    case Book::BookChapter::Status::OpenForEdit:
+        return {Text("open", "Chapter state"), CellLook::Good};
+    case Book::BookChapter::Status::Locked:
+        return {Text("locked", "Chapter state"), CellLook::Warning};
+    case Book::BookChapter::Status::NotFound:
+        return {Text("missing", "Chapter state"), CellLook::Bad};
+    case Book::BookChapter::Status::OutOfDate:
+        return {Text("changed", "Chapter state"), CellLook::Warning};
+    case Book::BookChapter::Status::Restricted:
+        break;
     }
-    text.append(length < width ? width - length : 0, ' ');
-    return text;
+    return {Text("restricted", "Chapter state"), CellLook::Warning};
 }
 
-int RunStatus(VerbContext & context, std::string const & file)
+CellLook LookOf(PreflightResult::Status status)
+{
+    return PreflightResult::Status::Error == status     ? CellLook::Bad
+           : PreflightResult::Status::Warning == status ? CellLook::Warning
+                                                        : CellLook::Dim;
+}
+
+Json DescribeChapter(Book::BookChapter const & chapter, int index)
+{
+    return {{"index", index},
+            {"name", chapter.GetName().ToStd()},
+            {"path", chapter.GetPath().ToStd()},
+            {"key", chapter.IsKey()},
+            {"status", NameOf(chapter.GetStatus())},
+            {"pages", chapter.DescribePages().ToStd()},
+            {"pageCount", chapter.GetPageCount()},
+            {"startFromPage", chapter.GetStartFromPage()},
+            {"cachedStartPage", chapter.GetCachedStartPage()},
+            {"preflight", chapter.GetPreflightDescription().ToStd()}};
+}
+
+std::vector<TableCell> MakeRow(Book::BookChapter const & chapter, int index)
+{
+    int const pages = chapter.GetPageCount();
+    return {{chapter.IsKey() ? "\u2605" : "", CellLook::Strong},
+            {std::to_string(index + 1), CellLook::Dim},
+            {chapter.GetName().ToStd(), CellLook::Plain},
+            {chapter.DescribePages().ToStd(), CellLook::Plain},
+            {0 < pages ? std::to_string(pages) : "", CellLook::Dim},
+            Describe(chapter.GetStatus()),
+            {chapter.GetPreflightDescription().ToStd(), LookOf(chapter.GetPreflightStatus())},
+            {fs::path(chapter.GetPath().ToStd()).filename().string(), CellLook::Dim}};
+}
+
+struct StatusOptions
+{
+    std::string m_Book;
+    std::string m_Colour = "auto";
+};
+
+int RunStatus(VerbContext & context, StatusOptions const & options)
 {
     Import::MessageList messages;
     Console & console = context.m_Console;
     std::error_code error;
-    fs::path const path = fs::absolute(file, error).lexically_normal();
+    fs::path const path = fs::absolute(options.m_Book, error).lexically_normal();
     Json chapters = Json::array();
-    std::vector<std::string> lines;
+    TextTable table({{""},
+                     {Text("No", "Table"), false, true},
+                     {Text("Chapter", "Table"), true},
+                     {Text("Pages", "Table")},
+                     {Text("Count", "Table"), false, true},
+                     {Text("State", "Table")},
+                     {Text("Preflight", "Table"), true},
+                     {Text("Document", "Table"), true}});
     bool isGood = false;
     int pages = 0;
-    {
+    int count = 0;
+    if (FileKind::Missing == KindOf(path)) {
+        messages.Error("book-missing", {options.m_Book},
+                       Text("There is no such book file; \"korvane new\" makes one.", "Program"));
+    } else {
         Listener listener(console, context.m_Ask, context.m_Answers);
-        BookSession session(console, listener);
-        isGood = session.Open(path.string(), messages);
-        if (isGood) {
-            session.RefreshChapters();
-            int index = 0;
-            for (auto const & chapter : session.GetChapters()) {
-                pages += chapter->GetPageCount();
-                chapters.push_back({{"index", index},
-                                    {"name", chapter->GetName().ToStd()},
-                                    {"path", chapter->GetPath().ToStd()},
-                                    {"key", chapter->IsKey()},
-                                    {"status", NameOf(chapter->GetStatus())},
-                                    {"pages", chapter->DescribePages().ToStd()},
-                                    {"pageCount", chapter->GetPageCount()},
-                                    {"startFromPage", chapter->GetStartFromPage()},
-                                    {"cachedStartPage", chapter->GetCachedStartPage()},
-                                    {"preflight", chapter->GetPreflightDescription().ToStd()}});
-                lines.push_back(
-                    Padded(std::to_string(index + 1), 4) + Padded(chapter->GetName().ToStd(), 40) + "  " +
-                    Padded(chapter->DescribePages().ToStd(), 14) + Padded(chapter->GetStatusDescription().ToStd(), 12) +
-                    chapter->GetPreflightDescription().ToStd() + (chapter->IsKey() ? " (style source)" : ""));
-                ++index;
+        {
+            BookSession session(console, listener);
+            isGood = session.Open(path.string(), messages);
+            if (isGood) {
+                session.RefreshChapters();
+                for (auto const & chapter : session.GetChapters()) {
+                    pages += chapter->GetPageCount();
+                    chapters.push_back(DescribeChapter(*chapter, count));
+                    table.AddRow(MakeRow(*chapter, count++));
+                }
             }
         }
         messages.Append(listener.TakeMessages());
@@ -94,8 +143,14 @@ int RunStatus(VerbContext & context, std::string const & file)
                                  {"messages", ToJson(messages)}}));
     }
     console.Tell(messages);
-    for (std::string const & line : lines) {
-        console.Say(line.substr(0, line.find_last_not_of(' ') + 1));
+    bool const hasColour =
+        "always" == options.m_Colour || ("auto" == options.m_Colour && console.Terminal().m_HasColour);
+    for (std::string const & line : table.Layout(console.Terminal().m_Columns, hasColour)) {
+        console.Say(line);
+    }
+    if (isGood) {
+        console.Say(Import::CountText("%1 chapter", "%1 chapters", "Program", count) + ", " +
+                    Import::CountText("%1 page", "%1 pages", "Program", pages));
     }
     return isGood ? ExitFine : ExitFailed;
 }
@@ -104,11 +159,15 @@ int RunStatus(VerbContext & context, std::string const & file)
 
 void AddStatusVerb(VerbList & verbs)
 {
-    auto const book = std::make_shared<std::string>();
+    auto const options = std::make_shared<StatusOptions>();
     CLI::App & verb = verbs.Add("status", Text("Tell the state of a book's chapters", "Help"),
                                 "  korvane status my-book/.korvane/book.kvbook",
-                                [book](VerbContext & context) { return RunStatus(context, *book); });
-    verb.add_option("BOOK", *book, Text("The book file", "Help"))->required();
+                                [options](VerbContext & context) { return RunStatus(context, *options); });
+    verb.add_option("BOOK", options->m_Book, Text("The book file", "Help"))->required();
+    verb.add_option("--colour,--color", options->m_Colour,
+                    Text("When to use colours; by default on a terminal", "Help"))
+        ->type_name("auto|always|never")
+        ->check(CLI::IsMember({"auto", "always", "never"}));
     verbs.AddAnswers(verb);
 }
 

@@ -7,9 +7,7 @@ namespace App
 
 using Import::Text;
 
-VerbList::VerbList(CLI::App & program) : m_Program(program)
-{
-}
+VerbList::VerbList(CLI::App & program) : m_Program(program) {}
 
 CLI::App & VerbList::Add(std::string const & name, std::string const & purpose, std::string const & example, Runner run)
 {

@@ -35,6 +35,21 @@ void AddBuildVerb(VerbList & verbs);
 void AddImportVerb(VerbList & verbs);
 /// Writes a book into a PDF.
 void AddExportVerb(VerbList & verbs);
+/// Makes a book.
+void AddNewVerb(VerbList & verbs);
+/// Shape a book's chapter list.
+void AddAddVerb(VerbList & verbs);
+void AddRemoveVerb(VerbList & verbs);
+void AddMoveVerb(VerbList & verbs);
+void AddReplaceVerb(VerbList & verbs);
+/// Sets which chapter is the style source.
+void AddKeyVerb(VerbList & verbs);
+/// Sets the page that a chapter starts at.
+void AddStartPageVerb(VerbList & verbs);
+/// Shows and changes what a book keeps for all of its chapters.
+void AddSetVerb(VerbList & verbs);
+/// Writes a book to another file.
+void AddSaveAsVerb(VerbList & verbs);
 /// Tells the state of a book's chapters.
 void AddStatusVerb(VerbList & verbs);
 /// Tells what is in a book or document file.

@@ -44,8 +44,8 @@ void BookController::DoAddChapters()
 
 void BookController::AskAboutOldVersion(String const & path)
 {
-    Kernel::LocalisedString const title("Old document version", "Add old chapter");
-    Kernel::LocalisedString const question(
+    auto const title = Kernel::LocalisedString("Old document version", "Add old chapter");
+    auto const question = Kernel::LocalisedString(
         "The document %1 is from an older version of Korvane. Adding it to a book will result in the file being "
         "modified and no longer usable in the previous version.\nAre you sure you wish to add it?",
         "Add old chapter");

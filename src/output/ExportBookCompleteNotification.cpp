@@ -17,21 +17,21 @@ Kernel::LocalisedString TextOf(ExportResult result)
 {
     switch (result) {
     case ExportResultAccessDenied:
-        return {"Access was denied:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("Access was denied:\n%1\n", "Export errors");
     case ExportResultPermissionDenied:
-        return {"Permission was denied:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("Permission was denied:\n%1\n", "Export errors");
     case ExportResultOutOfSpace:
-        return {"The destination device is out of space:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("The destination device is out of space:\n%1\n", "Export errors");
     case ExportResultWriteFailed:
-        return {"Failed to write to the file:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("Failed to write to the file:\n%1\n", "Export errors");
     case ExportResultChangesNotAllowed:
-        return {"Changes to the file are not allowed:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("Changes to the file are not allowed:\n%1\n", "Export errors");
     case ExportResultFolderNotCreated:
-        return {"The output folder could not be created:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("The output folder could not be created:\n%1\n", "Export errors");
     case ExportResultFileNotCreated:
-        return {"The file could not be created:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("The file could not be created:\n%1\n", "Export errors");
     case ExportResultMetadataFailed:
-        return {"Metadata could not be embedded:\n%1\n", "Export errors"};
+        return Kernel::LocalisedString("Metadata could not be embedded:\n%1\n", "Export errors");
     default:
         return {};
     }
@@ -43,7 +43,10 @@ ExportBookCompleteNotification::ExportBookCompleteNotification(Kernel::Counted<B
                                                                String const & filename, bool isTemp,
                                                                Kernel::Counted<Raster::DynamicBitmap> previewBitmap,
                                                                Kernel::Consolidated<Raster::ICCProfile> previewProfile)
-    : BookNotification(book), m_IsTemp(isTemp), m_OriginalFilename(filename), m_PreviewBitmap(std::move(previewBitmap)),
+    : BookNotification(book),
+      m_IsTemp(isTemp),
+      m_OriginalFilename(filename),
+      m_PreviewBitmap(std::move(previewBitmap)),
       m_PreviewProfile(std::move(previewProfile))
 {
 }

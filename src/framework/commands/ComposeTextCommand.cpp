@@ -9,7 +9,7 @@ CommandRegistration const s_Compose(typeid(ComposeTextCommand), "ComposeTextComm
 
 Kernel::LocalisedString ComposeTextCommand::GetDescription() const
 {
-    return {"Compose text", "Document Command"};
+    return Kernel::LocalisedString("Compose text", "Document Command");
 }
 
 void ComposeTextCommand::Do()

@@ -9,7 +9,7 @@ CommandRegistration const s_Convert(typeid(ConvertFormatOrProfileCommand), "Conv
 
 Kernel::LocalisedString ConvertFormatOrProfileCommand::GetDescription() const
 {
-    return {"Convert colours for output", "Document Command"};
+    return Kernel::LocalisedString("Convert colours for output", "Document Command");
 }
 
 void ConvertFormatOrProfileCommand::Do()

@@ -89,7 +89,7 @@ IndexTopicCommand::Require(Story::Index const & index, Kernel::Counted<Story::In
 
 Kernel::LocalisedString AddIndexTopicCommand::GetDescription() const
 {
-    return {"Add index topics", "Document Command"};
+    return Kernel::LocalisedString("Add index topics", "Document Command");
 }
 
 void AddIndexTopicCommand::Change(Story::Index & index)
@@ -104,7 +104,7 @@ namespace Commands
 
 Kernel::LocalisedString SetIndexTopicGUIDCommand::GetDescription() const
 {
-    return {"Identify index topic", "Document Command"};
+    return Kernel::LocalisedString("Identify index topic", "Document Command");
 }
 
 void SetIndexTopicGUIDCommand::Change(Story::Index & index)
@@ -114,7 +114,7 @@ void SetIndexTopicGUIDCommand::Change(Story::Index & index)
 
 Kernel::LocalisedString RenameIndexTopicCommand::GetDescription() const
 {
-    return {"Rename index topic", "Document Command"};
+    return Kernel::LocalisedString("Rename index topic", "Document Command");
 }
 
 void RenameIndexTopicCommand::Change(Story::Index & index)
@@ -124,7 +124,7 @@ void RenameIndexTopicCommand::Change(Story::Index & index)
 
 Kernel::LocalisedString SetIndexTopicSortCommand::GetDescription() const
 {
-    return {"Sort index topic", "Document Command"};
+    return Kernel::LocalisedString("Sort index topic", "Document Command");
 }
 
 void SetIndexTopicSortCommand::Change(Story::Index & index)
@@ -134,7 +134,7 @@ void SetIndexTopicSortCommand::Change(Story::Index & index)
 
 Kernel::LocalisedString ReparentIndexTopicCommand::GetDescription() const
 {
-    return {"Move index topic", "Document Command"};
+    return Kernel::LocalisedString("Move index topic", "Document Command");
 }
 
 void ReparentIndexTopicCommand::Change(Story::Index & index)
@@ -145,7 +145,7 @@ void ReparentIndexTopicCommand::Change(Story::Index & index)
 
 Kernel::LocalisedString AddIndexCrossReferenceCommand::GetDescription() const
 {
-    return {"Add index cross-reference", "Document Command"};
+    return Kernel::LocalisedString("Add index cross-reference", "Document Command");
 }
 
 void AddIndexCrossReferenceCommand::Change(Story::Index & index)
@@ -155,7 +155,7 @@ void AddIndexCrossReferenceCommand::Change(Story::Index & index)
 
 Kernel::LocalisedString DeleteIndexCrossReferenceCommand::GetDescription() const
 {
-    return {"Delete index cross-reference", "Document Command"};
+    return Kernel::LocalisedString("Delete index cross-reference", "Document Command");
 }
 
 void DeleteIndexCrossReferenceCommand::Change(Story::Index & index)
@@ -165,7 +165,7 @@ void DeleteIndexCrossReferenceCommand::Change(Story::Index & index)
 
 Kernel::LocalisedString DeleteIndexTopicCommand::GetDescription() const
 {
-    return {"Delete index topics", "Document Command"};
+    return Kernel::LocalisedString("Delete index topics", "Document Command");
 }
 
 void DeleteIndexTopicCommand::Change(Story::Index & index)

@@ -49,7 +49,7 @@ void ModifySectionCommand::SetFormat(PageNumberFormat format, String const & pre
 
 Kernel::LocalisedString ModifySectionCommand::GetDescription() const
 {
-    return {"Change section", "Document Command"};
+    return Kernel::LocalisedString("Change section", "Document Command");
 }
 
 void ModifySectionCommand::Do()
@@ -85,7 +85,7 @@ void ModifySectionCommand::Notify(std::vector<Kernel::Counted<Kernel::Notificati
 
 Kernel::LocalisedString InsertSectionCommand::GetDescription() const
 {
-    return {"Insert section", "Document Command"};
+    return Kernel::LocalisedString("Insert section", "Document Command");
 }
 
 void InsertSectionCommand::Do()
@@ -113,7 +113,7 @@ void InsertSectionCommand::Notify(std::vector<Kernel::Counted<Kernel::Notificati
 
 Kernel::LocalisedString DeleteSectionCommand::GetDescription() const
 {
-    return {"Delete section", "Document Command"};
+    return Kernel::LocalisedString("Delete section", "Document Command");
 }
 
 void DeleteSectionCommand::Do()

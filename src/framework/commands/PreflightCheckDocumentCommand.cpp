@@ -12,7 +12,7 @@ CommandRegistration const s_Preflight(typeid(PreflightCheckDocumentCommand), "Pr
 
 Kernel::LocalisedString PreflightCheckDocumentCommand::GetDescription() const
 {
-    return {"Preflight", "Document Command"};
+    return Kernel::LocalisedString("Preflight", "Document Command");
 }
 
 void PreflightCheckDocumentCommand::Do()

@@ -17,7 +17,7 @@ constexpr int MaximumKeptNames = 100;
 
 Kernel::LocalisedString SaveDocumentCommand::GetDescription() const
 {
-    return {"Save document", "Document Command"};
+    return Kernel::LocalisedString("Save document", "Document Command");
 }
 
 void SaveDocumentCommand::Do()

@@ -10,7 +10,7 @@ CommandRegistration const s_Set(typeid(SetMetadataCommand), "SetMetadataCommand"
 
 Kernel::LocalisedString SetMetadataTimestampCommand::GetDescription() const
 {
-    return {"Set time stamp", "Document Command"};
+    return Kernel::LocalisedString("Set time stamp", "Document Command");
 }
 
 void SetMetadataTimestampCommand::Do()
@@ -28,7 +28,7 @@ void SetMetadataTimestampCommand::Do()
 
 Kernel::LocalisedString SetMetadataCommand::GetDescription() const
 {
-    return {"Change document information", "Document Command"};
+    return Kernel::LocalisedString("Change document information", "Document Command");
 }
 
 void SetMetadataCommand::Do()

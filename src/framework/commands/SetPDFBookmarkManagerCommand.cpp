@@ -9,7 +9,7 @@ CommandRegistration const s_Set(typeid(SetPDFBookmarkManagerCommand), "SetPDFBoo
 
 Kernel::LocalisedString SetPDFBookmarkManagerCommand::GetDescription() const
 {
-    return {"Change bookmarks", "Document Command"};
+    return Kernel::LocalisedString("Change bookmarks", "Document Command");
 }
 
 void SetPDFBookmarkManagerCommand::Do()

@@ -89,7 +89,7 @@ FormatTextCommand::FormatTextCommand(Kernel::Counted<Story::Delta const> const &
 
 Kernel::LocalisedString FormatTextCommand::GetDescription() const
 {
-    return {"Format text", "Document Command"};
+    return Kernel::LocalisedString("Format text", "Document Command");
 }
 
 void FormatTextCommand::Change(Story::Story & story)
@@ -105,7 +105,7 @@ void FormatTextCommand::Change(Story::Story & story)
 
 Kernel::LocalisedString ChangeNoteCommand::GetDescription() const
 {
-    return {"Change note", "Document Command"};
+    return Kernel::LocalisedString("Change note", "Document Command");
 }
 
 void ChangeNoteCommand::Change(Story::Story & story)
@@ -159,7 +159,7 @@ PasteStoryCommand::PasteStoryCommand(Kernel::NonCounted<Story::Story const> stor
 
 Kernel::LocalisedString PasteStoryCommand::GetDescription() const
 {
-    return {"Paste text", "Document Command"};
+    return Kernel::LocalisedString("Paste text", "Document Command");
 }
 
 void PasteStoryCommand::AddStyles()
@@ -208,7 +208,7 @@ void PasteStoryCommand::Change(Story::Story & story)
 
 Kernel::LocalisedString InsertTextCommand::GetDescription() const
 {
-    return {"Type text", "Document Command"};
+    return Kernel::LocalisedString("Type text", "Document Command");
 }
 
 void InsertTextCommand::Change(Story::Story & story)
@@ -231,7 +231,7 @@ void InsertTextCommand::Change(Story::Story & story)
 
 Kernel::LocalisedString SetStyleSheetCommand::GetDescription() const
 {
-    return {"Change styles", "Document Command"};
+    return Kernel::LocalisedString("Change styles", "Document Command");
 }
 
 void SetStyleSheetCommand::Do()
@@ -257,7 +257,7 @@ namespace Commands
 
 Kernel::LocalisedString SetAnchorDataGUIDCommand::GetDescription() const
 {
-    return {"Identify anchor", "Document Command"};
+    return Kernel::LocalisedString("Identify anchor", "Document Command");
 }
 
 void SetAnchorDataGUIDCommand::Do()

@@ -10,7 +10,7 @@ CommandRegistration const s_Redo(typeid(RedoCommand), "RedoCommand");
 
 Kernel::LocalisedString UndoCommand::GetDescription() const
 {
-    return {"Undo", "Document Command"};
+    return Kernel::LocalisedString("Undo", "Document Command");
 }
 
 void UndoCommand::Do()
@@ -34,7 +34,7 @@ void UndoCommand::Notify(std::vector<Kernel::Counted<Kernel::Notification>> & no
 
 Kernel::LocalisedString RedoCommand::GetDescription() const
 {
-    return {"Redo", "Document Command"};
+    return Kernel::LocalisedString("Redo", "Document Command");
 }
 
 void RedoCommand::Do()

@@ -9,7 +9,7 @@ CommandRegistration const s_Update(typeid(UpdateRunningHeadersCommand), "UpdateR
 
 Kernel::LocalisedString UpdateRunningHeadersCommand::GetDescription() const
 {
-    return {"Update running heads", "Document Command"};
+    return Kernel::LocalisedString("Update running heads", "Document Command");
 }
 
 void UpdateRunningHeadersCommand::Do()

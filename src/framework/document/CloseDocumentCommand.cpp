@@ -24,7 +24,10 @@ using Callbacks = std::vector<std::function<void()>>;
 class ClosingTurn : public DocumentCommand
 {
 public:
-    Kernel::LocalisedString GetDescription() const override { return {"Close document", "Command description"}; }
+    Kernel::LocalisedString GetDescription() const override
+    {
+        return Kernel::LocalisedString("Close document", "Command description");
+    }
     void Undo() override {}
     void Notify(std::vector<Counted<Kernel::Notification>> &) override {}
     bool ShouldStackForUndo() const override { return false; }
@@ -41,9 +44,8 @@ public:
                             Counted<CloseDocumentNotification> notification, Callbacks callbacks);
     /// A close that comes second: its end is that of the first.
     static void Follow(Counted<DocumentController> const & document, Callbacks callbacks);
-    static void EnqueueLeaving(Counted<DocumentController> const & document,
-                               Counted<ApplicationTerminator> terminator, bool saveFirst, bool closeUnsaved,
-                               Callbacks callbacks);
+    static void EnqueueLeaving(Counted<DocumentController> const & document, Counted<ApplicationTerminator> terminator,
+                               bool saveFirst, bool closeUnsaved, Callbacks callbacks);
 
     [[nodiscard]] static DocumentRegistry & Registry() { return *VantraController::GetInstance().m_Registry; }
 };
@@ -56,7 +58,8 @@ class LastTurn final : public ClosingTurn
 {
 public:
     LastTurn(Counted<ApplicationTerminator> terminator, Counted<CloseDocumentNotification> notification)
-        : m_Terminator(std::move(terminator)), m_Notification(std::move(notification))
+        : m_Terminator(std::move(terminator)),
+          m_Notification(std::move(notification))
     {
     }
 
@@ -70,7 +73,8 @@ public:
         }
         if (m_Terminator) {
             Counted<DocumentController const> const document(GetDocument().Get());
-            AddCompletionCallbacks({[terminator = m_Terminator, document] { terminator->OnDocumentClose(document, true); }});
+            AddCompletionCallbacks(
+                {[terminator = m_Terminator, document] { terminator->OnDocumentClose(document, true); }});
         }
     }
 
@@ -84,7 +88,9 @@ class LeavingTurn final : public ClosingTurn
 {
 public:
     LeavingTurn(Counted<ApplicationTerminator> terminator, bool saveFirst, bool closeUnsaved)
-        : m_Terminator(std::move(terminator)), m_SaveFirst(saveFirst), m_CloseUnsaved(closeUnsaved)
+        : m_Terminator(std::move(terminator)),
+          m_SaveFirst(saveFirst),
+          m_CloseUnsaved(closeUnsaved)
     {
     }
 
@@ -182,9 +188,10 @@ void CloseDocumentTurn::EnqueueLeaving(Counted<DocumentController> const & docum
 }
 
 CloseDocumentCommand::CloseDocumentCommand(Counted<DocumentController const> document,
-                                           Counted<ApplicationTerminator> terminator, bool saveFirst,
-                                           bool closeUnsaved)
-    : m_Document(std::move(document)), m_Terminator(std::move(terminator)), m_SaveFirst(saveFirst),
+                                           Counted<ApplicationTerminator> terminator, bool saveFirst, bool closeUnsaved)
+    : m_Document(std::move(document)),
+      m_Terminator(std::move(terminator)),
+      m_SaveFirst(saveFirst),
       m_CloseUnsaved(closeUnsaved)
 {
 }
@@ -193,7 +200,7 @@ CloseDocumentCommand::~CloseDocumentCommand() = default;
 
 Kernel::LocalisedString CloseDocumentCommand::GetDescription() const
 {
-    return {"Close document", "Command description"};
+    return Kernel::LocalisedString("Close document", "Command description");
 }
 
 void CloseDocumentCommand::Do()

@@ -44,8 +44,10 @@ VantraController & VantraController::GetInstance()
 }
 
 VantraController::VantraController()
-    : m_Registry(std::make_unique<DocumentRegistry>()), m_Queue(Kernel::MakeCounted<ApplicationQueue>()),
-      m_UpViewResampler(Raster::ResamplerBicubic), m_DownViewResampler(Raster::ResamplerBilinear)
+    : m_Registry(std::make_unique<DocumentRegistry>()),
+      m_Queue(Kernel::MakeCounted<ApplicationQueue>()),
+      m_UpViewResampler(Raster::ResamplerBicubic),
+      m_DownViewResampler(Raster::ResamplerBilinear)
 {
 }
 
@@ -83,7 +85,7 @@ bool VantraController::Refuses(DocumentController const & document, DomainComman
     if (!byUser || !document.IsBookLockEngaged()) {
         return false;
     }
-    Kernel::LocalisedString const reason(
+    auto const reason = Kernel::LocalisedString(
         "The document is part of a book that is being updated or output. Try again when that has ended.",
         "Document Commands");
     Broadcast(Kernel::MakeCounted<CommandRefusedNotification>(Counted<DocumentController const>(&document),
@@ -117,7 +119,8 @@ bool VantraController::EnqueueCommandAndWait(Counted<DocumentCommand> command,
 bool VantraController::EnqueueCommandAndWait(Counted<DocumentCommand> command, Counted<DocumentController> document,
                                              bool byUser)
 {
-    if (Refuses(*document, *command, byUser) || !document->DomainController::EnqueueCommandAndWait(std::move(command))) {
+    if (Refuses(*document, *command, byUser) ||
+        !document->DomainController::EnqueueCommandAndWait(std::move(command))) {
         return false;
     }
     if (document->IsTextDirty() && m_Registry->IsInBackgroundOnly(*document)) {
