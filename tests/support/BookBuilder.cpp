@@ -8,6 +8,7 @@
 #include "framework/document/DocumentSaveResult.h"
 #include "framework/document/DocumentSettings.h"
 #include "framework/document/VantraController.h"
+#include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Format.h"
 #include "framework/story/AnchorData.h"
 #include "framework/story/NoteAtt.h"
@@ -94,6 +95,9 @@ BookBuilder::~BookBuilder()
 String BookBuilder::WriteChapter(std::string const & name, ChapterSketch const & sketch)
 {
     String const path = m_Folder / name;
+    if (Kernel::FileSystem::Exists(path)) {
+        Rest(); // A pass over the book may hold the file.
+    }
     Counted<DocumentController> const document = DocumentController::CreateDocument(SettingsOf(sketch), TextOf(sketch));
     document->SetRestricted(sketch.m_Restricted);
     DocumentSaveResult result;
