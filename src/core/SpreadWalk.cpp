@@ -61,7 +61,11 @@ int ExportingPageCount(const Spreads & spreads)
 
 bool AllNonExporting(const Spreads & spreads)
 {
-    return ExportingPageCount(spreads) == 0;
+    // Asked at every step of a walk, and answered by the first spreads nearly always.
+    return std::all_of(spreads.begin(), spreads.end(), [](const SpreadInfo & spread) {
+        return std::find(spread.m_NonExporting.begin(), spread.m_NonExporting.end(), false) ==
+               spread.m_NonExporting.end();
+    });
 }
 
 Place FirstExporting(const Spreads & spreads)

@@ -137,6 +137,8 @@ private:
     void CollatePDFBookmarksForChapter(Kernel::Counted<BookChapter const> chapter,
                                        Kernel::Counted<DocumentController const> document);
 
+    /// Fills `m_FirstEntries` from the map.
+    void IndexExportMap();
     /// First ref of a chapter's spread, with its 1-based output page; page -1 if there is none.
     std::pair<int, ExportPageRef const *> FindSpread(int chapterIndex, int spread) const;
 
@@ -148,8 +150,8 @@ private:
     Kernel::Counted<Kernel::Progress> m_Progress;
     std::map<String, AnchorTarget> m_AnchorTargets;
     std::vector<ExportPageEntry> m_ExportMap;
-    /// First page and ref of the map for a chapter's spread: every link and anchor asks.
-    std::map<std::pair<int, int>, std::pair<std::size_t, std::size_t>> m_FirstRefs;
+    /// For each chapter and spread the first entry of the map that holds it, -1 for none: every link and anchor asks.
+    std::vector<std::vector<int>> m_FirstEntries;
     std::vector<Kernel::Counted<Renderer::PrintersMarksHelper>> m_PrintersMarks;
     std::vector<Kernel::Counted<Renderer::PdfBookmark const>> m_Bookmarks;
     std::vector<String> m_OutputPaths;

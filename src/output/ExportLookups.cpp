@@ -58,15 +58,21 @@ Kernel::Counted<Renderer::PrintersMarksHelper> ExportBookCommand::GetPrintersMar
 
 std::pair<int, ExportPageRef const *> ExportBookCommand::FindSpread(int chapterIndex, int spread) const
 {
-    if (chapterIndex < 0 || spread < 0) {
+    if (chapterIndex < 0 || static_cast<std::size_t>(chapterIndex) >= m_FirstEntries.size()) {
         return {-1, nullptr};
     }
-    auto const found = m_FirstRefs.find({chapterIndex, spread});
-    if (found == m_FirstRefs.end()) {
+    std::vector<int> const & spreads = m_FirstEntries[static_cast<std::size_t>(chapterIndex)];
+    int const page = spread >= 0 && static_cast<std::size_t>(spread) < spreads.size()
+                         ? spreads[static_cast<std::size_t>(spread)]
+                         : -1;
+    if (page == -1) {
         return {-1, nullptr};
     }
-    auto const & [page, ref] = found->second;
-    return {static_cast<int>(page) + 1, &m_ExportMap[page][ref]};
+    ExportPageEntry const & entry = m_ExportMap[static_cast<std::size_t>(page)];
+    auto const ref = std::find_if(entry.begin(), entry.end(), [&](ExportPageRef const & candidate) {
+        return candidate.m_Chapter == chapterIndex && candidate.m_Spread == spread;
+    });
+    return {page + 1, &*ref};
 }
 
 int ExportBookCommand::OutputPageFromSpreadPos(Kernel::Counted<BookChapter const> chapter, int spread,

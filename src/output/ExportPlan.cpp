@@ -161,7 +161,7 @@ void ExportBookCommand::BuildExportMap()
     MapBuilder builder(m_ExportMap, m_PadStrays, m_MergeStrays);
     for (std::size_t index = 0; index < m_Chapters.size(); ++index) {
         Kernel::Counted<BookChapter const> const & chapter = m_Chapters[index];
-        if (chapter->GetSpreadInfo().empty()) {
+        if (chapter->GetPageCount() == 0) {
             continue; // Never opened, so it has no page to place.
         }
         if (m_SinglePages) {
@@ -170,11 +170,25 @@ void ExportBookCommand::BuildExportMap()
             builder.AddSpreads(chapter, static_cast<int>(index));
         }
     }
-    m_FirstRefs.clear();
+    IndexExportMap();
+}
+
+void ExportBookCommand::IndexExportMap()
+{
+    m_FirstEntries.assign(m_Chapters.size(), {});
     for (std::size_t page = 0; page < m_ExportMap.size(); ++page) {
-        for (std::size_t ref = 0; ref < m_ExportMap[page].size(); ++ref) {
-            ExportPageRef const & placed = m_ExportMap[page][ref];
-            m_FirstRefs.try_emplace({placed.m_Chapter, placed.m_Spread}, page, ref);
+        for (ExportPageRef const & ref : m_ExportMap[page]) {
+            if (ref.IsPadding()) {
+                continue;
+            }
+            std::vector<int> & spreads = m_FirstEntries[static_cast<std::size_t>(ref.m_Chapter)];
+            std::size_t const spread = static_cast<std::size_t>(ref.m_Spread);
+            if (spreads.size() <= spread) {
+                spreads.resize(spread + 1, -1);
+            }
+            if (spreads[spread] == -1) {
+                spreads[spread] = static_cast<int>(page);
+            }
         }
     }
 }
