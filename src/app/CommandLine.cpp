@@ -57,6 +57,8 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     AddSetVerb(verbs);
     AddSaveAsVerb(verbs);
     AddStatusVerb(verbs);
+    AddLocateVerb(verbs);
+    AddWatchVerb(verbs);
     AddShowVerb(verbs);
 
     try {

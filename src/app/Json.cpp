@@ -28,4 +28,9 @@ std::string Print(Json const & json)
     return json.dump(2, ' ', false, Json::error_handler_t::replace);
 }
 
+std::string ToLine(Json const & json)
+{
+    return json.dump(-1, ' ', false, Json::error_handler_t::replace);
+}
+
 }

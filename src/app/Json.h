@@ -16,4 +16,7 @@ Json ToJson(Import::MessageList const & messages);
 /// The text of a JSON document, indented by two. Bytes that are not UTF-8 become U+FFFD.
 std::string Print(Json const & json);
 
+/// The same on one line, for output that is read as it comes.
+std::string ToLine(Json const & json);
+
 }

@@ -10,12 +10,16 @@
 #include "framework/document/RequestPdfPasswordsNotification.h"
 #include "framework/kernel/CommandNotifications.h"
 #include "import/SaveFailure.h"
+#include "import/Text.h"
 #include "output/ExportBookCompleteNotification.h"
 
 #include <algorithm>
+#include <filesystem>
 
 namespace App
 {
+
+using Import::Text;
 
 namespace
 {
@@ -71,6 +75,12 @@ void Listener::Forget()
     m_WasSaved = false;
 }
 
+void Listener::SetAnswers(StandingAnswers answers)
+{
+    std::lock_guard const lock(m_Lock);
+    m_Answers = answers;
+}
+
 void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
 {
     using Import::Severity;
@@ -101,9 +111,9 @@ void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
             broken->GetDescription().ToStd() + " failed: " + broken->GetReason().ToStd());
     } else if (auto const * lost = dynamic_cast<DocumentSaveFailedNotification const *>(heard)) {
         std::string const kept = lost->GetKeptPath().Empty()
-                                     ? std::string()
-                                     : " Its content is kept in " + lost->GetKeptPath().ToStd() + ".";
-        Add(Severity::Error, "document-unsaved", lost->GetPath().ToStd(), lost->GetReason().ToStd() + kept);
+                                     ? Text("Nor could its changes be kept anywhere else: they are lost.", "Program")
+                                     : Text("Its changed content is kept in %1.", "Program", lost->GetKeptPath());
+        Add(Severity::Error, "document-unsaved", lost->GetPath().ToStd(), lost->GetReason().ToStd() + " " + kept);
     } else if (auto const * permission = dynamic_cast<Book::PromptFixBookPermissionsNotification const *>(heard)) {
         AnswerPermission(*permission);
     } else if (auto const * file = dynamic_cast<Book::ChooseChapterFileNotification const *>(heard)) {
@@ -130,7 +140,10 @@ bool Listener::Ask(std::string const & question, char const * option, std::strin
 void Listener::AnswerPrompt(DocumentPromptNotification const & prompt)
 {
     bool const isMissing = nullptr != dynamic_cast<Book::PromptMissingChapterFileNotification const *>(&prompt);
-    StandingAnswers::Choice const standing = isMissing ? m_Answers.m_Locate : m_Answers.m_Upgrade;
+    StandingAnswers::Choice standing = StandingAnswers::Choice::No;
+    if (std::lock_guard const lock(m_Lock); !isMissing || !std::exchange(m_HasGivenUp, false)) {
+        standing = isMissing ? m_Answers.m_Locate : m_Answers.m_Upgrade;
+    }
     bool isYes = StandingAnswers::Choice::Yes == standing;
     if (StandingAnswers::Choice::Ask == standing) {
         std::string answer;
@@ -148,19 +161,48 @@ void Listener::AnswerPrompt(DocumentPromptNotification const & prompt)
 
 void Listener::AnswerFile(Book::ChooseChapterFileNotification const & prompt)
 {
+    m_Console.EndProgress();
+    std::string const question = Text("%1: where is %2 now? (nothing ends the search)", "Program", prompt.GetTitle(),
+                                      prompt.GetCurrentPath());
     std::string answer;
-    std::string const question = prompt.GetTitle().ToStd() + " (" + prompt.GetCurrentPath().ToStd() + "):";
-    if (!m_Ask || !m_Ask(question, answer)) {
-        answer.clear();
+    while (m_Ask && m_Ask(question, answer) && !answer.empty()) {
+        std::error_code error;
+        std::filesystem::path const file = std::filesystem::absolute(answer, error).lexically_normal();
+        if (std::filesystem::is_regular_file(file, error)) {
+            prompt.ProcessResponse(String(file.string()));
+            return;
+        }
+        m_Console.Tell({Import::Severity::Warning, "no-file", {file.string()}, Text("There is no such file.", "Program")});
     }
-    prompt.ProcessResponse(String(answer));
+    {
+        std::lock_guard const lock(m_Lock);
+        m_HasGivenUp = true;
+    }
+    prompt.ProcessResponse(String());
 }
 
 void Listener::AnswerPermission(Book::PromptFixBookPermissionsNotification const & prompt)
 {
-    Add(Import::Severity::Error, "chapter-denied", prompt.GetChapterPath().ToStd(),
-        "The chapter's file may not be read; give yourself the right to read it and try again.");
-    prompt.IgnoreAll();
+    std::string const path = prompt.GetChapterPath().ToStd();
+    std::string question = prompt.GetTitle().ToString().ToStd() + ": " + prompt.GetMessage().ToString().ToStd();
+    if (std::size_t const place = question.find("%@"); std::string::npos != place) {
+        question.replace(place, 2, path);
+    }
+    m_Console.EndProgress();
+    std::string answer;
+    if (!m_Ask || !m_Ask(question + " " + Text("[r]etry, [i]gnore this file, ignore [a]ll:", "Program"), answer)) {
+        Add(Import::Severity::Error, "chapter-denied", path,
+            Text("The chapter's file may not be read; give yourself the right to read it (chmod u+r) or ask its owner, and "
+                 "try again.",
+                 "Program"));
+        prompt.IgnoreAll();
+    } else if (answer.starts_with('i')) {
+        prompt.Ignore();
+    } else if (answer.starts_with('a')) {
+        prompt.IgnoreAll();
+    } else {
+        prompt.Retry(false);
+    }
 }
 
 }

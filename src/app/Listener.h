@@ -61,6 +61,8 @@ public:
     [[nodiscard]] bool WasSaved() const;
     /// Forgets exports and saves that were heard.
     void Forget();
+    /// What is answered from now on without asking. Not while a question is open.
+    void SetAnswers(StandingAnswers answers);
 
 private:
     void AnswerPrompt(DocumentPromptNotification const & prompt);
@@ -77,6 +79,8 @@ private:
     Import::MessageList m_Messages;
     Kernel::Counted<Book::ExportBookCompleteNotification const> m_Export;
     bool m_WasSaved = false;
+    /// The user had no file to name: the question whether to look on is answered with no.
+    bool m_HasGivenUp = false;
 };
 
 }

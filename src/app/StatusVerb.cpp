@@ -1,6 +1,7 @@
 #include "app/BookSession.h"
 #include "app/FileKind.h"
 #include "app/Json.h"
+#include "app/StatusNames.h"
 #include "app/TextTable.h"
 #include "app/VerbList.h"
 #include "core/BookChapter.h"
@@ -14,46 +15,6 @@ using Import::Text;
 
 namespace
 {
-
-/// The names of the statuses in JSON: stable words, not the user's language.
-char const * NameOf(Book::BookChapter::Status status)
-{
-    switch (status) {
-    case Book::BookChapter::Status::Ok:
-        return "ok";
-    case Book::BookChapter::Status::OpenForEdit:
-        return "open-for-edit";
-    case Book::BookChapter::Status::Locked:
-        return "locked";
-    case Book::BookChapter::Status::NotFound:
-        return "not-found";
-    case Book::BookChapter::Status::OutOfDate:
-        return "out-of-date";
-    case Book::BookChapter::Status::Restricted:
-        break;
-    }
-    return "restricted";
-}
-
-/// The same for people, in a word or two.
-TableCell Describe(Book::BookChapter::Status status)
-{
-    switch (status) {
-    case Book::BookChapter::Status::Ok:
-        return {Text("ok", "Chapter state"), CellLook::Good};
-    case Book::BookChapter::Status::OpenForEdit:
-        return {Text("open", "Chapter state"), CellLook::Good};
-    case Book::BookChapter::Status::Locked:
-        return {Text("locked", "Chapter state"), CellLook::Warning};
-    case Book::BookChapter::Status::NotFound:
-        return {Text("missing", "Chapter state"), CellLook::Bad};
-    case Book::BookChapter::Status::OutOfDate:
-        return {Text("changed", "Chapter state"), CellLook::Warning};
-    case Book::BookChapter::Status::Restricted:
-        break;
-    }
-    return {Text("restricted", "Chapter state"), CellLook::Warning};
-}
 
 CellLook LookOf(PreflightResult::Status status)
 {

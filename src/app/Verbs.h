@@ -52,6 +52,10 @@ void AddSetVerb(VerbList & verbs);
 void AddSaveAsVerb(VerbList & verbs);
 /// Tells the state of a book's chapters.
 void AddStatusVerb(VerbList & verbs);
+/// Finds chapters again whose files have moved.
+void AddLocateVerb(VerbList & verbs);
+/// Keeps a book open, and tells of each chapter that changes.
+void AddWatchVerb(VerbList & verbs);
 /// Tells what is in a book or document file.
 void AddShowVerb(VerbList & verbs);
 

@@ -1,0 +1,48 @@
+#include "app/StatusNames.h"
+
+#include "import/Text.h"
+
+namespace App
+{
+
+using Import::Text;
+
+char const * NameOf(Book::BookChapter::Status status)
+{
+    switch (status) {
+    case Book::BookChapter::Status::Ok:
+        return "ok";
+    case Book::BookChapter::Status::OpenForEdit:
+        return "open-for-edit";
+    case Book::BookChapter::Status::Locked:
+        return "locked";
+    case Book::BookChapter::Status::NotFound:
+        return "not-found";
+    case Book::BookChapter::Status::OutOfDate:
+        return "out-of-date";
+    case Book::BookChapter::Status::Restricted:
+        break;
+    }
+    return "restricted";
+}
+
+TableCell Describe(Book::BookChapter::Status status)
+{
+    switch (status) {
+    case Book::BookChapter::Status::Ok:
+        return {Text("ok", "Chapter state"), CellLook::Good};
+    case Book::BookChapter::Status::OpenForEdit:
+        return {Text("open", "Chapter state"), CellLook::Good};
+    case Book::BookChapter::Status::Locked:
+        return {Text("locked", "Chapter state"), CellLook::Warning};
+    case Book::BookChapter::Status::NotFound:
+        return {Text("missing", "Chapter state"), CellLook::Bad};
+    case Book::BookChapter::Status::OutOfDate:
+        return {Text("changed", "Chapter state"), CellLook::Warning};
+    case Book::BookChapter::Status::Restricted:
+        break;
+    }
+    return {Text("restricted", "Chapter state"), CellLook::Warning};
+}
+
+}
