@@ -19,6 +19,10 @@
 namespace Book
 {
 
+Kernel::ClassProperties const ExportToPDFCommand::ms_ClassProperties(Kernel::ClassUID("EPDF"), nullptr, 1, {},
+                                                                     &DocumentCommand::GetTypeClassProperties());
+static Kernel::ClassPropertiesBase::Init const s_ExportToPDFCommandInit(ExportToPDFCommand::GetTypeClassProperties());
+
 namespace
 {
 
@@ -53,6 +57,16 @@ std::vector<Kernel::Rect> BoxesOf(HyperlinkData const & link, Kernel::JailCounte
     return boxes;
 }
 
+}
+
+Kernel::ClassProperties const & ExportToPDFCommand::GetObjectClassProperties() const
+{
+    return ms_ClassProperties;
+}
+
+Kernel::ClassProperties const & ExportToPDFCommand::GetTypeClassProperties()
+{
+    return ms_ClassProperties;
 }
 
 ExportToPDFCommand::ExportToPDFCommand(Renderer::RenderTree::PdfExport * pdf,

@@ -29,6 +29,9 @@ public:
                        Kernel::Counted<BookChapter const> chapter);
 
     Kernel::LocalisedString GetDescription() const override;
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
+    /// Streams can name the class, and yet make none: an export command gives it all that it works on.
+    static Kernel::ClassProperties const & GetTypeClassProperties();
     void Do() override;
     /// Says nothing: the export command reports.
     void Notify(std::vector<Kernel::Counted<Kernel::Notification>> & notifications) override;
@@ -46,6 +49,8 @@ private:
     bool Resolve(Renderer::PdfHyperlink & target, HyperlinkData const & link,
                  Kernel::Counted<DocumentController const> const & document);
     bool ResolveFile(Renderer::PdfHyperlink & target, HyperlinkData const & link);
+
+    static Kernel::ClassProperties const ms_ClassProperties;
 
     Renderer::RenderTree::PdfExport * m_PdfExport;
     Kernel::Counted<Renderer::FileExportOptionsPDF const> m_Options;

@@ -1,4 +1,5 @@
 #include "core/BookCollection.h"
+#include "commands/BookCommand.h"
 #include "commands/EngageBookLockCommand.h"
 #include "commands/UpdateChapterSettingsCommand.h"
 #include "core/BookNotification.h"
@@ -8,6 +9,9 @@
 #include "support/NotificationRecorder.h"
 
 #include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
 
 using namespace Book;
 using Kernel::Counted;
@@ -103,4 +107,83 @@ TEST_F(BookCollectionTest, AClosedBookTakesNoCommands)
     m_Collection.EnqueueCommand(MakeCounted<UpdateChapterSettingsCommand>(chapter, false, 17), book);
     BookBuilder::Rest();
     EXPECT_NE(chapter->GetStartFromPage(), 17);
+}
+
+TEST_F(BookCollectionTest, WaitingForACommandEndsAlsoIfNobodyWillRunIt)
+{
+    auto const book = m_Builder.NewBook({m_Builder.WriteChapter("a.kvdoc")});
+    Counted<BookChapter const> const chapter = book->GetChapterAtIndex(0);
+    int ended = 0;
+    auto const set = [&](int start) {
+        auto const command = MakeCounted<UpdateChapterSettingsCommand>(chapter, false, start);
+        command->SetCompletionCallback([&ended] { ++ended; });
+        m_Collection.EnqueueCommandAndWait(command, book);
+    };
+    set(3);
+    EXPECT_EQ(chapter->GetStartFromPage(), 3);
+    EXPECT_EQ(ended, 1) << "the caller's own callback has run by then";
+    m_Collection.DisableCommandEnqueueAndEmpty(book);
+    set(4);
+    m_Builder.CloseBook(book);
+    set(5);
+    EXPECT_EQ(chapter->GetStartFromPage(), 3) << "refused, and then dropped";
+    EXPECT_EQ(ended, 1);
+}
+
+namespace
+{
+
+/// Waits for a command of a book, this one's own or another, in the middle of its turn.
+class AskingCommand final : public BookCommand
+{
+public:
+    AskingCommand(Counted<BookController const> book, Counted<BookCommand> asked)
+        : m_Book(std::move(book)),
+          m_Asked(std::move(asked))
+    {
+    }
+    [[nodiscard]] Kernel::LocalisedString GetDescription() const override { return {"Ask", "Test command"}; }
+    void Do() override { BookCollection::GetInstance().EnqueueCommandAndWait(m_Asked, m_Book); }
+
+private:
+    Counted<BookController const> const m_Book;
+    Counted<BookCommand> const m_Asked;
+};
+
+}
+
+TEST_F(BookCollectionTest, BooksThatWaitForEachOtherDoNotWaitForEver)
+{
+    String const path = m_Builder.WriteChapter("a.kvdoc");
+    auto const first = m_Builder.NewBook({path});
+    auto const second = m_Builder.NewBook({path});
+    Counted<BookChapter const> const chapter = first->GetChapterAtIndex(0);
+    // First asks second, whose command asks first again: that one runs in the turn that waits.
+    auto const innermost = MakeCounted<UpdateChapterSettingsCommand>(chapter, false, 11);
+    auto const back = MakeCounted<AskingCommand>(first, innermost);
+    BookBuilder::Run(first, MakeCounted<AskingCommand>(second, back));
+    EXPECT_EQ(chapter->GetStartFromPage(), 11);
+    BookBuilder::Run(first, MakeCounted<AskingCommand>(
+                                first, MakeCounted<UpdateChapterSettingsCommand>(chapter, false, 12)));
+    EXPECT_EQ(chapter->GetStartFromPage(), 12) << "nor does a book that waits for itself";
+}
+
+TEST_F(BookCollectionTest, HoldsAThousandBooks)
+{
+    std::vector<Counted<BookController>> books;
+    int const before = m_Collection.GetNumberOfActiveBookControllers();
+    for (int index = 0; index < 1000; ++index) {
+        auto const book = m_Builder.NewBook();
+        book->SetPath("/books/" + std::to_string(index) + ".kvbook");
+        books.push_back(book);
+    }
+    EXPECT_EQ(m_Collection.GetNumberOfActiveBookControllers(), before + 1000);
+    EXPECT_EQ(m_Collection.GetBookFromPath("/books/777.kvbook"), Counted<BookController const>(books[777]));
+    for (auto const & book : books) {
+        m_Collection.EnqueueCommand(MakeCounted<EngageBookLockCommand>(false), book);
+    }
+    for (auto const & book : books) {
+        m_Builder.CloseBook(book);
+    }
+    EXPECT_EQ(m_Collection.GetNumberOfActiveBookControllers(), before);
 }

@@ -2,13 +2,11 @@
 #include "commands/LoadBookCommand.h"
 #include "commands/SaveBookAsCommand.h"
 #include "commands/SaveBookCommand.h"
-#include "commands/UpdateChaptersCommand.h"
 #include "core/BookCollection.h"
 #include "core/BookNotification.h"
 #include "core/BookSavedNotification.h"
 #include "core/ChapterFileNotifications.h"
 #include "framework/document/VantraController.h"
-#include "framework/kernel/CommandCoverage.h"
 #include "framework/kernel/FileSystem.h"
 #include "support/BookBuilder.h"
 #include "support/NotificationRecorder.h"
@@ -119,51 +117,4 @@ TEST_F(BookLifeTest, ABookWithMissingChaptersAsksForThem)
     EXPECT_TRUE(again->ContainsChapter(moved));
     EXPECT_FALSE(again->ContainsChapter(gone));
     EXPECT_EQ(again->GetChapterFromPath(moved)->DescribePages(), "1 - 1");
-}
-
-TEST(BookCommandTest, LeavesNoTraceInAStreamAndIsKnownByName)
-{
-    struct Row
-    {
-        char const (&m_Uid)[5];
-        char const * m_Name;
-        char const * m_Description;
-        char const * m_Context;
-    };
-    for (Row const & row :
-         {Row{"BadC", "Book::AddChapterCommand", "Add chapter", "Book Command"},
-          Row{"BdeC", "Book::DeleteChaptersCommand", "Delete chapter", "Book Commands"},
-          Row{"BMvC", "Book::MoveChaptersCommand", "Move chapter", "Book Commands"},
-          Row{"BrpC", "Book::ReplaceChapterCommand", "Replace chapter", "Book Commands"},
-          Row{"SkCC", "Book::SetKeyChapterCommand", "Set style source chapter", "Book Commands"},
-          Row{"SSHC", "Book::SetStrayHandlingCommand", "Set stray handling", "Book Commands"},
-          Row{"SySt", "Book::SetSynchroniseSettingsCommand", "Set stray handling", "Book Commands"},
-          Row{"BSxF", "Book::SetExportFormatFileExportOptionsCommand", "Set Export Format Options", "Book Commands"},
-          Row{"UCSC", "Book::UpdateChapterSettingsCommand", "Update Chapter Settings", "Book Commands"},
-          Row{"SBkC", "Book::SaveBookCommand", "Save Book", "Book Command"},
-          Row{"SBaC", "Book::SaveBookAsCommand", "Save Book As", "Book Command"},
-          Row{"CopC", "Book::ChapterOpenCommand", "Chapter Open", "Book Command"},
-          Row{"BUpC", "Book::UpdateChapterCommand", "Update chapter", "Book Commands"},
-          Row{"PrfC", "Book::PreflightChaptersCommand", "Preflight chapters", "Book Commands"},
-          Row{"EBLC", "Book::EngageBookLockCommand", "Engage BookLock", "Book Command"}}) {
-        Kernel::ClassProperties const * const properties = Kernel::ClassProperties::Find(Kernel::ClassUID(row.m_Uid));
-        ASSERT_TRUE(properties) << row.m_Name;
-        EXPECT_EQ(properties->GetVersion(), 1) << row.m_Name;
-        EXPECT_EQ(properties->GetBase(), &BookCommand::GetTypeClassProperties()) << row.m_Name;
-        auto const object = properties->GetCreator()();
-        auto const command = Kernel::CountedCast<BookCommand>(object);
-        ASSERT_TRUE(command) << row.m_Name;
-        EXPECT_EQ(&command->GetObjectClassProperties(), properties) << row.m_Name;
-        EXPECT_EQ(command->GetDescription(),
-                  Kernel::LocalisedString(row.m_Description, std::string_view(row.m_Description).size(), row.m_Context,
-                                          std::string_view(row.m_Context).size()))
-            << row.m_Name;
-        EXPECT_FALSE(command->ShouldStackForUndo()) << row.m_Name;
-        EXPECT_EQ(command->GetDomainController(), nullptr) << row.m_Name << " has no book before it is dequeued";
-        BookCommand const & typed = *command;
-        char const * const name = CommandCoverage::Instance().FindName(typeid(typed));
-        EXPECT_STREQ(name, row.m_Name);
-    }
-    EXPECT_EQ(CommandCoverage::Instance().FindName(typeid(UpdateChaptersCommand)), nullptr);
-    EXPECT_EQ(CommandCoverage::Instance().FindName(typeid(CloseBookCommand)), nullptr);
 }

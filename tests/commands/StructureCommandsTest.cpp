@@ -96,6 +96,7 @@ TEST_F(StructureCommandsTest, DeletingTellsWhereTheFirstGapIs)
     };
     for (Row const & row :
          {Row{"what follows the first run", {0, 1}, "c"}, Row{"only the first run counts", {0, 2}, "b"},
+          Row{"the order given leads the walk", {2, 0}, "d"}, Row{"backwards the run ends at once", {1, 0}, "c"},
           Row{"at the end no number changes", {3}, ""}, Row{"nothing is left", {0, 1, 2, 3}, ""}}) {
         Counted<BookController> const book = m_Builder.NewBook(m_Paths);
         m_Recorder.Clear();
@@ -130,6 +131,9 @@ TEST_F(StructureCommandsTest, MovingTellsFromWhereNumbersMayHaveChanged)
     };
     for (Row const & row : {Row{"towards the front: from the block on", {2, 3}, 1, "a c d b", "c"},
                             Row{"towards the back: from the start", {0}, 3, "b c a d", "b"},
+                            Row{"in the order given, not that of the book", {3, 2}, 0, "d c a b", "d"},
+                            Row{"in front of one of themselves: to the end", {0, 1}, 1, "c d a b", "c"},
+                            Row{"nowhere, and it is told all the same", {1}, 2, "a b c d", "a"},
                             Row{"to the end: from the start", {1}, -1, "a c d b", "a"}}) {
         Counted<BookController> const book = m_Builder.NewBook(m_Paths);
         m_Recorder.Clear();
@@ -220,4 +224,57 @@ TEST_F(StructureCommandsTest, OpenDocumentsHearThatTheyGoInAndOut)
     ASSERT_EQ(inclusions.size(), 1u);
     EXPECT_THAT(inclusions[0]->GetDocuments(), ElementsAre(Counted<DocumentController const>(document)));
     application.EnqueueCommandAndWait(MakeCounted<CloseDocumentCommand>(document, nullptr, false, false));
+}
+
+TEST_F(StructureCommandsTest, ChaptersOfNoBookChangeNothingAndAreToldAllTheSame)
+{
+    Counted<BookChapter const> const stranger = MakeCounted<BookChapter>(String("/elsewhere/x.kvdoc"));
+    struct Row
+    {
+        char const * m_Why;
+        Counted<BookCommand> m_Command;
+        std::vector<std::string> m_Told;
+    };
+    using Chapters = std::vector<Counted<BookChapter const>>;
+    std::vector<std::string> const changed{"BookChangedNotification", "BookStructureChangedNotification"};
+    for (Row const & row :
+         {Row{"moved with one of the book", MakeCounted<MoveChaptersCommand>(nullptr, Chapters{At(0), stranger}), changed},
+          Row{"nothing moved", MakeCounted<MoveChaptersCommand>(At(2), Chapters{}), changed},
+          Row{"deleted", MakeCounted<DeleteChaptersCommand>(Chapters{stranger, nullptr}), {"BookChangedNotification"}},
+          Row{"made key: the old one loses the flag", MakeCounted<SetKeyChapterCommand>(stranger),
+              {"ChapterChangedNotification", "ChapterChangedNotification"}},
+          Row{"settings", MakeCounted<UpdateChapterSettingsCommand>(stranger, false, 9), {"ChapterChangedNotification"}}}) {
+        m_Recorder.Clear();
+        Run(row.m_Command);
+        EXPECT_EQ(Names(), "a b c d") << row.m_Why;
+        EXPECT_EQ(m_Recorder.BookNames(), row.m_Told) << row.m_Why;
+    }
+    EXPECT_EQ(stranger->GetStartFromPage(), 0);
+    EXPECT_FALSE(At(0)->IsKey());
+    EXPECT_FALSE(stranger->IsKey());
+}
+
+TEST_F(StructureCommandsTest, OpenDocumentsAreToldLastThatTheyCameOrWent)
+{
+    String const path = m_Builder.WriteChapter("x.kvdoc");
+    OpenDocumentFailedNotification failure(path, true);
+    Counted<DocumentController const> const document = VantraController::GetInstance().OpenDocument(path, failure);
+    ASSERT_TRUE(document) << failure.GetReason();
+    auto const told = [&] {
+        auto const changes = m_Recorder.All<BookChapterInclusionChangedNotification>();
+        return changes.size() == 1 ? changes[0]->GetDocuments() : std::vector<Counted<DocumentController const>>();
+    };
+    m_Recorder.Clear();
+    Run(MakeCounted<AddChapterCommand>(std::vector<String>{path}, At(1)));
+    // The add itself broadcasts when its last file is in, which is before the command has its say.
+    EXPECT_THAT(m_Recorder.BookNames(), ElementsAre("BookChangedNotification", "BookStructureChangedNotification",
+                                                    "BookChapterInclusionChangedNotification"));
+    EXPECT_THAT(told(), ElementsAre(document));
+    m_Recorder.Clear();
+    Run(MakeCounted<DeleteChaptersCommand>(std::vector<Counted<BookChapter const>>{At(1)}));
+    EXPECT_THAT(m_Recorder.BookNames(), ElementsAre("BookChangedNotification", "BookStructureChangedNotification",
+                                                    "BookChapterInclusionChangedNotification"));
+    EXPECT_THAT(told(), ElementsAre(document));
+    VantraController::GetInstance().EnqueueCommandAndWait(
+        MakeCounted<CloseDocumentCommand>(document, nullptr, false, false));
 }

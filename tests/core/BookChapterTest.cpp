@@ -376,3 +376,17 @@ TEST(BookChapterUpdateTest, ReadersSeeAllOfAnUpdateOrNothing)
     reader.join();
     EXPECT_EQ(torn, 0);
 }
+
+TEST(BookChapterUpdateTest, IsFoundByItsPathWhichOthersSeeChangeAtTheEndOfTheUpdate)
+{
+    auto const chapter = MakeCounted<BookChapter>(String("/x/a.kvdoc"));
+    EXPECT_TRUE(chapter->HasPath("/x/a.kvdoc"));
+    EXPECT_FALSE(chapter->HasPath("/x/A.kvdoc"));
+    {
+        BookChapter::UpdateSession const session(*chapter);
+        chapter->SetPath("/x/b.kvdoc");
+        EXPECT_TRUE(chapter->HasPath("/x/b.kvdoc"));
+        std::thread([&] { EXPECT_TRUE(chapter->HasPath("/x/a.kvdoc")); }).join();
+    }
+    EXPECT_FALSE(chapter->HasPath("/x/a.kvdoc"));
+}

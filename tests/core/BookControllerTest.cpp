@@ -253,3 +253,15 @@ TEST_F(BookControllerTest, FindsIndexAndEndnotesMarkerAndEstrangedChapters)
     EXPECT_EQ(m_Book->GetChapterWithEndnotesMarker(), At(2));
     EXPECT_TRUE(m_Book->ContainsEstrangedChapters()) << "nobody has it open";
 }
+
+TEST_F(BookControllerTest, AChapterWhoseFileNeverOpenedSaysWhatANewDocumentWould)
+{
+    Counted<BookChapter const> const chapter = At(1);
+    EXPECT_EQ(chapter->GetColourFormat(), Raster::Format::Rgba8);
+    EXPECT_EQ(chapter->GetUnitType(), Kernel::UnitValue::UnitType::Points);
+    EXPECT_FALSE(chapter->HasBleed() || chapter->IsFacingPages() || chapter->IsVerticalStack());
+    EXPECT_FALSE(chapter->ContainsIndex());
+    m_Book->RemoveChapters({At(0)});
+    EXPECT_EQ(m_Book->IndexFromChapter(chapter), 0);
+    EXPECT_TRUE(chapter->IsContinueFromPrevious()) << "there is no page number that it could have had";
+}

@@ -1,23 +1,13 @@
 #include "support/NotificationRecorder.h"
 
 #include "framework/document/VantraController.h"
+#include "support/ClassName.h"
 
 #include <algorithm>
-#include <cxxabi.h>
-#include <memory>
 #include <thread>
-#include <typeinfo>
 
 namespace
 {
-
-std::string NameOf(Kernel::Notification const & notification)
-{
-    int status = 0;
-    std::unique_ptr<char, void (*)(void *)> const name(
-        abi::__cxa_demangle(typeid(notification).name(), nullptr, nullptr, &status), std::free);
-    return status == 0 ? name.get() : typeid(notification).name();
-}
 
 constexpr std::string_view BookNamespace = "Book::";
 
@@ -73,7 +63,7 @@ std::vector<std::string> NotificationRecorder::Names()
 {
     std::vector<std::string> names;
     for (Kernel::Counted<Kernel::Notification> const & notification : Rested()) {
-        std::string name = NameOf(*notification);
+        std::string name = ClassName(*notification);
         names.push_back(name.starts_with(BookNamespace) ? name.substr(BookNamespace.size()) : name);
     }
     return names;
@@ -83,7 +73,7 @@ std::vector<std::string> NotificationRecorder::BookNames(std::vector<std::string
 {
     std::vector<std::string> names;
     for (Kernel::Counted<Kernel::Notification> const & notification : Rested()) {
-        std::string const name = NameOf(*notification);
+        std::string const name = ClassName(*notification);
         if (!name.starts_with(BookNamespace)) {
             continue;
         }
