@@ -209,6 +209,10 @@ public:
     /// Writes the book to `path`, and the book is at that path from then on. An existing file stays whole if the write
     /// fails. Call it without the book's writer lock, on the book's own turn.
     void SaveBookAsCopy(DocumentSaveResult & result, String const & path);
+    using ChapterPaths = std::map<Kernel::Counted<BookChapter const>, String>;
+    /// The same for a book file that is to be moved together with the copies of these chapters: it names them by their
+    /// place beside it. In the open book the chapters keep their paths.
+    void SaveBookAsPackage(DocumentSaveResult & result, String const & path, ChapterPaths packaged);
     /// The book file's preview pictures; null if the book has none.
     [[nodiscard]] Kernel::Counted<Kernel::ArchiveThumbnails> CreateThumbnails() const;
 
@@ -343,6 +347,9 @@ private:
     void ChangeChapters(TChange const & change);
     void MarkChanged() { ++m_Changes; }
 
+    /// With stand-ins for the chapters that are written under another path.
+    [[nodiscard]] ChapterList RecordsToWrite(ChapterList chapters) const;
+
     // The steps of LoadChapterDocument.
     void WaitForClose(Kernel::Counted<BookChapter const> const & chapter) const;
     Kernel::Counted<DocumentController> AdoptForegroundDocument(Kernel::Counted<BookChapter const> const & chapter,
@@ -399,6 +406,8 @@ private:
     Published<String> m_Path;
     /// The path being written while a save runs, for the objects in the file that refer to other files.
     Published<String> m_SavePath;
+    /// Chapters that are written under another path, while a save runs. For the saving thread alone.
+    ChapterPaths m_PackagedPaths;
     Published<Kernel::Counted<Story::Index const>> m_MasterIndex;
     /// The book needs saving while these differ. Counts, so that a save settles only the changes that it has written.
     std::atomic<unsigned long long> m_Changes{0};

@@ -2,6 +2,7 @@
 
 #include "core/UpdateChaptersTask.h"
 #include "framework/document/DocumentController.h"
+#include "framework/document/DocumentSaveFailure.h"
 #include "framework/document/DocumentSaveResult.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/document/PDFBookmarkManager.h"
@@ -9,18 +10,16 @@
 #include "framework/kernel/ArchiveExceptions.h"
 #include "framework/kernel/ArchiveSession.h"
 #include "framework/kernel/ArchiveThumbnails.h"
-#include "framework/kernel/FileIOException.h"
 #include "framework/kernel/FileStore.h"
 #include "framework/kernel/FileStoreCompressionHint.h"
 #include "framework/kernel/Format.h"
 #include "framework/kernel/InSerialiserFile.h"
 #include "framework/kernel/OutSerialiserFile.h"
+#include "framework/kernel/PortablePath.h"
 #include "framework/raster/DynamicBitmap.h"
 #include "framework/render/FileExportOptions.h"
 #include "framework/story/AnchorData.h"
 #include "framework/story/Index.h"
-
-#include <new>
 
 namespace Book
 {
@@ -33,96 +32,18 @@ constexpr Kernel::IDTag RootTag("Book");
 constexpr unsigned short FormatVersion = 1;
 constexpr char const * ItemName = "doc.dat";
 
-/// The result code of a save for a reason why the target could not be created.
-enum DocumentSaveResult::Result SaveResultFor(Kernel::Archive::CreateResult const & result)
+/// The chapter's record as it stands in a book file beside which its copy lies at `path`.
+Kernel::Counted<BookChapter> PackagedRecord(BookChapter const & chapter, String const & path, String const & bookPath)
 {
-    using Code = Kernel::Archive::CreateResult::Code;
-    switch (result.m_Code) {
-    case Code::Unknown:
-        return DocumentSaveResult::CannotCreate;
-    case Code::FolderMissing:
-        return DocumentSaveResult::FolderMissing;
-    case Code::Locked:
-        return DocumentSaveResult::LockedByOther;
-    case Code::IsFolder:
-        return DocumentSaveResult::BadName;
-    case Code::NameTooLong:
-        return DocumentSaveResult::NameTooLong;
-    case Code::OutOfMemory:
-        return DocumentSaveResult::OutOfMemory;
-    case Code::AccessDenied:
-        return DocumentSaveResult::AccessDenied;
-    case Code::PermissionDenied:
-        return DocumentSaveResult::PermissionDenied;
-    case Code::ReadOnlyVolume:
-        return DocumentSaveResult::ReadOnlyDevice;
-    case Code::TooManyOpenFiles:
-        return DocumentSaveResult::TooManyOpenFiles;
-    case Code::QuotaExceeded:
-        return DocumentSaveResult::QuotaUsedUp;
-    case Code::Busy:
-        return DocumentSaveResult::Busy;
-    case Code::OutOfSpace:
-        return DocumentSaveResult::DiskFull;
-    case Code::DeviceError:
-        return DocumentSaveResult::DeviceError;
-    case Code::Success:
-        break;
-    }
-    return DocumentSaveResult::Unknown;
-}
-
-/// For a failure with a file while the item was stored.
-enum DocumentSaveResult::Result SaveResultFor(Kernel::ArchiveFileException const & exception)
-{
-    using Reason = Kernel::ArchiveFileException::Reason;
-    switch (exception.GetReason()) {
-    case Reason::Unknown:
-    case Reason::DeviceError:
-        return exception.GetWhatFile() == Kernel::ArchiveFileException::WhatFile::Read
-                   ? DocumentSaveResult::SourceDamaged
-                   : DocumentSaveResult::WriteFailed;
-    case Reason::OutOfSpace:
-        return DocumentSaveResult::DiskFull;
-    case Reason::QuotaExceeded:
-        return DocumentSaveResult::QuotaExceeded;
-    case Reason::FileTooLarge:
-        return DocumentSaveResult::TooLarge;
-    case Reason::PermissionDenied:
-        return DocumentSaveResult::PermissionDenied;
-    case Reason::AccessDenied:
-        return DocumentSaveResult::AccessDenied;
-    case Reason::Locked:
-        return DocumentSaveResult::LockedByOther;
-    }
-    return DocumentSaveResult::Unknown;
-}
-
-enum DocumentSaveResult::Result SaveResultFor(Kernel::FileIOException const & exception)
-{
-    using Reason = Kernel::FileIOException::Reason;
-    switch (exception.GetReason()) {
-    case Reason::WriteFailed:
-    case Reason::DeviceError:
-        return DocumentSaveResult::WriteFailed;
-    case Reason::AccessDenied:
-        return DocumentSaveResult::AccessDenied;
-    case Reason::PermissionDenied:
-        return DocumentSaveResult::PermissionDenied;
-    case Reason::OutOfSpace:
-        return DocumentSaveResult::DiskFull;
-    case Reason::Unknown:
-    case Reason::ReadFailed:
-        break;
-    }
-    return DocumentSaveResult::Unknown;
-}
-
-void SetOtherArchive(DocumentSaveResult & result, Kernel::Counted<Kernel::Archive const> const & archive)
-{
-    if (archive) {
-        result.SetOtherArchivePath(archive->GetPath());
-    }
+    Kernel::Counted<BookChapter> const record = Kernel::MakeCounted<BookChapter>(path);
+    record->UpdateTimeStamp();
+    record->SetPath(Kernel::PortablePath::Make(path, bookPath));
+    record->SetPages(chapter.DescribePages());
+    record->SetName(chapter.GetName());
+    record->SetIsKey(chapter.IsKey());
+    record->SetStartFromPage(chapter.GetStartFromPage());
+    record->SetHasEndnotesMarker(chapter.HasEndnotesMarker());
+    return record;
 }
 
 /// As an object of a class that streams can hold; null if its class is none.
@@ -164,13 +85,24 @@ Kernel::Counted<Kernel::FileStoreItem> BookController::CreateObject()
     return Kernel::MakeCounted<BookController>();
 }
 
+BookController::ChapterList BookController::RecordsToWrite(ChapterList chapters) const
+{
+    for (Kernel::Counted<BookChapter> & chapter : chapters) {
+        auto const packaged = m_PackagedPaths.find(chapter);
+        if (packaged != m_PackagedPaths.end()) {
+            chapter = PackagedRecord(*chapter, packaged->second, m_SavePath.Get());
+        }
+    }
+    return chapters;
+}
+
 void BookController::Save(Kernel::OutStream & stream, Kernel::FileStoreOut & store) const
 {
     Kernel::OutSerialiserFile out(stream, store, RootTag, FormatVersion);
     out.SetFilePath(m_SavePath.Get());
     Snapshot<ChapterList> const chapters = Chapters();
     if (out.IsFullSave()) {
-        out.SaveObjects("Chps", *chapters);
+        out.SaveObjects("Chps", RecordsToWrite(*chapters));
     } else {
         for (Kernel::Counted<BookChapter> const & chapter : chapters) {
             out.SaveObjectEnumeratePathsOnlyI(chapter);
@@ -202,6 +134,11 @@ bool BookController::Load(Kernel::InStream & stream, Kernel::FileStore & store)
     }
     ChapterList chapters;
     if (in->LoadObjects("Chps", chapters)) {
+        for (Kernel::Counted<BookChapter> const & chapter : chapters) {
+            if (chapter) {
+                chapter->SetPath(Kernel::PortablePath::Resolve(chapter->GetPath(), store.GetPath()));
+            }
+        }
         m_Chapters.Set(Snapshot(std::move(chapters)));
     }
     Kernel::Consolidated<Kernel::SharedSerialisable> shared;
@@ -259,6 +196,13 @@ bool BookController::LoadBook(String const & path, OpenDocumentFailedNotificatio
     return true;
 }
 
+void BookController::SaveBookAsPackage(DocumentSaveResult & result, String const & path, ChapterPaths packaged)
+{
+    m_PackagedPaths = std::move(packaged);
+    SaveBookAsCopy(result, path);
+    m_PackagedPaths.clear();
+}
+
 void BookController::SaveBook(DocumentSaveResult & result)
 {
     SaveBookAsCopy(result, GetPath());
@@ -272,18 +216,16 @@ void BookController::SaveBookAsCopy(DocumentSaveResult & result, String const & 
     Kernel::Archive::CreateResult created;
     auto const archive = Kernel::Archive::CreateWithTemporary(path, FileType, created);
     if (!archive) {
-        result.SetConcernsFile(true);
-        result.SetResult(SaveResultFor(created), created.m_Text);
+        SetSaveFailure(result, created);
         return;
     }
-    try {
+    bool const stored = StoreArchive(result, archive, [&] {
         Kernel::ArchiveSessionHandle session;
         if (archive->CreateSessionAdv(session, Kernel::Archive::SessionType::Whole, nullptr, false) !=
             Kernel::Archive::SessionResult::Success) {
             // The next save has to ask for a name.
             SetPath(String());
-            result.SetResult(DocumentSaveResult::SessionFailed);
-            return;
+            return false;
         }
         session->SetThumbnails(CreateThumbnails());
         Kernel::FileStoreCompressionHintGeneral const hint(
@@ -291,28 +233,9 @@ void BookController::SaveBookAsCopy(DocumentSaveResult & result, String const & 
         session->SaveFile(ItemName, hint, *this);
         archive->CloseSession(session, false);
         session.Release();
-    } catch (Kernel::ArchiveFileException const & exception) {
-        result.SetConcernsFile(true);
-        if (exception.GetArchive() == archive) {
-            result.SetResult(SaveResultFor(exception), exception.GetMessage());
-            SetOtherArchive(result, exception.GetArchiveOther());
-        } else {
-            result.SetResult(DocumentSaveResult::OtherArchive, exception.GetMessage());
-            SetOtherArchive(result, exception.GetArchive());
-        }
-        return;
-    } catch (Kernel::FileIOException const & exception) {
-        result.SetConcernsFile(true);
-        result.SetResult(SaveResultFor(exception), exception.GetMessage());
-        return;
-    } catch (std::bad_alloc const &) {
-        result.SetResult(DocumentSaveResult::OutOfMemory);
-        return;
-    } catch (Kernel::Exception const & exception) {
-        result.SetResult(DocumentSaveResult::ItemFailed, exception.GetMessage());
-        return;
-    } catch (std::exception const & exception) {
-        result.SetResult(DocumentSaveResult::SessionFailed, exception.what());
+        return true;
+    });
+    if (!stored) {
         return;
     }
     result.SetResult(DocumentSaveResult::Success);

@@ -120,7 +120,7 @@ public:
             document.SetWantNotifications(false);
             document.SetWantBackgroundTasks(false);
             document.EngageBookLock(false);
-            document.HoldFile(false);
+            static_cast<void>(document.HoldFile(false));
             notification->Closed(document.GetPath());
             Tell(true);
             break;

@@ -3,18 +3,31 @@
 #include "framework/document/AnchorVisitor.h"
 #include "framework/document/DocumentComposer.h"
 #include "framework/document/DocumentFile.h"
+#include "framework/document/DocumentLinks.h"
 #include "framework/document/DocumentNotifications.h"
 #include "framework/document/DocumentStore.h"
 #include "framework/document/DOMVisitor.h"
+#include "framework/document/VantraController.h"
 #include "framework/kernel/Clock.h"
 #include "framework/kernel/DomainWriterUnlockSession.h"
+#include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Format.h"
+#include "framework/kernel/Path.h"
 #include "framework/kernel/Uuid.h"
+#include "framework/typeset/FontLibrary.h"
 
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <optional>
+#include <unistd.h>
+
+namespace
+{
+
+constexpr char const * PackagedFontFolder = "Fonts";
+
+}
 
 Kernel::Counted<DocumentFacts const> PublishedDocumentFacts::Get() const
 {
@@ -221,6 +234,12 @@ bool DocumentController::LoadDocument(String const & path, bool inFront, bool as
     if (!asCopy) {
         SetPath(path);
     }
+    m_HoldAlone = inFront;
+    if (!asCopy) {
+        // A package brings the fonts along that the machine may lack.
+        Typeset::FontLibrary::GetInstance().AddFolder(
+            Kernel::Path::GetFolderWithSeparator(Kernel::FileSystem::GetAbsolutePath(path)) + PackagedFontFolder);
+    }
     m_SavedCount = m_ChangeCount.load();
     SetTextDirty();
     ComposeText(false, nullptr);
@@ -233,7 +252,12 @@ bool DocumentController::HoldFile(bool alone)
 {
     Kernel::Counted<Kernel::Archive> const archive = m_Store->GetArchive();
     using Kind = Kernel::FileLock::Kind;
-    return archive && archive->GetLock() && archive->GetLock()->ChangeKind(alone ? Kind::Exclusive : Kind::Shared);
+    m_HoldAlone = alone;
+    if (!archive || !archive->GetLock()) {
+        return true;
+    }
+    return archive->GetLock()->ChangeKind(alone ? Kind::Exclusive : Kind::Shared) ||
+           ::access(archive->GetPath().c_str(), W_OK) != 0;
 }
 
 void DocumentController::ShutDownArchive()
@@ -313,10 +337,15 @@ bool ReportLostPictures(DocumentFile::Content const & content, String const & ta
 
 void DocumentController::SaveCopy(DocumentSaveResult & result, String const & path)
 {
+    SaveCopy(result, path, {});
+}
+
+void DocumentController::SaveCopy(DocumentSaveResult & result, String const & path, DocumentLinks const & links)
+{
     result.SetSuccess(false);
     DocumentFile file(*this);
     DocumentFile::Content content;
-    content.m_Document = file.WriteDocument();
+    content.m_Document = file.WriteDocument(links);
     file.WriteItems(content);
     if (!ReportLostPictures(content, path, result) &&
         DocumentFile::WriteArchive(content, path, nullptr, Kernel::FileLock::Kind::Shared, result)) {
@@ -340,7 +369,7 @@ void DocumentController::SaveDocument(DocumentSaveResult & result, String const 
     Kernel::Counted<Kernel::Archive> const old = target == ownPath ? m_Store->GetArchive() : nullptr;
     DocumentFile file(*this);
     DocumentFile::Content content;
-    content.m_Document = file.WriteDocument();
+    content.m_Document = file.WriteDocument({});
     if (old) {
         Kernel::Counted<Kernel::RawData const> const present = m_Store->ReadItem(DocumentFile::DocumentItem);
         if (present && std::ranges::equal(present->GetSpan(), content.m_Document->GetSpan())) {
@@ -356,12 +385,23 @@ void DocumentController::SaveDocument(DocumentSaveResult & result, String const 
         metadata.m_Created = metadata.m_Modified;
     }
     SetMetadata(std::move(metadata));
-    content.m_Document = file.WriteDocument();
+    content.m_Document = file.WriteDocument({});
     file.WriteItems(content);
     if (ReportLostPictures(content, target, result)) {
         return;
     }
 
+    Kernel::Counted<DocumentController const> const self(this);
+    bool const moves = target != ownPath;
+    if (moves && !VantraController::GetInstance().ReservePath(self, target)) {
+        result.SetResult(DocumentSaveResult::LockedByOther,
+                         Kernel::Format(Kernel::LocalisedString("Another open document is in the file \"%1\". Close "
+                                                                "that first, or take another name.",
+                                                                "Save document"),
+                                        target));
+        result.SetConcernsFile(true);
+        return;
+    }
     Kernel::Counted<Kernel::Archive> written;
     {
         std::optional<DomainWriterUnlockSession> unlocked;
@@ -369,16 +409,20 @@ void DocumentController::SaveDocument(DocumentSaveResult & result, String const 
             unlocked.emplace(Kernel::Counted<DomainController>(this));
         }
         Kernel::Counted<Kernel::FileLock> const ownLock = old ? old->GetLock() : nullptr;
-        auto const kind = ownLock ? ownLock->GetKind() : Kernel::FileLock::Kind::Shared;
+        auto const kind = m_HoldAlone ? Kernel::FileLock::Kind::Exclusive : Kernel::FileLock::Kind::Shared;
         written = DocumentFile::WriteArchive(content, target, ownLock.Get(), kind, result);
     }
     if (!written) {
+        if (moves) {
+            VantraController::GetInstance().ReleasePath(self, target);
+        }
         return;
     }
     m_Store->SetArchive(written);
     GetPictures().DropBytes();
-    if (target != ownPath) {
+    if (moves) {
         SetPath(target);
+        VantraController::GetInstance().MoveDocumentController(self, target);
     }
     m_FromOlderVersion = false;
     m_SavedCount = changes;

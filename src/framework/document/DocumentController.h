@@ -14,6 +14,7 @@
 
 #include <atomic>
 
+struct DocumentLinks;
 struct DocumentSettings;
 class DocumentStore;
 
@@ -85,18 +86,22 @@ public:
     /// Writes the document to its file, or to another path, which becomes its own; an empty path means its own. On the
     /// queue's turn or with the writer lock held, which is given up while the file is written; or on a controller that
     /// nobody else knows. What would come out the same to the byte is not written. On failure the file is as it was and
-    /// the document is still dirty.
+    /// the document is still dirty. An open document that is saved to another path is known under that from then on; it
+    /// is refused if another open document has the path.
     void SaveDocument(DocumentSaveResult & result, String const & path);
 
     /// Writes the document to a path that does not become its own; the document stays as dirty as it was.
     void SaveCopy(DocumentSaveResult & result, String const & path);
+    /// The same for a copy that names other paths than the document does.
+    void SaveCopy(DocumentSaveResult & result, String const & path, DocumentLinks const & links);
     /// This moment, or another one, as metadata have it: UTC, to the second.
     [[nodiscard]] static String GetTimeText();
     [[nodiscard]] static String GetTimeText(Kernel::TimeStamp time);
 
     /// Holds its file for the user alone, or lets others read it, for a document that comes in front or leaves it. False if
-    /// others hold it as well: then it stays as it was. Under the writer lock.
-    bool HoldFile(bool alone);
+    /// others hold it as well: then it stays as it was, and saving is refused until they let go; from the save after
+    /// that on it is held alone. A file that may only be read is as good as held. Under the writer lock.
+    [[nodiscard]] bool HoldFile(bool alone);
 
     /// Closes the file and gives its lock back; what is in memory stays. Again, nothing.
     virtual void ShutDownArchive();
@@ -228,4 +233,6 @@ private:
     std::atomic<bool> m_AnchorsCurrent{false};
     std::atomic<bool> m_Loaded{false};
     std::atomic<bool> m_BookLockEngaged{false};
+    /// The user has it: its file is to be locked against all others.
+    std::atomic<bool> m_HoldAlone{false};
 };

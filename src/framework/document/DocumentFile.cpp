@@ -1,6 +1,8 @@
 #include "framework/document/DocumentFile.h"
 
+#include "framework/document/DocumentLinks.h"
 #include "framework/document/DocumentRecords.h"
+#include "framework/document/DocumentSaveFailure.h"
 #include "framework/document/MasterSpreadNode.h"
 #include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Format.h"
@@ -74,7 +76,7 @@ public:
     /// `DocumentFile` writes the bytes by itself, as it has to compare them first.
     void Save(Kernel::OutStream & stream, Kernel::FileStoreOut &) const override
     {
-        Kernel::Counted<Kernel::RawData const> const data = m_File.WriteDocument();
+        Kernel::Counted<Kernel::RawData const> const data = m_File.WriteDocument({});
         stream.Write(data->GetData(), data->GetSize());
     }
     bool Load(Kernel::InStream & stream, Kernel::FileStore & store) override
@@ -332,7 +334,7 @@ bool DocumentFile::Read(Kernel::InSerialiser const & in, unsigned short version)
     return true;
 }
 
-Kernel::Counted<Kernel::RawData const> DocumentFile::WriteDocument() const
+Kernel::Counted<Kernel::RawData const> DocumentFile::WriteDocument(DocumentLinks const & links) const
 {
     DocumentNode const & node = *m_Document.GetDocument();
     Kernel::Counted<DocumentFacts const> const facts = m_Document.m_Facts.Get();
@@ -384,6 +386,9 @@ Kernel::Counted<Kernel::RawData const> DocumentFile::WriteDocument() const
         pictures.push_back(Kernel::MakeCounted<PictureRecord>());
         pictures.back()->m_Id = id;
         pictures.back()->m_Entry = entry;
+        if (auto const link = links.m_Pictures.find(id); link != links.m_Pictures.end()) {
+            pictures.back()->m_Entry.m_SourcePath = link->second;
+        }
     }
     out.SaveObjects(IDTag("pict"), pictures);
     out.SaveObjects(IDTag("flow"),
@@ -401,13 +406,13 @@ Kernel::Counted<Kernel::RawData const> DocumentFile::WriteDocument() const
         masters.push_back(Kernel::MakeCounted<SpreadRecord>());
         masters.back()->m_Name = master->GetName();
         masters.back()->m_TextRects = master->GetTextRects();
-        masters.back()->FromNode(*master, node);
+        masters.back()->FromNode(*master, node, links);
     }
     out.SaveObjects(IDTag("mast"), masters);
     std::vector<Kernel::Counted<SpreadRecord>> spreads;
     for (int i = 0; i < node.GetSpreadCount(); ++i) {
         spreads.push_back(Kernel::MakeCounted<SpreadRecord>());
-        spreads.back()->FromNode(*node.GetSpreadAtIndex(i), node);
+        spreads.back()->FromNode(*node.GetSpreadAtIndex(i), node, links);
     }
     out.SaveObjects(IDTag("sprd"), spreads);
     out.Close();
@@ -450,98 +455,35 @@ void DocumentFile::WriteItems(Content & content) const
     }
 }
 
-namespace
-{
-
-void FillResult(DocumentSaveResult & result, Kernel::Archive::CreateResult const & created)
-{
-    using Code = Kernel::Archive::CreateResult::Code;
-    using Result = DocumentSaveResult::Result;
-    static constexpr struct
-    {
-        Code m_Code;
-        Result m_Result;
-    } table[] = {{Code::FolderMissing, Result::FolderMissing},
-                 {Code::Locked, Result::LockedByOther},
-                 {Code::IsFolder, Result::BadName},
-                 {Code::NameTooLong, Result::NameTooLong},
-                 {Code::AccessDenied, Result::AccessDenied},
-                 {Code::PermissionDenied, Result::AccessDenied},
-                 {Code::ReadOnlyVolume, Result::ReadOnlyDevice},
-                 {Code::QuotaExceeded, Result::QuotaExceeded},
-                 {Code::OutOfSpace, Result::DiskFull}};
-    Result code = Result::CannotCreate;
-    for (auto const & row : table) {
-        if (row.m_Code == created.m_Code) {
-            code = row.m_Result;
-        }
-    }
-    result.SetResult(code, created.m_Text);
-    result.SetConcernsFile(true);
-}
-
-void FillResult(DocumentSaveResult & result, Kernel::ArchiveFileException const & exception)
-{
-    using Reason = Kernel::ArchiveFileException::Reason;
-    using Result = DocumentSaveResult::Result;
-    Result code = Result::WriteFailed;
-    switch (exception.GetReason()) {
-    case Reason::OutOfSpace:
-        code = Result::DiskFull;
-        break;
-    case Reason::QuotaExceeded:
-        code = Result::QuotaExceeded;
-        break;
-    case Reason::FileTooLarge:
-        code = Result::TooLarge;
-        break;
-    case Reason::PermissionDenied:
-    case Reason::AccessDenied:
-        code = Result::AccessDenied;
-        break;
-    case Reason::Locked:
-        code = Result::LockedByOther;
-        break;
-    case Reason::DeviceError:
-    case Reason::Unknown:
-        break;
-    }
-    result.SetResult(code, exception.GetMessage());
-    result.SetConcernsFile(true);
-}
-
-}
-
 Kernel::Counted<Kernel::Archive> DocumentFile::WriteArchive(Content const & content, String const & path,
                                                             Kernel::FileLock * ownLock, Kernel::FileLock::Kind kind,
                                                             DocumentSaveResult & result)
 {
     using General = Kernel::FileStoreCompressionHintGeneral;
     General const deflated(General::CompressionLevel::Fast, Kernel::CompressionPredictorType::None, 0);
-    General const stored(General::CompressionLevel::Stored, Kernel::CompressionPredictorType::None, 0);
+    General const asItLies(General::CompressionLevel::Stored, Kernel::CompressionPredictorType::None, 0);
 
     Kernel::Archive::CreateResult created;
     Kernel::Counted<Kernel::Archive> const archive =
         Kernel::Archive::CreateWithTemporary(path, DocumentController::FileType, created, ownLock);
     if (!archive) {
-        FillResult(result, created);
+        SetSaveFailure(result, created);
         return nullptr;
     }
-    try {
+    bool const stored = StoreArchive(result, archive, [&] {
         Kernel::ArchiveSessionHandle session;
         if (Kernel::Archive::SessionResult::Success !=
             archive->CreateSessionAdv(session, Kernel::Archive::SessionType::Whole, nullptr, false)) {
-            result.SetResult(DocumentSaveResult::SessionFailed,
-                             Kernel::Format("The file \"%1\" can't be written.", path));
-            return nullptr;
+            return false;
         }
         session->SaveBytes(DocumentItem, deflated, content.m_Document);
         for (Content::Item const & item : content.m_Items) {
-            session->SaveBytes(item.m_Name, item.m_Stored ? stored : deflated, item.m_Data);
+            session->SaveBytes(item.m_Name, item.m_Stored ? asItLies : deflated, item.m_Data);
         }
         archive->CloseSession(session, false);
-    } catch (Kernel::ArchiveFileException const & exception) {
-        FillResult(result, exception);
+        return true;
+    });
+    if (!stored) {
         return nullptr;
     }
     Kernel::Counted<Kernel::FileLock> const lock = archive->GetLock();

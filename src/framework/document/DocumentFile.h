@@ -36,8 +36,8 @@ public:
         std::vector<String> m_LostPictures;
     };
 
-    /// The document's own item, with the metadata as they are.
-    [[nodiscard]] Kernel::Counted<Kernel::RawData const> WriteDocument() const;
+    /// The document's own item, with the metadata as they are. What is in `links` is named as that says.
+    [[nodiscard]] Kernel::Counted<Kernel::RawData const> WriteDocument(DocumentLinks const & links) const;
     /// The layouts and pictures beside it.
     void WriteItems(Content & content) const;
     /// Writes the content to a file and opens it again for reading, shared or exclusive. Null, with `result` filled, if

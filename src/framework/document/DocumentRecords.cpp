@@ -3,6 +3,7 @@
 #include "framework/document/DocumentNode.h"
 #include "framework/document/EmbeddedDocumentNode.h"
 #include "framework/document/ShapeNode.h"
+#include "framework/kernel/PortablePath.h"
 
 #include <cmath>
 #include <utility>
@@ -220,7 +221,7 @@ void ItemRecord::Save(OutSerialiser & out) const
     }
 }
 
-bool ItemRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short)
+bool ItemRecord::Load(InSerialiser const & in, Kernel::FileStore & store, unsigned short)
 {
     in.LoadType(IDTag("kind"), m_Kind);
     in.LoadType(IDTag("list"), m_List);
@@ -228,6 +229,7 @@ bool ItemRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned sho
     in.LoadType(IDTag("flow"), m_Flow);
     in.LoadType(IDTag("fram"), m_Frame);
     in.LoadType(IDTag("path"), m_Path);
+    m_Path = Kernel::PortablePath::Resolve(m_Path, store.GetPath());
     in.LoadType(IDTag("guid"), m_Guid);
     in.LoadType(IDTag("prot"), m_Protected);
     in.LoadArray(IDTag("prtf"), m_PartFields);
@@ -240,7 +242,8 @@ bool ItemRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned sho
     return IsSane(m_Rect) && NodeChildListUnder <= m_List && m_List <= NodeChildListOver;
 }
 
-Kernel::Counted<ItemRecord> ItemRecord::FromNode(Node const & node, DocumentNode const & document)
+Kernel::Counted<ItemRecord> ItemRecord::FromNode(Node const & node, DocumentNode const & document,
+                                                  DocumentLinks const & links)
 {
     Kernel::Counted<ItemRecord> record = Kernel::MakeCounted<ItemRecord>();
     record->m_Kind = static_cast<std::uint8_t>(node.GetKind());
@@ -252,7 +255,8 @@ Kernel::Counted<ItemRecord> ItemRecord::FromNode(Node const & node, DocumentNode
         record->m_Flow = flow == flows.end() ? -1 : static_cast<std::int32_t>(flow - flows.begin());
         record->m_Frame = frame->GetFrameIndex();
     } else if (auto const * const picture = dynamic_cast<PictureNode const *>(&node)) {
-        record->m_Path = picture->GetPath();
+        auto const link = links.m_PlacedFiles.find(picture->GetPath());
+        record->m_Path = link == links.m_PlacedFiles.end() ? picture->GetPath() : link->second;
         record->m_Guid = picture->GetGUID();
         auto const * const embedded = dynamic_cast<EmbeddedDocumentNode const *>(&node);
         record->m_Protected = embedded && embedded->IsProtected();
@@ -381,13 +385,13 @@ bool SpreadRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned s
     return true;
 }
 
-void SpreadRecord::FromNode(SpreadNode const & spread, DocumentNode const & document)
+void SpreadRecord::FromNode(SpreadNode const & spread, DocumentNode const & document, DocumentLinks const & links)
 {
     m_Pages = spread.GetPages();
     m_TransparentBackground = spread.HasTransparentBackground();
     for (NodeChildListType const list : {NodeChildListUnder, NodeChildListItems, NodeChildListOver}) {
         for (Kernel::JailCounted<Node> const & item : spread.GetChildren(list)) {
-            m_Items.push_back(ItemRecord::FromNode(*item, document));
+            m_Items.push_back(ItemRecord::FromNode(*item, document, links));
         }
     }
 }
@@ -482,10 +486,11 @@ void PictureRecord::Save(OutSerialiser & out) const
     out.SaveType(IDTag("size"), m_Entry.m_Size);
 }
 
-bool PictureRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short)
+bool PictureRecord::Load(InSerialiser const & in, Kernel::FileStore & store, unsigned short)
 {
     in.LoadType(IDTag("pid "), m_Id);
     in.LoadType(IDTag("path"), m_Entry.m_SourcePath);
+    m_Entry.m_SourcePath = Kernel::PortablePath::Resolve(m_Entry.m_SourcePath, store.GetPath());
     in.LoadType(IDTag("time"), m_Entry.m_SourceTime);
     in.LoadType(IDTag("size"), m_Entry.m_Size);
     return !m_Id.Empty();

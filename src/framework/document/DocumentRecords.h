@@ -1,5 +1,6 @@
 #pragma once
 
+#include "framework/document/DocumentLinks.h"
 #include "framework/document/DocumentMetadata.h"
 #include "framework/document/DocumentPictures.h"
 #include "framework/document/DocumentSection.h"
@@ -84,7 +85,8 @@ public:
     void Save(Kernel::OutSerialiser & out) const override;
     bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
 
-    [[nodiscard]] static Kernel::Counted<ItemRecord> FromNode(Node const & node, DocumentNode const & document);
+    [[nodiscard]] static Kernel::Counted<ItemRecord> FromNode(Node const & node, DocumentNode const & document,
+                                                              DocumentLinks const & links);
     /// Null for a record that makes no sense. A text frame is entered in `frames`, by flow and place in the chain.
     [[nodiscard]] Kernel::JailCounted<Node>
     MakeNode(std::vector<std::vector<Kernel::JailCounted<TextFrameNode>>> & frames) const;
@@ -117,7 +119,7 @@ public:
     void Save(Kernel::OutSerialiser & out) const override;
     bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
 
-    void FromNode(SpreadNode const & spread, DocumentNode const & document);
+    void FromNode(SpreadNode const & spread, DocumentNode const & document, DocumentLinks const & links);
     /// Pages of version 1 had no bleed of their own: they get the document's.
     void CompleteBleed(Kernel::RectT<double> const & bleed);
     /// Gives the node its pages and those items that make sense.

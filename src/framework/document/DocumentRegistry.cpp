@@ -321,3 +321,29 @@ bool DocumentRegistry::Move(DocumentController const & document, String const & 
     m_Changed.notify_all();
     return true;
 }
+
+bool DocumentRegistry::Reserve(DocumentController const & document, String const & path)
+{
+    std::lock_guard const lock(m_Lock);
+    RecordPointer const record = Find(document);
+    RecordPointer const taken = Find(Key(path));
+    if (taken && taken != record) {
+        return false;
+    }
+    if (record) {
+        m_ByPath[Key(path)] = record;
+    }
+    return true;
+}
+
+void DocumentRegistry::Release(DocumentController const & document, String const & path)
+{
+    {
+        std::lock_guard const lock(m_Lock);
+        RecordPointer const record = Find(document);
+        if (record && record->m_Path != Key(path) && Find(Key(path)) == record) {
+            m_ByPath.erase(Key(path));
+        }
+    }
+    m_Changed.notify_all();
+}

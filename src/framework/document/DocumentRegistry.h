@@ -65,6 +65,10 @@ public:
     void List(DocumentController const & document);
     [[nodiscard]] std::vector<Kernel::Counted<DocumentController const>> GetListed() const;
     bool Move(DocumentController const & document, String const & path);
+    /// A second path for an open document until it moves there or gives it up. True for one that is not open: nobody
+    /// asks for that here.
+    bool Reserve(DocumentController const & document, String const & path);
+    void Release(DocumentController const & document, String const & path);
 
 private:
     enum class State

@@ -6,6 +6,7 @@
 #include "framework/document/DocumentRegistry.h"
 #include "framework/kernel/Assert.h"
 #include "framework/kernel/BroadcastNotification.h"
+#include "framework/kernel/Format.h"
 #include "framework/kernel/LocalisedString.h"
 #include "framework/kernel/Semaphore.h"
 
@@ -146,10 +147,15 @@ Counted<DocumentController> VantraController::OpenDocument(String const & path,
     } else if (!m_Registry->TakeInFront(*controller)) {
         return controller;
     } else {
-        // Others who only read it may go on; a save looks at the file's lock again.
         controller->AcquireWriterLock();
-        controller->HoldFile(true);
+        bool const isHeld = controller->HoldFile(true);
         controller->ReleaseWriterLock();
+        if (!isHeld) {
+            failure.AddWarning(Kernel::Format(
+                Kernel::LocalisedString("Another program is reading \"%1\": it can't be saved before that one closes it.",
+                                        "Open document"),
+                path));
+        }
     }
     IntroduceFront(controller);
     return controller;
@@ -232,6 +238,16 @@ void VantraController::AddDocumentController(Counted<DocumentController> documen
 bool VantraController::MoveDocumentController(Counted<DocumentController const> document, String const & path)
 {
     return m_Registry->Move(*document, path);
+}
+
+bool VantraController::ReservePath(Counted<DocumentController const> document, String const & path)
+{
+    return m_Registry->Reserve(*document, path);
+}
+
+void VantraController::ReleasePath(Counted<DocumentController const> document, String const & path)
+{
+    m_Registry->Release(*document, path);
 }
 
 Kernel::Activity::Rest VantraController::WaitUntilIdle()

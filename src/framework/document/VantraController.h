@@ -101,6 +101,10 @@ public:
     void AddDocumentController(Kernel::Counted<DocumentController> document);
     /// The document has another path from now on. False if that path belongs to another open document: nothing changes.
     bool MoveDocumentController(Kernel::Counted<DocumentController const> document, String const & path);
+    /// Keeps a path for an open document that is about to move there: whoever asks for it gets that document. False if
+    /// another one has it. Ends with `MoveDocumentController` or, if nothing comes of it, with `ReleasePath`.
+    bool ReservePath(Kernel::Counted<DocumentController const> document, String const & path);
+    void ReleasePath(Kernel::Counted<DocumentController const> document, String const & path);
 
     /// Count of loads under way.
     void IncrementLoadingItems() { ++m_LoadingItems; }

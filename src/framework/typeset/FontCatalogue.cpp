@@ -65,12 +65,13 @@ bool ReadEntry(FcPattern * pattern, CatalogueEntry & entry)
     return true;
 }
 
-std::vector<CatalogueEntry> List(FcPattern * pattern)
+/// `config` may be null for the machine's own.
+std::vector<CatalogueEntry> List(FcConfig * config, FcPattern * pattern)
 {
     std::vector<CatalogueEntry> entries;
     FcObjectSet * fields = FcObjectSetBuild(FC_FILE, FC_INDEX, FC_FAMILY, FC_WEIGHT, FC_SLANT, FC_WIDTH, FC_SCALABLE,
                                             FC_VARIABLE, FC_FONTFORMAT, static_cast<char const *>(nullptr));
-    if (FcFontSet * set = FcFontList(nullptr, pattern, fields)) {
+    if (FcFontSet * set = FcFontList(config, pattern, fields)) {
         for (int i = 0; i < set->nfont; ++i) {
             CatalogueEntry entry;
             if (ReadEntry(set->fonts[i], entry)) {
@@ -106,8 +107,18 @@ int WeightRank(int weight, int wanted)
 FontCatalogue::FontCatalogue()
 {
     FcPattern * all = FcPatternCreate();
-    m_Entries = List(all);
+    m_Entries = List(nullptr, all);
     FcPatternDestroy(all);
+}
+
+FontCatalogue::FontCatalogue(String const & folder)
+{
+    FcConfig * const config = FcConfigCreate();
+    FcConfigAppFontAddDir(config, reinterpret_cast<FcChar8 const *>(folder.c_str()));
+    FcPattern * const all = FcPatternCreate();
+    m_Entries = List(config, all);
+    FcPatternDestroy(all);
+    FcConfigDestroy(config);
 }
 
 CatalogueEntry const * FontCatalogue::Find(std::string_view family, int weight, bool italic, double size) const
@@ -138,7 +149,7 @@ std::vector<CatalogueEntry> FontCatalogue::FindWithCharacter(char32_t character)
     FcCharSet * characters = FcCharSetCreate();
     FcCharSetAddChar(characters, character);
     FcPatternAddCharSet(pattern, FC_CHARSET, characters);
-    std::vector<CatalogueEntry> entries = List(pattern);
+    std::vector<CatalogueEntry> entries = List(nullptr, pattern);
     FcCharSetDestroy(characters);
     FcPatternDestroy(pattern);
     std::stable_sort(entries.begin(), entries.end(), [](CatalogueEntry const & a, CatalogueEntry const & b) {

@@ -21,12 +21,13 @@ struct CatalogueEntry
     bool m_Italic = false;
 };
 
-/// The scalable faces installed on this machine, in an order that depends on nothing but their paths. Read once, at
-/// construction; immutable.
+/// The scalable faces installed on this machine, or those in one folder, in an order that depends on nothing but their
+/// paths. Read once, at construction; immutable.
 class FontCatalogue
 {
 public:
     FontCatalogue();
+    explicit FontCatalogue(String const & folder);
 
     [[nodiscard]] std::vector<CatalogueEntry> const & GetEntries() const noexcept { return m_Entries; }
 

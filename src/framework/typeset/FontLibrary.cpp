@@ -155,6 +155,34 @@ FontCatalogue & FontLibrary::GetCatalogue()
     return *m_Catalogue;
 }
 
+void FontLibrary::AddFolder(String const & folder)
+{
+    struct stat status {};
+    if (stat(folder.c_str(), &status) != 0 || !S_ISDIR(status.st_mode)) {
+        return;
+    }
+    std::lock_guard const guard(m_Lock);
+    if (m_Folders.try_emplace(folder).second) {
+        // What was missing may be here.
+        std::erase_if(m_Matches, [](auto const & match) { return !match.second.m_FamilyFound; });
+        std::erase_if(m_Fallbacks, [](auto const & fallback) { return !fallback.second; });
+    }
+}
+
+template <typename TLook>
+Kernel::Counted<FontFace const> FontLibrary::LookInFolders(TLook const & look)
+{
+    for (auto & [folder, catalogue] : m_Folders) {
+        if (!catalogue) {
+            catalogue = std::make_unique<FontCatalogue>(folder);
+        }
+        if (Kernel::Counted<FontFace const> face = look(*catalogue)) {
+            return face;
+        }
+    }
+    return nullptr;
+}
+
 Kernel::Counted<FontFace const> FontLibrary::LoadLocked(String const & path, unsigned index)
 {
     struct stat status {};
@@ -194,15 +222,20 @@ Kernel::Counted<FontFace const> FontLibrary::FromFileAndHash(String const & path
     }
     // Moved or upgraded: only files of the same name can be the same font under another path.
     std::string_view const name = path.View().substr(path.View().rfind('/') + 1);
-    for (CatalogueEntry const & entry : GetCatalogue().GetEntries()) {
-        std::string_view const other = entry.m_Path.View();
-        if (entry.m_Index == index && other.ends_with(name) && entry.m_Path != path) {
-            if (auto face = LoadLocked(entry.m_Path, index); face && face->GetHash() == hash) {
-                return face;
+    auto const look = [&](FontCatalogue const & catalogue) -> Kernel::Counted<FontFace const> {
+        for (CatalogueEntry const & entry : catalogue.GetEntries()) {
+            if (entry.m_Index == index && entry.m_Path.View().ends_with(name) && entry.m_Path != path) {
+                if (auto face = LoadLocked(entry.m_Path, index); face && face->GetHash() == hash) {
+                    return face;
+                }
             }
         }
+        return nullptr;
+    };
+    if (auto face = look(GetCatalogue())) {
+        return face;
     }
-    return nullptr;
+    return LookInFolders(look);
 }
 
 FontMatch FontLibrary::FindLocked(String const & family, int weight, bool italic, double size)
@@ -225,6 +258,15 @@ FontMatch FontLibrary::FindLocked(String const & family, int weight, bool italic
     FontMatch match;
     if (!IsGeneric(name)) {
         match = look(name);
+        if (!match.m_Face) {
+            match.m_Face = LookInFolders([&](FontCatalogue const & catalogue) -> Kernel::Counted<FontFace const> {
+                CatalogueEntry const * entry = catalogue.Find(name, weight, italic, size);
+                if (entry) {
+                    match.m_StyleFound = entry->m_Italic == italic && std::abs(entry->m_Weight - weight) <= 100;
+                }
+                return entry ? LoadLocked(entry->m_Path, entry->m_Index) : nullptr;
+            });
+        }
     }
     if (!match.m_Face) {
         for (char const * substitute : FamiliesOf(GuessGenre(name))) {
@@ -300,6 +342,17 @@ Kernel::Counted<FontFace const> FontLibrary::FindFallback(char32_t character, St
                 break;
             }
         }
+    }
+    if (!found) {
+        found = LookInFolders([&](FontCatalogue const & catalogue) -> Kernel::Counted<FontFace const> {
+            for (CatalogueEntry const & entry : catalogue.GetEntries()) {
+                Kernel::Counted<FontFace const> face = LoadLocked(entry.m_Path, entry.m_Index);
+                if (face && face->HasGlyph(character)) {
+                    return face;
+                }
+            }
+            return nullptr;
+        });
     }
     m_Fallbacks.emplace(key, found);
     return found;

@@ -51,6 +51,10 @@ public:
     /// A face of the file, whether installed or not. Null if it is no usable font.
     [[nodiscard]] Kernel::Counted<FontFace const> FromFile(String const & path, unsigned index);
 
+    /// Faces of this folder's files serve where the machine has none of the family, or not the file that a document was
+    /// set with, and where no installed font has a character. A folder that is not there is passed over.
+    void AddFolder(String const & folder);
+
     /// A face that has the character, for text whose own fonts lack it. The order is fixed: faces of the same kind as
     /// `beside` (serif or sans) for the character's script, then DejaVu, then whatever fontconfig knows, by path.
     /// `language` (BCP 47) decides between Chinese, Japanese and Korean forms. Null if no installed font has it.
@@ -72,11 +76,15 @@ private:
     };
 
     FontCatalogue & GetCatalogue();
+    /// What `look` finds first in the added folders; null if nothing.
+    template <typename TLook>
+    Kernel::Counted<FontFace const> LookInFolders(TLook const & look);
     Kernel::Counted<FontFace const> LoadLocked(String const & path, unsigned index);
     FontMatch FindLocked(String const & family, int weight, bool italic, double size);
 
     std::mutex m_Lock; ///< Guards all below.
     std::unique_ptr<FontCatalogue> m_Catalogue;
+    std::map<String, std::unique_ptr<FontCatalogue>> m_Folders; ///< Null: not looked into yet.
     std::map<FileKey, Kernel::Counted<FontFace const>> m_ByFile;
     std::map<std::pair<ContentHash, unsigned>, Kernel::Counted<FontFace const>> m_ByHash;
     std::map<std::tuple<std::string, int, bool, double>, FontMatch> m_Matches;
