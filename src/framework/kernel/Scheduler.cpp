@@ -30,8 +30,6 @@ constexpr auto GapInABurst = std::chrono::microseconds(20);
 /// most turns do, and turns come in bursts.
 constexpr auto LookOutTime = std::chrono::microseconds(20);
 constexpr auto IdleTimeOfAThread = std::chrono::seconds(2);
-/// No more threads than this are added in one step, so that a busy machine is not taken for a blocked pool.
-constexpr std::size_t ThreadsAtOnce = 4;
 
 class FunctionTurn final : public Schedulable
 {
@@ -64,12 +62,14 @@ public:
         if (m_LookingOut >= m_Ready.size()) {
             return;
         }
-        // In a burst, whoever has just begun a turn is back sooner than another thread would be awake.
-        bool const isBurst = now - m_LastTaken < GapInABurst && m_Threads > m_Sleeping + m_LookingOut;
-        if (!isBurst && m_Sleeping + m_LookingOut >= m_Ready.size()) {
+        // In a burst, whoever has just begun a turn is back sooner than another thread would be awake; and more threads
+        // than the machine has processors only get in each other's way, unless they are blocked.
+        std::size_t const busy = m_Threads - m_Sleeping - m_LookingOut;
+        bool const isLeft = busy >= m_FirstThreads || (busy > 0 && now - m_LastTaken < GapInABurst);
+        if (!isLeft && m_Sleeping + m_LookingOut >= m_Ready.size()) {
             lock.unlock();
             m_TurnReady.notify_one();
-        } else if (!isBurst && m_Threads < m_FirstThreads) {
+        } else if (!isLeft && m_Threads < m_FirstThreads) {
             AddThread();
         } else if (!m_WatchesReady) {
             EnsureWatcher();
@@ -137,15 +137,6 @@ private:
         std::thread([this] { Work(); }).detach();
     }
 
-    /// Turns that have been ready since before then. With the lock held.
-    [[nodiscard]] std::size_t CountOlder(std::chrono::steady_clock::time_point since) const
-    {
-        // They stand in the order in which they came.
-        auto const younger = std::partition_point(m_Ready.begin(), m_Ready.end(),
-                                                  [since](Turn const & turn) { return turn.m_Since <= since; });
-        return static_cast<std::size_t>(younger - m_Ready.begin());
-    }
-
     /// With the lock held.
     void EnsureWatcher()
     {
@@ -202,14 +193,12 @@ private:
             auto wake = std::chrono::steady_clock::time_point::max();
             if (!m_Ready.empty()) {
                 auto const now = std::chrono::steady_clock::now();
-                std::size_t const left = CountOlder(now - PatienceForASleeper);
-                for (std::size_t woken = 0; woken < std::min(left, m_Sleeping); ++woken) {
+                // One thread a round: if the others are blocked, more rounds follow; if the machine is busy, one helps
+                // more than many.
+                auto const waiting = now - m_Ready.front().m_Since;
+                if (m_Sleeping > 0 && waiting >= PatienceForASleeper) {
                     m_TurnReady.notify_one();
-                }
-                // The sleeping ones are on their way.
-                std::size_t const overdue = CountOlder(now - PatienceForAThread);
-                std::size_t const missing = overdue > m_Sleeping ? overdue - m_Sleeping : 0;
-                for (std::size_t added = 0; added < std::min(missing, ThreadsAtOnce); ++added) {
+                } else if (m_Sleeping == 0 && waiting >= PatienceForAThread) {
                     AddThread();
                 }
                 wake = std::max(m_Ready.front().m_Since, now) + PatienceForASleeper;
