@@ -4,11 +4,14 @@
 #include "app/Interruption.h"
 #include "framework/document/VantraController.h"
 #include "framework/kernel/Progress.h"
+#include "import/Text.h"
 #include "output/ExportBookCommand.h"
 #include "output/ExportBookCompleteNotification.h"
 
 namespace App
 {
+
+using Import::Text;
 
 namespace
 {
@@ -35,13 +38,15 @@ Kernel::Consolidated<Renderer::FileExportOptions> MakeOptions(Book::BookControll
 std::string DescribeQuietResult(ExportResult result)
 {
     if (Interruption::IsRaised()) {
-        return "Interrupted; the PDF was not written.";
+        return Text("Interrupted; the PDF was not written.", "Program");
     }
     if (ExportResultAborted == result) {
-        return "The export stopped half-way, so the PDF was not written: there may be no room left for its temporary "
-               "file.";
+        return Text(
+            "The export stopped half-way, so the PDF was not written: there may be no room left for its temporary "
+            "file.",
+            "Program");
     }
-    return "The PDF could not be made.";
+    return Text("The PDF could not be made.", "Program");
 }
 
 }

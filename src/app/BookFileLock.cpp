@@ -1,4 +1,5 @@
 #include "app/BookFileLock.h"
+#include "import/Text.h"
 
 #include <cerrno>
 #include <cstring>
@@ -9,6 +10,8 @@
 
 namespace App
 {
+
+using Import::Text;
 
 BookFileLock::~BookFileLock()
 {
@@ -25,17 +28,17 @@ bool BookFileLock::Take(std::filesystem::path const & book, std::string & proble
     for (int attempt = 0; attempt < 10; ++attempt) {
         int const file = open(m_Path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0666);
         if (file < 0) {
-            problem = "The lock " + m_Path.string() + " cannot be made: " + std::strerror(errno) + ".";
+            problem = Text("The lock %1 cannot be made: %2.", "Program", m_Path.string(), std::strerror(errno));
             return false;
         }
         if (0 != flock(file, LOCK_EX | LOCK_NB)) {
             char owner[64] = {};
             ssize_t const length = read(file, owner, sizeof owner - 1);
             close(file);
-            problem = "Another program is at work on this book" +
-                      (0 < length ? " (process " + std::string(owner, static_cast<std::size_t>(length)) + ")"
-                                  : std::string()) +
-                      "; wait until it has ended.";
+            problem = 0 < length
+                          ? Text("Another program is at work on this book (process %1); wait until it has ended.",
+                                 "Program", std::string(owner, static_cast<std::size_t>(length)))
+                          : Text("Another program is at work on this book; wait until it has ended.", "Program");
             return false;
         }
         // The one before may have removed the file between our opening and locking it.
@@ -57,7 +60,7 @@ bool BookFileLock::Take(std::filesystem::path const & book, std::string & proble
         }
         close(file);
     }
-    problem = "The lock " + m_Path.string() + " cannot be had; try again.";
+    problem = Text("The lock %1 cannot be had; try again.", "Program", m_Path.string());
     return false;
 }
 

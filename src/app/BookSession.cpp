@@ -13,6 +13,7 @@
 #include "core/BookCollection.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/document/VantraController.h"
+#include "import/Text.h"
 
 #include <algorithm>
 #include <chrono>
@@ -21,6 +22,8 @@
 
 namespace App
 {
+
+using Import::Text;
 
 namespace
 {
@@ -109,7 +112,8 @@ bool BookSession::Open(std::string const & path, Import::MessageList & messages)
         // The listener hears of it as well; one message is enough.
         WaitForRest();
         static_cast<void>(m_Listener.TakeMessages());
-        messages.Error("book-unreadable", {path}, reason.empty() ? "The book cannot be opened." : reason);
+        messages.Error("book-unreadable", {path},
+                       reason.empty() ? Text("The book cannot be opened.", "Program") : reason);
         return false;
     }
     WaitForRest();
@@ -141,8 +145,8 @@ void BookSession::ReportUnusable(Import::MessageList & messages) const
     for (ChapterPtr const & chapter : GetChapters()) {
         if (!chapter->IsValid()) {
             messages.Error("chapter-unusable", {chapter->GetPath().ToStd()},
-                           "The chapter \"" + chapter->GetName().ToStd() +
-                               "\" is missing from the output: " + chapter->GetStatusDescription().ToStd() + ".");
+                           Text("The chapter \"%1\" is missing from the output: %2.", "Program", chapter->GetName(),
+                                chapter->GetStatusDescription()));
         }
     }
 }
@@ -234,10 +238,9 @@ int BookSession::Update(Import::MessageList & messages)
         if (g_MostPasses == pass) {
             std::string const name = std::filesystem::path(moved.second->m_Path).filename().string();
             messages.Warn("unsettled", {},
-                          "The chapter " + name + " still changes its number of pages (" +
-                              std::to_string(moved.first->m_Pages) + ", then " + std::to_string(moved.second->m_Pages) +
-                              ") after " + std::to_string(g_MostPasses) +
-                              " passes; page numbers behind it may be off.");
+                          Text("The chapter %1 still changes its number of pages (%2, then %3) after %4 passes; page "
+                               "numbers behind it may be off.",
+                               "Program", name, moved.first->m_Pages, moved.second->m_Pages, int(g_MostPasses)));
             return pass;
         }
         before = std::move(after);
@@ -262,7 +265,7 @@ bool BookSession::SaveAnyway(std::string const & path, Import::MessageList & mes
     Import::MessageList const heard = m_Listener.TakeMessages();
     messages.Append(heard);
     if (!m_Listener.WasSaved() && !heard.HasErrors()) {
-        messages.Error("book-unsaved", {path}, "The book could not be saved.");
+        messages.Error("book-unsaved", {path}, Text("The book could not be saved.", "Program"));
     }
     return m_Listener.WasSaved();
 }

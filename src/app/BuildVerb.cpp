@@ -41,7 +41,7 @@ public:
     {
         bool const isGood = ReadPlan() && MakeWorkFolder() && RunLocked();
         if (Interruption::IsRaised() && !m_Messages.HasErrors()) {
-            m_Messages.Error("interrupted", {}, "Interrupted; what was finished before stays.");
+            m_Messages.Error("interrupted", {}, Text("Interrupted; what was finished before stays.", "Program"));
         }
         return Report(isGood && !m_Messages.HasErrors());
     }
@@ -64,12 +64,12 @@ private:
         m_Target = FindTarget();
         std::error_code error;
         if (fs::is_directory(m_Target, error)) {
-            m_Messages.Error("output", {m_Target.string()}, "The output is a folder; name a file.");
+            m_Messages.Error("output", {m_Target.string()}, Text("The output is a folder; name a file.", "Program"));
             return false;
         }
         if (fs::path const parent = m_Target.parent_path(); !fs::is_directory(parent, error)) {
             m_Messages.Error("output", {m_Target.string()},
-                             "The folder " + parent.string() + " for the output does not exist.");
+                             Text("The folder %1 for the output does not exist.", "Program", parent.string()));
             return false;
         }
         return true;
@@ -98,7 +98,7 @@ private:
         fs::create_directories(m_Work, error);
         if (!fs::is_directory(m_Work, error)) {
             m_Messages.Error("work-folder", {m_Work.string()},
-                             "The work folder cannot be made; name another with --work.");
+                             Text("The work folder cannot be made; name another with --work.", "Program"));
             return false;
         }
         return true;
@@ -136,7 +136,7 @@ private:
             return true;
         }
         bool const isImported = importer.Run(m_Chapters, m_Messages, [this](int done, int all) {
-            m_Context.m_Console.Progress("Importing chapters", static_cast<double>(done) / all);
+            m_Context.m_Console.Progress(Text("Importing chapters", "Program"), static_cast<double>(done) / all);
         });
         if (!isImported || Interruption::IsRaised()) {
             return false;
@@ -185,11 +185,12 @@ private:
             }
             // The book of a work folder holds nothing that the sources do not say.
             for (Import::Message const & message : trouble.All()) {
-                m_Messages.Warn(message.m_Kind, message.m_Place, message.m_Text + " The book is made anew.");
+                m_Messages.Warn(message.m_Kind, message.m_Place,
+                                message.m_Text + " " + Text("The book is made anew.", "Program"));
             }
             if (!fs::remove(m_Book, error)) {
                 m_Messages.Error("book-unreadable", {m_Book.string()},
-                                 "The damaged book cannot be removed: " + error.message() + ".");
+                                 Text("The damaged book cannot be removed: %1.", "Program", error.message()));
                 return false;
             }
         }
@@ -242,8 +243,8 @@ private:
         std::string problem;
         if (!state.Save(m_Work, problem)) {
             m_Messages.Warn("work-folder", {m_Work.string()},
-                            "The work folder's memory could not be written (" + problem +
-                                "); the next run takes longer.");
+                            Text("The work folder's memory could not be written (%1); the next run takes longer.",
+                                 "Program", problem));
         }
     }
 
@@ -273,12 +274,14 @@ private:
         }
         console.Tell(m_Messages);
         if (m_IsUpToDate) {
-            console.Say(m_Target.string() + " is up to date (" + std::to_string(m_Pages) + " pages)");
+            console.Say(Import::CountText("%2 is up to date (%1 page)", "%2 is up to date (%1 pages)", "Program",
+                                          m_Pages, m_Target.string()));
         } else if (m_IsWritten) {
             auto const fresh = std::count_if(m_Chapters.begin(), m_Chapters.end(),
                                              [](auto const & chapter) { return chapter.m_IsFresh; });
-            console.Say("Wrote " + m_Target.string() + ": " + std::to_string(m_Pages) + " pages, " +
-                        std::to_string(fresh) + " of " + std::to_string(m_Chapters.size()) + " documents made anew");
+            console.Say(
+                Import::CountText("Wrote %2: %1 page", "Wrote %2: %1 pages", "Program", m_Pages, m_Target.string()) +
+                ", " + Text("%1 of %2 documents made anew", "Program", fresh, m_Chapters.size()));
         }
         return isGood ? ExitFine : ExitFailed;
     }

@@ -49,9 +49,11 @@ int RunExport(VerbContext & context, ExportOptions const & options)
     int pages = 0;
     bool isGood = false;
     if (!fs::is_regular_file(book, error)) {
-        messages.Error("book-missing", {options.m_Book}, "There is no such book file.");
+        messages.Error("book-missing", {options.m_Book},
+                       Text("There is no such book file; \"korvane new\" makes one.", "Program"));
     } else if (!fs::is_directory(target.parent_path(), error)) {
-        messages.Error("output", {target.string()}, "The folder for the output does not exist.");
+        messages.Error("output", {target.string()},
+                       Text("The folder %1 for the output does not exist.", "Program", target.parent_path().string()));
     } else if (!lock.Take(book, problem)) {
         messages.Error("book-locked", {options.m_Book}, problem);
     } else {
@@ -63,7 +65,7 @@ int RunExport(VerbContext & context, ExportOptions const & options)
             session.ReportUnusable(messages);
             if (session.GetChapters().empty()) {
                 messages.Error("book-empty", {options.m_Book},
-                               "The book has no chapters, so there is nothing to write.");
+                               Text("The book has no chapters, so there is nothing to write.", "Program"));
                 isGood = false;
             }
         }
@@ -89,7 +91,7 @@ int RunExport(VerbContext & context, ExportOptions const & options)
         messages.Append(listener.TakeMessages());
     }
     if (Interruption::IsRaised() && !messages.HasErrors()) {
-        messages.Error("interrupted", {}, "Interrupted; the PDF was not written.");
+        messages.Error("interrupted", {}, Text("Interrupted; the PDF was not written.", "Program"));
     }
     isGood = isGood && !messages.HasErrors();
 
@@ -104,7 +106,7 @@ int RunExport(VerbContext & context, ExportOptions const & options)
     }
     console.Tell(messages);
     if (isGood) {
-        console.Say("Wrote " + target.string() + ": " + std::to_string(pages) + " pages");
+        console.Say(Import::CountText("Wrote %2: %1 page", "Wrote %2: %1 pages", "Program", pages, target.string()));
     }
     return isGood ? ExitFine : ExitFailed;
 }

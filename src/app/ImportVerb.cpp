@@ -31,7 +31,8 @@ std::optional<Import::BookPlan> PlanFiles(std::vector<std::string> const & sourc
     for (std::string const & source : sources) {
         fs::path const path = fs::absolute(source, error).lexically_normal();
         if (fs::is_directory(path, error)) {
-            messages.Error("source", {source}, "A folder has to be the only source; name files otherwise.");
+            messages.Error("source", {source},
+                           Text("A folder has to be the only source; name files otherwise.", "Program"));
         } else {
             Import::AddChapter(plan, path.string(), {source}, messages);
         }
@@ -70,14 +71,14 @@ int RunImport(VerbContext & context, ImportOptions const & options)
         if (lock.Take(work / "book.kvbook", problem)) {
             Import::Importer importer(*plan, *look, work, Interruption::Flag());
             isGood = importer.Run(chapters, messages, [&](int done, int all) {
-                context.m_Console.Progress("Importing chapters", static_cast<double>(done) / all);
+                context.m_Console.Progress(Text("Importing chapters", "Program"), static_cast<double>(done) / all);
             });
         } else {
             messages.Error("work-folder", {work.string()}, problem);
         }
     }
     if (Interruption::IsRaised()) {
-        messages.Error("interrupted", {}, "Interrupted; documents that were finished stay.");
+        messages.Error("interrupted", {}, Text("Interrupted; documents that were finished stay.", "Program"));
     }
     isGood = isGood && !messages.HasErrors();
 
@@ -95,7 +96,8 @@ int RunImport(VerbContext & context, ImportOptions const & options)
     }
     console.Tell(messages);
     for (Import::ImportedChapter const & chapter : chapters) {
-        console.Say(chapter.m_Document.string() + (chapter.m_IsFresh ? "" : " (unchanged)"));
+        console.Say(chapter.m_IsFresh ? chapter.m_Document.string()
+                                      : Text("%1 (unchanged)", "Program", chapter.m_Document.string()));
     }
     return isGood ? ExitFine : ExitFailed;
 }

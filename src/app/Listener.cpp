@@ -26,7 +26,8 @@ namespace
 
 bool IsYes(std::string const & answer)
 {
-    return "y" == answer || "Y" == answer || "yes" == answer;
+    return "y" == answer || "Y" == answer || "yes" == answer || Text("y", "Question") == answer ||
+           Text("yes", "Question") == answer;
 }
 
 }
@@ -108,7 +109,7 @@ void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
         }
     } else if (auto const * broken = dynamic_cast<CommandFailedNotification const *>(heard)) {
         Add(Severity::Error, "command-failed", "",
-            broken->GetDescription().ToStd() + " failed: " + broken->GetReason().ToStd());
+            Text("%1 failed: %2", "Program", broken->GetDescription(), broken->GetReason()));
     } else if (auto const * lost = dynamic_cast<DocumentSaveFailedNotification const *>(heard)) {
         std::string const kept = lost->GetKeptPath().Empty()
                                      ? Text("Nor could its changes be kept anywhere else: they are lost.", "Program")
@@ -121,7 +122,8 @@ void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
     } else if (auto const * prompt = dynamic_cast<DocumentPromptNotification const *>(heard)) {
         AnswerPrompt(*prompt);
     } else if (auto const * passwords = dynamic_cast<RequestPdfPasswordsNotification const *>(heard)) {
-        Add(Severity::Warning, "password", "", "A placed PDF is protected by a password and stays closed.");
+        Add(Severity::Warning, "password", "",
+            Text("A placed PDF is protected by a password and stays closed.", "Program"));
         passwords->Answer({});
     }
 }
@@ -133,7 +135,8 @@ bool Listener::Ask(std::string const & question, char const * option, std::strin
         return true;
     }
     Add(Import::Severity::Warning, "unanswered", "",
-        question + " Nobody can be asked here, so the answer is no; " + option + " answers it beforehand.");
+        question + " " +
+            Text("Nobody can be asked here, so the answer is no; %1 answers it beforehand.", "Program", option));
     return false;
 }
 
@@ -148,8 +151,8 @@ void Listener::AnswerPrompt(DocumentPromptNotification const & prompt)
     if (StandingAnswers::Choice::Ask == standing) {
         std::string answer;
         std::string const title = prompt.GetTitle().Empty() ? std::string() : prompt.GetTitle().ToStd() + ": ";
-        isYes = Ask(title + prompt.GetMessage().ToStd() + " [y/N]",
-                    isMissing ? "--locate or --no-locate" : "--upgrade or --no-upgrade", answer) &&
+        isYes = Ask(title + prompt.GetMessage().ToStd() + " " + Text("[y/N]", "Question"),
+                    isMissing ? "--locate, --no-locate" : "--upgrade, --no-upgrade", answer) &&
                 IsYes(answer);
     }
     auto const choices = static_cast<unsigned>(prompt.GetChoices());
@@ -162,8 +165,8 @@ void Listener::AnswerPrompt(DocumentPromptNotification const & prompt)
 void Listener::AnswerFile(Book::ChooseChapterFileNotification const & prompt)
 {
     m_Console.EndProgress();
-    std::string const question = Text("%1: where is %2 now? (nothing ends the search)", "Program", prompt.GetTitle(),
-                                      prompt.GetCurrentPath());
+    std::string const question =
+        Text("%1: where is %2 now? (nothing ends the search)", "Program", prompt.GetTitle(), prompt.GetCurrentPath());
     std::string answer;
     while (m_Ask && m_Ask(question, answer) && !answer.empty()) {
         std::error_code error;
@@ -172,7 +175,8 @@ void Listener::AnswerFile(Book::ChooseChapterFileNotification const & prompt)
             prompt.ProcessResponse(String(file.string()));
             return;
         }
-        m_Console.Tell({Import::Severity::Warning, "no-file", {file.string()}, Text("There is no such file.", "Program")});
+        m_Console.Tell(
+            {Import::Severity::Warning, "no-file", {file.string()}, Text("There is no such file.", "Program")});
     }
     {
         std::lock_guard const lock(m_Lock);
@@ -192,7 +196,8 @@ void Listener::AnswerPermission(Book::PromptFixBookPermissionsNotification const
     std::string answer;
     if (!m_Ask || !m_Ask(question + " " + Text("[r]etry, [i]gnore this file, ignore [a]ll:", "Program"), answer)) {
         Add(Import::Severity::Error, "chapter-denied", path,
-            Text("The chapter's file may not be read; give yourself the right to read it (chmod u+r) or ask its owner, and "
+            Text("The chapter's file may not be read; give yourself the right to read it (chmod u+r) or ask its owner, "
+                 "and "
                  "try again.",
                  "Program"));
         prompt.IgnoreAll();

@@ -49,32 +49,32 @@ std::vector<std::string> Summarise(Json const & json)
 {
     std::vector<std::string> lines;
     if ("book" == json.at("kind")) {
-        lines.push_back("Book " + json.at("name").get<std::string>() + ", " +
-                        std::to_string(json.at("chapters").size()) + " chapters");
+        lines.push_back(Import::CountText("Book %2, %1 chapter", "Book %2, %1 chapters", "Program",
+                                          json.at("chapters").size(), json.at("name").get<std::string>()));
         for (Json const & chapter : json.at("chapters")) {
             lines.push_back("  " + std::to_string(chapter.at("index").get<int>() + 1) + "  " +
                             chapter.at("name").get<std::string>() +
-                            (chapter.at("key").get<bool>() ? " (style source)" : ""));
+                            (chapter.at("key").get<bool>() ? " " + Text("(style source)", "Program") : ""));
         }
         return lines;
     }
     Json const & metadata = json.at("metadata");
-    lines.push_back("Document \"" + metadata.at("title").get<std::string>() + "\", language " +
-                    metadata.at("language").get<std::string>());
-    lines.push_back("  " + std::to_string(json.at("pageCount").get<int>()) + " pages on " +
-                    std::to_string(json.at("spreads").size()) + " spreads, " +
-                    std::to_string(json.at("sections").size()) + " sections, " +
-                    std::to_string(json.at("styles").at("paragraph").size()) + " paragraph styles");
+    lines.push_back(Text("Document \"%1\", language %2", "Program", metadata.at("title").get<std::string>(),
+                         metadata.at("language").get<std::string>()));
+    lines.push_back("  " + Text("%1 pages on %2 spreads, %3 sections, %4 paragraph styles", "Program",
+                                json.at("pageCount").get<int>(), json.at("spreads").size(), json.at("sections").size(),
+                                json.at("styles").at("paragraph").size()));
     for (Json const & section : json.at("sections")) {
-        lines.push_back("  section at page index " + std::to_string(section.at("startPageIndex").get<int>()) +
-                        ", number " + std::to_string(section.at("startNumber").get<int>()) +
-                        (section.at("restart").get<bool>() ? ", restarts" : "") +
-                        (section.at("included").get<bool>() ? "" : ", left out of output"));
+        lines.push_back("  " +
+                        Text("section at page index %1, number %2", "Program", section.at("startPageIndex").get<int>(),
+                             section.at("startNumber").get<int>()) +
+                        (section.at("restart").get<bool>() ? Text(", restarts", "Program") : "") +
+                        (section.at("included").get<bool>() ? "" : Text(", left out of output", "Program")));
     }
     for (Json const & story : json.at("stories")) {
-        lines.push_back("  story of " + std::to_string(story.at("paragraphs").size()) + " paragraphs in " +
-                        std::to_string(story.at("frameCount").get<int>()) + " frames, " +
-                        std::to_string(story.at("notes").size()) + " notes");
+        lines.push_back("  " + Text("story of %1 paragraphs in %2 frames, %3 notes", "Program",
+                                    story.at("paragraphs").size(), story.at("frameCount").get<int>(),
+                                    story.at("notes").size()));
     }
     return lines;
 }
@@ -88,11 +88,12 @@ int RunShow(VerbContext & context, std::string const & file)
     Json json;
     switch (KindOf(path)) {
     case FileKind::Missing:
-        messages.Error("file-missing", {file}, "There is no such file.");
+        messages.Error("file-missing", {file}, Text("There is no such file.", "Program"));
         break;
     case FileKind::Folder:
     case FileKind::Other:
-        messages.Error("file-foreign", {file}, "This is neither a book (.kvbook) nor a document (.kvdoc).");
+        messages.Error("file-foreign", {file},
+                       Text("This is neither a book (.kvbook) nor a document (.kvdoc).", "Program"));
         break;
     case FileKind::Book: {
         StandingAnswers answers;

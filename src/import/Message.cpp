@@ -1,5 +1,7 @@
 #include "import/Message.h"
 
+#include "import/Text.h"
+
 #include <algorithm>
 #include <tuple>
 
@@ -19,6 +21,24 @@ std::string_view ToText(Severity severity)
     return "error";
 }
 
+namespace
+{
+
+std::string SeverityForPeople(Severity severity)
+{
+    switch (severity) {
+    case Severity::Note:
+        return Text("note", "Severity");
+    case Severity::Warning:
+        return Text("warning", "Severity");
+    case Severity::Error:
+        break;
+    }
+    return Text("error", "Severity");
+}
+
+}
+
 std::string ToText(Message const & message)
 {
     std::string text = message.m_Place.m_File;
@@ -31,8 +51,7 @@ std::string ToText(Message const & message)
     if (!text.empty()) {
         text += ": ";
     }
-    text += ToText(message.m_Severity);
-    return text + ": " + message.m_Text;
+    return text + SeverityForPeople(message.m_Severity) + ": " + message.m_Text;
 }
 
 void MessageList::Add(Severity severity, std::string_view kind, Place place, std::string text)

@@ -40,6 +40,7 @@ struct Message
 
 /// "file:line:column: warning: text", leaving out what is not known.
 std::string ToText(Message const & message);
+/// The word for it in JSON and scripts, never translated.
 std::string_view ToText(Severity severity);
 
 /// Messages in the order in which they arose. A plain value, used by one thread.

@@ -1,6 +1,7 @@
 #include "import/SaveFailure.h"
 
 #include "framework/document/DocumentSaveResult.h"
+#include "import/Text.h"
 
 namespace Import
 {
@@ -8,42 +9,42 @@ namespace Import
 namespace
 {
 
-char const * ReasonOf(int result)
+std::string ReasonOf(int result)
 {
     switch (result) {
     case DocumentSaveResult::AccessDenied:
     case DocumentSaveResult::PermissionDenied:
-        return "access is denied";
+        return Text("access is denied", "Save failure");
     case DocumentSaveResult::LockedByOther:
-        return "another program has it open";
+        return Text("another program has it open", "Save failure");
     case DocumentSaveResult::FolderMissing:
-        return "its folder does not exist";
+        return Text("its folder does not exist", "Save failure");
     case DocumentSaveResult::CannotCreate:
-        return "it cannot be created";
+        return Text("it cannot be created", "Save failure");
     case DocumentSaveResult::DiskFull:
-        return "the disk is full";
+        return Text("the disk is full", "Save failure");
     case DocumentSaveResult::QuotaExceeded:
     case DocumentSaveResult::QuotaUsedUp:
-        return "your share of the disk is used up";
+        return Text("your share of the disk is used up", "Save failure");
     case DocumentSaveResult::TooLarge:
-        return "it is too large for the disk";
+        return Text("it is too large for the disk", "Save failure");
     case DocumentSaveResult::ReadOnlyDevice:
-        return "the disk is read-only";
+        return Text("the disk is read-only", "Save failure");
     case DocumentSaveResult::NameTooLong:
-        return "its name is too long";
+        return Text("its name is too long", "Save failure");
     case DocumentSaveResult::BadName:
-        return "its name is that of a folder";
+        return Text("its name is that of a folder", "Save failure");
     case DocumentSaveResult::TooManyOpenFiles:
-        return "too many files are open";
+        return Text("too many files are open", "Save failure");
     case DocumentSaveResult::OutOfMemory:
-        return "there is not enough memory";
+        return Text("there is not enough memory", "Save failure");
     case DocumentSaveResult::Busy:
-        return "the disk is busy";
+        return Text("the disk is busy", "Save failure");
     case DocumentSaveResult::WriteFailed:
     case DocumentSaveResult::DeviceError:
-        return "writing failed";
+        return Text("writing failed", "Save failure");
     default:
-        return "the reason is not known";
+        return Text("the reason is not known", "Save failure");
     }
 }
 
@@ -51,16 +52,17 @@ char const * ReasonOf(int result)
 
 std::string DescribeSaveFailure(DocumentSaveResult const & result, std::string const & file)
 {
-    std::string text = "The file " + file + " could not be written: ";
-    if (!result.GetText().Empty()) {
-        text += result.GetText().ToStd();
-        return text.ends_with('.') ? text : text + ".";
+    std::string reason = result.GetText().ToStd();
+    if (reason.ends_with('.')) {
+        reason.pop_back();
     }
-    text += ReasonOf(result.GetResult());
-    if (DocumentSaveResult::Unknown == result.GetResult()) {
-        text += " (code " + std::to_string(result.GetResult()) + ")";
+    if (reason.empty()) {
+        reason = ReasonOf(result.GetResult());
+        if (DocumentSaveResult::Unknown == result.GetResult()) {
+            reason += " " + Text("(code %1)", "Save failure", static_cast<int>(result.GetResult()));
+        }
     }
-    return text + ".";
+    return Text("The file %1 could not be written: %2.", "Save failure", file, reason);
 }
 
 }
