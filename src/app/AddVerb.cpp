@@ -64,6 +64,16 @@ void TellWhatStayedOut(BookEdit & edit, std::vector<String> const & paths)
     }
 }
 
+/// The book itself takes in what it can't open, as it may become readable one day; its user meant a whole document.
+void RefuseUnusable(BookEdit & edit, BookEdit::ChapterPtr const & chapter)
+{
+    if (!chapter->IsValid()) {
+        edit.m_Messages.Error("chapter-unusable", {chapter->GetPath().ToStd()},
+                              Text("The document cannot be used (%1), so the book is as it was.", "Program",
+                                   chapter->GetStatusDescription()));
+    }
+}
+
 void AddDocuments(BookEdit & edit, std::vector<std::string> const & files, std::string const & before)
 {
     BookEdit::ChapterPtr const next = before.empty() ? nullptr : edit.Find(before);
@@ -76,6 +86,7 @@ void AddDocuments(BookEdit & edit, std::vector<std::string> const & files, std::
     TellWhatStayedOut(edit, paths);
     for (auto const & chapter : edit.m_Session.GetChapters()) {
         if (paths.end() != std::find(paths.begin(), paths.end(), chapter->GetPath())) {
+            RefuseUnusable(edit, chapter);
             edit.Say(Text("Added chapter %1.", "Program", edit.Describe(chapter)));
         }
     }
@@ -93,8 +104,12 @@ void ReplaceDocument(BookEdit & edit, ReplaceOptions const & options)
     edit.m_Session.Run(Kernel::MakeCounted<Book::ReplaceChapterCommand>(old, String(path)));
     edit.m_Session.WaitForRest();
     BookEdit::ChapterPtr const chapter = edit.m_Session.GetBook()->GetChapterFromPath(String(path));
+    if (!chapter) {
+        return;
+    }
+    RefuseUnusable(edit, chapter);
     edit.Say(Text("Chapter %1 is now the document %2.", "Program", was, path));
-    if (0 != start && chapter && start != chapter->GetStartFromPage()) {
+    if (0 != start && start != chapter->GetStartFromPage()) {
         std::string const number = std::to_string(edit.m_Session.GetBook()->IndexFromChapter(chapter) + 1);
         edit.m_Messages.Note("start-page", {edit.m_File.string()},
                              Text("The chapter started at page %1 and now goes on from the one before; \"korvane "

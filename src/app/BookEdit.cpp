@@ -4,7 +4,6 @@
 #include "app/ChapterNames.h"
 #include "app/FileKind.h"
 #include "app/Interruption.h"
-#include "content/UpdateNumbersCommand.h"
 #include "import/Text.h"
 
 #include <algorithm>
@@ -39,14 +38,6 @@ Json ListChapters(BookSession const & session)
                         {"pages", chapter->DescribePages().ToStd()}});
     }
     return list;
-}
-
-void Renumber(BookSession & session)
-{
-    if (auto chapters = session.GetChapters(); !chapters.empty()) {
-        session.Run(Kernel::MakeCounted<Book::UpdateNumbersCommand>(std::move(chapters), true, true, true));
-        session.WaitForRest();
-    }
 }
 
 /// One verb's work on one book, from the lock to the last line.
@@ -132,7 +123,7 @@ private:
     void Finish(BookEdit & edit)
     {
         if (m_Plan.m_Renumbers) {
-            Renumber(edit.m_Session);
+            edit.m_Session.Renumber(m_Messages);
         }
         if (Saving::Always == m_Plan.m_Saving) {
             edit.m_Session.SaveAnyway(m_File.string(), m_Messages);

@@ -10,6 +10,7 @@
 #include "commands/NewBookCommand.h"
 #include "commands/SaveBookAsCommand.h"
 #include "commands/SaveBookCommand.h"
+#include "content/UpdateNumbersCommand.h"
 #include "core/BookCollection.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/document/VantraController.h"
@@ -224,9 +225,25 @@ std::vector<BookSession::Extent> BookSession::GetExtents() const
 
 int BookSession::Update(Import::MessageList & messages)
 {
+    return Settle([this] { Book::BookCollection::GetInstance().PreOutput(m_Book, GetChapters()); }, messages);
+}
+
+int BookSession::Renumber(Import::MessageList & messages)
+{
+    return Settle(
+        [this] {
+            if (ChapterList chapters = GetChapters(); !chapters.empty()) {
+                Run(Kernel::MakeCounted<Book::UpdateNumbersCommand>(std::move(chapters), true, true, true));
+            }
+        },
+        messages);
+}
+
+int BookSession::Settle(std::function<void()> const & runPass, Import::MessageList & messages)
+{
     std::vector<Extent> before = GetExtents();
     for (int pass = 1;; ++pass) {
-        Book::BookCollection::GetInstance().PreOutput(m_Book, GetChapters());
+        runPass();
         WaitForRest();
         std::vector<Extent> after = GetExtents();
         // Numbers follow from the counts of pages; as long as those stand still, one pass has said everything.

@@ -44,6 +44,8 @@ public:
     /// Runs the updates before output until no chapter's pages move any more; how many passes it took. After
     /// `g_MostPasses` it says which chapter won't settle.
     int Update(Import::MessageList & messages);
+    /// Lets the numbers of pages, lists and notes run on through the book, in the same way until nothing moves.
+    int Renumber(Import::MessageList & messages);
     /// Writes the book, to `path` if it has no file yet. False with a message if it failed.
     bool Save(std::string const & path, Import::MessageList & messages);
     /// The same also for a book that has no unsaved work: settings reach the file without counting as such.
@@ -69,6 +71,7 @@ private:
     };
 
     [[nodiscard]] std::vector<Extent> GetExtents() const;
+    int Settle(std::function<void()> const & runPass, Import::MessageList & messages);
 
     Console & m_Console;
     Listener & m_Listener;

@@ -14,21 +14,14 @@ using Import::Text;
 namespace
 {
 
+/// The words are the same in every language, so that scripts run everywhere; those that the table shows are understood
+/// as well.
 bool ReadValue(std::string const & text, bool & value)
 {
-    for (char const * const yes : {"yes", "on", "true"}) {
-        if (yes == text) {
-            value = true;
-            return true;
-        }
-    }
-    for (char const * const no : {"no", "off", "false"}) {
-        if (no == text) {
-            value = false;
-            return true;
-        }
-    }
-    return false;
+    bool const isYes = "yes" == text || "on" == text || "true" == text || Text("yes", "Setting") == text;
+    bool const isNo = "no" == text || "off" == text || "false" == text || Text("no", "Setting") == text;
+    value = isYes || (value && !isNo);
+    return isYes || isNo;
 }
 
 template <typename TNumber>
@@ -66,7 +59,7 @@ public:
     void Switch(SettingGroup group, char const * name, std::string meaning, TPart part)
     {
         m_Rows.push_back(
-            {group, name, std::move(meaning), Text("yes|no", "Help"),
+            {group, name, std::move(meaning), "yes|no",
              [part](BookSettings const & settings) { return Json(bool(part(settings))); },
              [part](BookSettings & settings, std::string const & text) { return ReadValue(text, part(settings)); }});
     }

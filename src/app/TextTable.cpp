@@ -156,8 +156,11 @@ std::vector<std::string> TextTable::Layout(int columns, bool hasColour) const
                 continue;
             }
             int const room = 0 < columns ? std::min(widths[at], columns - used) : widths[at];
-            std::string const text = room <= 0 ? std::string() : CutToWidth(cells[at].m_Text, room);
-            int const padding = widths[at] - DisplayWidth(text);
+            if (room <= 0) {
+                break;
+            }
+            std::string const text = CutToWidth(cells[at].m_Text, room);
+            int const padding = room - DisplayWidth(text);
             pending += m_Columns[at].m_IsRightAligned ? padding : 0;
             if (!text.empty()) {
                 std::string const code = hasColour ? CodeOf(cells[at].m_Look) : "";

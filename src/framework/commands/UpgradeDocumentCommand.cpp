@@ -9,7 +9,7 @@ CommandRegistration const s_Upgrade(typeid(UpgradeDocumentCommand), "UpgradeDocu
 
 Kernel::LocalisedString UpgradeDocumentCommand::GetDescription() const
 {
-    return {"Upgrade document", "Document Command"};
+    return Kernel::LocalisedString("Upgrade document", "Document Command");
 }
 
 void UpgradeDocumentCommand::Do()

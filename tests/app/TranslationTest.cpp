@@ -1,0 +1,128 @@
+#include "ProgramTest.h"
+
+#include <cstdio>
+#include <fstream>
+#include <regex>
+#include <sys/wait.h>
+
+/// The real program in a process of its own, in an environment that each test makes: the language is chosen once, at
+/// the start.
+class TranslationTest : public ProgramTest
+{
+protected:
+    static Outcome Shell(std::string const & command)
+    {
+        Outcome outcome;
+        FILE * const pipe = popen((command + " 2>&1").c_str(), "r");
+        char buffer[4096];
+        while (std::size_t const count = fread(buffer, 1, sizeof buffer, pipe)) {
+            outcome.m_Out.append(buffer, count);
+        }
+        int const status = pclose(pipe);
+        outcome.m_Code = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+        return outcome;
+    }
+
+    Outcome Speak(std::string const & environment, std::string const & arguments) const
+    {
+        return Shell("cd '" + m_Folder.string() + "' && env -i HOME=/tmp " + environment +
+                     " '" KORVANE_BINARY_FOLDER "/src/app/korvane' " + arguments);
+    }
+
+    Outcome German(std::string const & arguments) const { return Speak("LANG=de_DE.UTF-8", arguments); }
+};
+
+TEST_F(TranslationTest, TheEnvironmentChoosesTheLanguageWhateverLocalesTheSystemHas)
+{
+    struct Case
+    {
+        char const * m_Environment;
+        bool m_IsGerman;
+    };
+    for (auto const & [environment, isGerman] : {
+             Case{"LANG=de_DE.UTF-8", true},
+             Case{"LANG=de_AT", true},
+             Case{"LC_MESSAGES=de LANG=en_GB.UTF-8", true},
+             Case{"LC_ALL=de_DE.UTF-8 LANG=C", true},
+             Case{"LANG=en_GB.UTF-8 LANGUAGE=fr:de", true},
+             Case{"LANG=C.UTF-8 LANGUAGE=de", true},
+             Case{"LC_ALL=C LANG=de_DE.UTF-8", false},
+             Case{"LANG=fr_FR.UTF-8", false},
+             Case{"LANG=xx_YY.nonsense", false},
+             Case{"LANG=", false},
+         }) {
+        auto const outcome = Speak(environment, "show gone.kvdoc");
+        EXPECT_EQ(outcome.m_Code, 1);
+        EXPECT_EQ(outcome.m_Out, isGerman ? "gone.kvdoc: Fehler: Eine solche Datei gibt es nicht.\n"
+                                          : "gone.kvdoc: error: There is no such file.\n")
+            << environment;
+    }
+}
+
+TEST_F(TranslationTest, CountsValuesAndTheTextsOfTheLibrarySpeakGermanAndMachinesHearTheSame)
+{
+    Write("one.md", "# Eins\n\nText.\n");
+    Write("two.md", "# Zwei\n\nText.\n");
+    Write("cut.kvdoc", "");
+    ASSERT_EQ(Run({"import", "@one.md", "@two.md", "-o", "@docs"}).m_Code, 0);
+    struct Case
+    {
+        char const * m_Why;
+        char const * m_Arguments;
+        std::vector<std::string> m_Says;
+    };
+    for (auto const & [why, arguments, says] : std::vector<Case>{
+             {"numbered placeholder", "new b docs/one.kvdoc", {"Kapitel 1 (one) hinzugefügt."}},
+             {"a table", "status b.kvbook", {"Nr.  Kapitel", "1 Kapitel, 2 Seiten\n", "gut"}},
+             {"the singular's own form", "key b.kvbook 9", {"Es gibt kein Kapitel 9. Das Buch hat 1 Kapitel.\n"}},
+             {"a step's name comes from the command", "add b.kvbook docs/two.kvdoc", {"Nummern aktualisieren..."}},
+             {"plural", "status b.kvbook", {"2 Kapitel, 4 Seiten\n"}},
+             {"values out of order", "export b.kvbook -o b.pdf", {"b.pdf geschrieben: 4 Seiten"}},
+             {"the plural's own form",
+              "key b.kvbook 9",
+              {"Es gibt kein Kapitel 9. Das Buch hat 2 Kapitel, gezählt ab 1."}},
+             {"help", "move --help", {"Aufruf: korvane move [OPTIONEN]", "Beispiel:", "Ans Ende des Buches"}},
+             {"a value of the user's language", "set b.kvbook --links nein", {"links", "nein"}},
+         }) {
+        auto const outcome = German(arguments);
+        for (std::string const & text : says) {
+            EXPECT_NE(outcome.m_Out.find(text), std::string::npos) << why << ": " << text << " is not in\n"
+                                                                   << outcome.m_Out;
+        }
+    }
+    EXPECT_EQ(nlohmann::json::parse(German("show b.kvbook --json").m_Out),
+              nlohmann::json::parse(Speak("LANG=C", "show b.kvbook --json").m_Out));
+    auto const json = nlohmann::json::parse(German("status b.kvbook --json").m_Out);
+    EXPECT_EQ(json["chapters"][0]["status"], "ok");
+}
+
+TEST_F(TranslationTest, EveryTextOfTheSourcesHasATranslation)
+{
+    auto const outcome = Shell(KORVANE_SOURCE_FOLDER "/scripts/translations check");
+    EXPECT_EQ(outcome.m_Code, 0) << outcome.m_Out;
+}
+
+TEST_F(TranslationTest, TextsStandWhereTheToolsFindThem)
+{
+    // xgettext reads calls: LocalisedString("text", "context"). Braces and named objects hide a text from translators.
+    std::regex const hidden(R"(LocalisedString( const)? [a-z]\w*\(|LocalisedString\(\s*[^")\s]|return \{"[^"]+", ")");
+    // What hands both on as they came.
+    std::regex const own(R"(LocalisedString\(text, context\))");
+    for (auto const & entry : std::filesystem::recursive_directory_iterator(KORVANE_SOURCE_FOLDER "/src")) {
+        // The class itself speaks of its arguments.
+        if ("LocalisedString.h" == entry.path().filename()) {
+            continue;
+        }
+        if (".cpp" != entry.path().extension() && ".h" != entry.path().extension()) {
+            continue;
+        }
+        std::ifstream stream(entry.path());
+        int number = 0;
+        for (std::string line; std::getline(stream, line);) {
+            ++number;
+            EXPECT_FALSE(std::regex_search(line, hidden) && !std::regex_search(line, own))
+                << entry.path().string() << ':' << number << ": write Kernel::LocalisedString(\"text\", \"context\"):\n"
+                << line;
+        }
+    }
+}
