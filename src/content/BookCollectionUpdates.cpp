@@ -147,9 +147,6 @@ bool BookCollection::IsAnchorPointValid(Kernel::Counted<AnchorInstance const> in
     book->GetChapters(chapters);
     String const uid = instance->GetUid();
     for (Kernel::Counted<BookChapter const> const & chapter : chapters) {
-        if (!chapter) {
-            continue;
-        }
         Snapshot<std::vector<AnchorInfo>> const anchors = chapter->GetAnchors();
         for (AnchorInfo const & info : anchors) {
             if (!(info.m_Uid == uid)) {

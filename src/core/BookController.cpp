@@ -12,6 +12,7 @@
 #include "framework/story/Index.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace Book
 {
@@ -30,7 +31,13 @@ auto Find(TList & chapters, Kernel::Counted<BookChapter const> const & chapter)
                         [&](const auto & entry) { return entry && entry == chapter; });
 }
 
-/// The first chapter that the test holds for, or null. An entry is null where the book file held something else.
+/// An entry of the list is null where the book file held something else.
+bool IsChapter(Kernel::Counted<BookChapter> const & entry)
+{
+    return static_cast<bool>(entry);
+}
+
+/// The first chapter that the test holds for, or null.
 template <typename TTest>
 Kernel::Counted<BookChapter> FindFirst(const Snapshot<BookController::ChapterList> & chapters, const TTest & test)
 {
@@ -109,7 +116,7 @@ Kernel::Counted<BookChapter const> BookController::GetPreviousChapter(Kernel::Co
 void BookController::GetChapters(ConstChapterList & chapters) const
 {
     const Snapshot<ChapterList> all = Chapters();
-    chapters.insert(chapters.end(), all.begin(), all.end());
+    std::copy_if(all.begin(), all.end(), std::back_inserter(chapters), IsChapter);
 }
 
 void BookController::GetChaptersAfter(ConstChapterList & chapters, Kernel::Counted<BookChapter const> chapter) const
@@ -117,7 +124,7 @@ void BookController::GetChaptersAfter(ConstChapterList & chapters, Kernel::Count
     const Snapshot<ChapterList> all = Chapters();
     const auto found = Find(*all, chapter);
     if (found != all.end()) {
-        chapters.insert(chapters.end(), found + 1, all.end());
+        std::copy_if(found + 1, all.end(), std::back_inserter(chapters), IsChapter);
     }
 }
 

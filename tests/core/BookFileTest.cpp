@@ -305,6 +305,9 @@ TEST_F(BookFileTest, KeepsThePlaceOfAnEntryThatIsNoChapter)
     EXPECT_EQ(book->GetMasterIndex(), nullptr);
     // And the list goes on working with the gap in it.
     EXPECT_EQ(book->GetChapterFromPath("/x/b.kvdoc"), book->GetChapterAtIndex(1));
+    BookController::ConstChapterList chapters;
+    book->GetChapters(chapters);
+    EXPECT_EQ(chapters.size(), 1u) << "who walks over all chapters meets none that is not there";
     book->SetPadStrays(true);
     DocumentSaveResult saved;
     book->SaveBook(saved);
