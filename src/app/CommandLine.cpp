@@ -28,6 +28,9 @@ void TranslateHelp(CLI::App & program)
     formatter->label("INT", Text("NUMBER", "Help"));
     program.option_defaults()->group(Text("Options", "Help"));
     program.set_help_flag("-h,--help", Text("Print this help and end", "Help"));
+    program.failure_message([](CLI::App const *, CLI::Error const & error) {
+        return std::string(error.what()) + "\n" + Text("Run with --help for more information.", "Help") + "\n";
+    });
     program.set_version_flag("--version", g_Version, Text("Print the version and end", "Help"));
 }
 
@@ -56,6 +59,7 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     AddStartPageVerb(verbs);
     AddSetVerb(verbs);
     AddSaveAsVerb(verbs);
+    AddPackageVerb(verbs);
     AddStatusVerb(verbs);
     AddLocateVerb(verbs);
     AddWatchVerb(verbs);

@@ -48,8 +48,9 @@ void AddKeyVerb(VerbList & verbs);
 void AddStartPageVerb(VerbList & verbs);
 /// Shows and changes what a book keeps for all of its chapters.
 void AddSetVerb(VerbList & verbs);
-/// Writes a book to another file.
+/// Write a book to another file, and a copy of it with its documents to a folder.
 void AddSaveAsVerb(VerbList & verbs);
+void AddPackageVerb(VerbList & verbs);
 /// Tells the state of a book's chapters.
 void AddStatusVerb(VerbList & verbs);
 /// Finds chapters again whose files have moved.

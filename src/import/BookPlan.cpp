@@ -2,6 +2,7 @@
 
 #include "import/NaturalOrder.h"
 #include "import/SourceText.h"
+#include "import/Text.h"
 
 #include <algorithm>
 
@@ -32,7 +33,8 @@ void AddFilesOfFolder(BookPlan & plan, MessageList & messages)
         }
     }
     if (error) {
-        messages.Error("unreadable", {plan.m_Folder.string()}, "The folder cannot be read: " + error.message() + ".");
+        messages.Error("unreadable", {plan.m_Folder.string()},
+                       Text("The folder cannot be read: %1.", "Source", error.message()));
     }
     std::sort(names.begin(), names.end(),
               [](std::string const & a, std::string const & b) { return ComesBefore(a, b); });
@@ -67,16 +69,20 @@ bool AddChapter(BookPlan & plan, std::string const & name, Place const & place, 
     auto const known = std::find_if(plan.m_Chapters.begin(), plan.m_Chapters.end(),
                                     [&](PlannedChapter const & chapter) { return chapter.m_Path == path; });
     if (known != plan.m_Chapters.end()) {
-        std::string where = known->m_Place.m_Line ? " (line " + std::to_string(known->m_Place.m_Line) + ")" : "";
-        messages.Warn("chapter-twice", place,
-                      "The chapter " + shown + " is listed twice" + where + "; it is set once, in the first place.");
+        messages.Warn(
+            "chapter-twice", place,
+            known->m_Place.m_Line
+                ? Text("The chapter %1 is listed twice (line %2); it is set once, in the first place.", "Source", shown,
+                       known->m_Place.m_Line)
+                : Text("The chapter %1 is listed twice; it is set once, in the first place.", "Source", shown));
         return false;
     }
     std::error_code error;
     if (!fs::exists(path, error)) {
-        messages.Error("chapter-missing", place,
-                       "The chapter " + shown + " is listed but there is no such file" +
-                           (error ? ": " + error.message() : std::string()) + ".");
+        messages.Error(
+            "chapter-missing", place,
+            error ? Text("The chapter %1 is listed but there is no such file: %2.", "Source", shown, error.message())
+                  : Text("The chapter %1 is listed but there is no such file.", "Source", shown));
         return false;
     }
     plan.m_Chapters.push_back({path, shown.empty() ? name : shown, "", "", "", place});
@@ -91,8 +97,8 @@ std::optional<BookPlan> ReadBookPlan(fs::path const & folder, MessageList & mess
     if (!fs::is_directory(plan.m_Folder, error)) {
         messages.Error("no-folder", {folder.string()},
                        fs::exists(plan.m_Folder, error)
-                           ? "This is not a folder; give the folder that holds the chapters."
-                           : "There is no such folder.");
+                           ? Text("This is not a folder; give the folder that holds the chapters.", "Source")
+                           : Text("There is no such folder.", "Source"));
         return std::nullopt;
     }
 
@@ -117,10 +123,12 @@ std::optional<BookPlan> ReadBookPlan(fs::path const & folder, MessageList & mess
 
     if (plan.m_Chapters.empty()) {
         if (!messages.HasErrors()) {
-            messages.Error("no-chapters", {folder.string()},
-                           plan.m_Source.empty()
-                               ? "The folder holds no book.toml, no SUMMARY.md and no Markdown file (*.md, *.markdown)."
-                               : "The " + plan.m_Source + " lists no chapter.");
+            messages.Error(
+                "no-chapters", {folder.string()},
+                plan.m_Source.empty()
+                    ? Text("The folder holds no book.toml, no SUMMARY.md and no Markdown file (*.md, *.markdown).",
+                           "Source")
+                    : Text("The %1 lists no chapter.", "Source", plan.m_Source));
         }
         return std::nullopt;
     }

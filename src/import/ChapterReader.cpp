@@ -3,6 +3,7 @@
 #include "import/AttributeReader.h"
 #include "import/FrontMatterReader.h"
 #include "import/SourceText.h"
+#include "import/Text.h"
 
 #include <algorithm>
 
@@ -283,11 +284,12 @@ bool ChapterReader::ReadFence(int line)
                 {"toc", "Table of contents"}, {"index", "Index"}, {"endnotes", "Collated notes"}};
             if (auto const known = later.find(name); known != later.end()) {
                 Warn("later-block", place,
-                     "A \"" + name + "\" block cannot be generated yet; a marked box stands in its place.");
+                     Text("A \"%1\" block cannot be generated yet; a marked box stands in its place.", "Source", name));
                 boxes.push_back(known->second);
             } else if (!content.empty()) {
                 Warn("class-unknown", place,
-                     "The block \"" + content + "\" has no look of its own; its content is set as it stands.");
+                     Text("The block \"%1\" has no look of its own; its content is set as it stands.", "Source",
+                          content));
             }
             edits.push_back({static_cast<std::uint32_t>(start),
                              static_cast<std::uint32_t>(std::min(end + 1, text.size()) - start),
@@ -429,11 +431,10 @@ void ChapterReader::ReportUnusedNotes()
         auto const [known, isNew] = defined.emplace(label, line + m_LineOffset);
         if (!isNew) {
             Warn("note-twice", line,
-                 "The note [^" + std::string(label) + "] is defined again (first in line " +
-                     std::to_string(known->second) + "); the first one is set.");
+                 Text("The note [^%1] is defined again (first in line %2); the first one is set.", "Source", label,
+                      known->second));
         } else if (!m_NoteLines.contains(line)) {
-            Warn("note-unused", line,
-                 "The note [^" + std::string(label) + "] has no mark in the text and is left out.");
+            Warn("note-unused", line, Text("The note [^%1] has no mark in the text and is left out.", "Source", label));
         }
     }
 }

@@ -2,6 +2,7 @@
 #include "import/ChapterReader.h"
 #include "import/HtmlTokens.h"
 #include "import/SourceText.h"
+#include "import/Text.h"
 
 #include <algorithm>
 
@@ -94,7 +95,8 @@ void ChapterReader::ReadTag(HtmlToken const & token, int line)
         ReadImageTag(token, line);
     } else if (token.m_IsSelfClosing) {
         if ("a" != token.m_Name && "span" != token.m_Name) {
-            Warn("html-unknown", line, "The tag <" + token.m_Name + "/> has no meaning in print and is left out.");
+            Warn("html-unknown", line,
+                 Text("The tag <%1/> has no meaning in print and is left out.", "Source", token.m_Name));
         }
     } else {
         OpenTag tag{token.m_Name, MarkOfTag(token.m_Name), Builder().GetLink(), line, false};
@@ -118,7 +120,7 @@ void ChapterReader::ReadTag(HtmlToken const & token, int line)
         } else if (Mark::None == tag.m_Marks && "a" != token.m_Name && "abbr" != token.m_Name &&
                    "time" != token.m_Name) {
             Warn("html-unknown", line,
-                 "The tag <" + token.m_Name + "> has no meaning in print; its text is set as it stands.");
+                 Text("The tag <%1> has no meaning in print; its text is set as it stands.", "Source", token.m_Name));
         }
         EnterMark(tag.m_Marks, true);
         m_Tags.push_back(std::move(tag));
@@ -148,7 +150,7 @@ void ChapterReader::CloseAllTags()
         OpenTag const & tag = m_Tags.back();
         if (Mark::None != tag.m_Marks || tag.m_IsLink) {
             Warn("html-open", tag.m_Line,
-                 "The tag <" + tag.m_Name + "> is not closed in its paragraph; it ends there.");
+                 Text("The tag <%1> is not closed in its paragraph; it ends there.", "Source", tag.m_Name));
         }
         CloseTag(std::string(tag.m_Name));
     }
@@ -158,7 +160,7 @@ void ChapterReader::ReadImageTag(HtmlToken const & token, int line)
 {
     std::string const & source = token.Value("src");
     if (source.empty()) {
-        Warn("picture-missing", line, "A picture names no file (src) and is left out.");
+        Warn("picture-missing", line, Text("A picture names no file (src) and is left out.", "Source"));
         return;
     }
     Picture picture;
@@ -169,7 +171,7 @@ void ChapterReader::ReadImageTag(HtmlToken const & token, int line)
     std::string const & width = token.Value("width");
     if (!width.empty() && !ReadWidth(width, picture.m_WidthShare, picture.m_Width)) {
         Warn("picture-width", line,
-             "The width \"" + width + "\" is not a length or a percentage; the picture keeps its size.");
+             Text("The width \"%1\" is not a length or a percentage; the picture keeps its size.", "Source", width));
     }
     m_Chapter.m_Pictures.push_back(std::move(picture));
     m_PictureCaptions.emplace_back();
@@ -280,7 +282,7 @@ bool ChapterReader::ReadBlockTag(HtmlToken const & token, int line)
         }
         if (isStructure && ("table" == name || "ul" == name || "ol" == name || "dl" == name)) {
             Warn("html-structure", line,
-                 "A raw <" + name + "> is set as plain paragraphs; write it in Markdown to keep its form.");
+                 Text("A raw <%1> is set as plain paragraphs; write it in Markdown to keep its form.", "Source", name));
         }
     }
     return true;
@@ -301,7 +303,7 @@ void ChapterReader::ReadHtmlBlock(cmark_node * node)
             skipped = isOpen ? std::string_view(token.m_Name) : std::string_view();
             if (isOpen) {
                 Warn("html-unknown", line,
-                     "A <" + token.m_Name + "> has no meaning in print and is left out with its content.");
+                     Text("A <%1> has no meaning in print and is left out with its content.", "Source", token.m_Name));
             }
         } else if (!skipped.empty() || HtmlToken::Kind::Comment == token.m_Kind) {
             continue;

@@ -1,6 +1,7 @@
 #include "import/AttributeReader.h"
 #include "import/ChapterReader.h"
 #include "import/SourceText.h"
+#include "import/Text.h"
 
 #include <algorithm>
 
@@ -138,7 +139,8 @@ void ChapterReader::AppendText(std::string_view text, bool isVerbatim)
         std::erase_if(wide, isControl);
         if (!std::exchange(m_HasReportedControls, true)) {
             Warn("control-character", Builder().LineAt(Builder().Position()),
-                 "Control characters in the text cannot be printed and are left out, here and later in the file.");
+                 Text("Control characters in the text cannot be printed and are left out, here and later in the file.",
+                      "Source"));
         }
     }
     std::replace(wide.begin(), wide.end(), u'\t', u' ');
@@ -164,7 +166,8 @@ void ChapterReader::EnterLink(cmark_node * node, bool isEnter)
         link.m_IsEmpty = true;
         m_Messages.Warn(
             "later-reference", {m_Options.m_ShownName, link.m_Line},
-            "A reference without a text of its own cannot be filled in yet; its target is set in its place.");
+            Text("A reference without a text of its own cannot be filled in yet; its target is set in its place.",
+                 "Source"));
         Builder().Append(ToUtf16(link.m_Target), true);
     }
     m_Spots.push_back({start, Builder().Position(), index, -1});
@@ -220,7 +223,7 @@ void ChapterReader::AddAnchorAt(std::uint32_t position, std::string const & id, 
 {
     if (!m_Slugs.Take(id)) {
         Warn("anchor-twice", line,
-             "The anchor #" + id + " exists already in this chapter; links lead to the first one.");
+             Text("The anchor #%1 exists already in this chapter; links lead to the first one.", "Source", id));
         return;
     }
     m_Chapter.m_Anchors.push_back({id, line + m_LineOffset});
@@ -252,7 +255,7 @@ void ChapterReader::ApplyToLink(AttributeSpot const & spot, Attributes const & a
     for (std::string_view const name : g_ReferenceClasses) {
         if (attributes.HasClass(name)) {
             Warn("later-reference", line,
-                 "References by ." + std::string(name) + " cannot be filled in yet; the link's own text is set.");
+                 Text("References by .%1 cannot be filled in yet; the link's own text is set.", "Source", name));
         }
     }
     Attributes rest = attributes;
@@ -267,8 +270,9 @@ void ChapterReader::ApplyToPicture(std::uint32_t index, Attributes const & attri
     Picture & picture = m_Chapter.m_Pictures[index];
     for (auto const & [key, value] : attributes.m_Values) {
         if ("width" == key && !ReadWidth(value, picture.m_WidthShare, picture.m_Width)) {
-            Warn("picture-width", line,
-                 "The width \"" + value + "\" is not a length or a percentage; the picture keeps its size.");
+            Warn(
+                "picture-width", line,
+                Text("The width \"%1\" is not a length or a percentage; the picture keeps its size.", "Source", value));
         }
     }
 }
@@ -285,7 +289,7 @@ void ChapterReader::AddIndexMark(std::uint32_t start, std::u16string_view text, 
     }
     mark.m_Line = line + m_LineOffset;
     if (mark.m_Topic.empty() || mark.m_Topic.front().empty()) {
-        Warn("index-empty", line, "The index mark names no topic and is left out.");
+        Warn("index-empty", line, Text("The index mark names no topic and is left out.", "Source"));
         return;
     }
     m_Chapter.m_IndexMarks.push_back(std::move(mark));
@@ -303,10 +307,11 @@ void ChapterReader::ApplyToSpan(std::uint32_t start, std::uint32_t end, Attribut
         } else if ("index" == name) {
             AddIndexMark(start, std::u16string_view(Builder().Text()).substr(start, end - start), attributes, line);
         } else if (std::find(g_NoteClasses.begin(), g_NoteClasses.end(), name) != g_NoteClasses.end()) {
-            Warn("later-notes", line, "Notes are set at the end of the chapter; ." + name + " has no effect yet.");
+            Warn("later-notes", line,
+                 Text("Notes are set at the end of the chapter; .%1 has no effect yet.", "Source", name));
         } else {
             Warn("class-unknown", line,
-                 "The class ." + name + " has no look of its own; the text is set as it stands.");
+                 Text("The class .%1 has no look of its own; the text is set as it stands.", "Source", name));
         }
     }
 }
@@ -376,8 +381,8 @@ void ChapterReader::ReportDirectives(std::string_view text, int line)
         std::string_view const directive = text.substr(at, text.find("}}", at) - at + 2);
         auto const lines = std::count(text.begin(), text.begin() + static_cast<std::ptrdiff_t>(at), '\n');
         Warn("directive", line + static_cast<int>(lines),
-             "The directive " + std::string(directive.substr(0, directive.find('\n'))) +
-                 " is not carried out; it is set as written.");
+             Text("The directive %1 is not carried out; it is set as written.", "Source",
+                  directive.substr(0, directive.find('\n'))));
     }
 }
 
@@ -391,7 +396,7 @@ void ChapterReader::ReportLeftovers()
             continue;
         }
         Warn("note-missing", Builder().LineAt(at),
-             "The mark " + ToUtf8(text.substr(at, end - at + 1)) + " has no note; it is set as written.");
+             Text("The mark %1 has no note; it is set as written.", "Source", ToUtf8(text.substr(at, end - at + 1))));
     }
     if (std::u16string::npos != text.find(u"{{#")) {
         for (std::size_t at = text.find(u"{{#"); std::u16string::npos != at; at = text.find(u"{{#", at + 3)) {

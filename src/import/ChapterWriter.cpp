@@ -11,6 +11,7 @@
 #include "import/SaveFailure.h"
 #include "import/SourceText.h"
 #include "import/StoryWriter.h"
+#include "import/Text.h"
 
 namespace Import
 {
@@ -36,13 +37,13 @@ Kernel::Counted<DocumentController> OpenOrMake(fs::path const & path, std::strin
     }
     if (2 <= failure.GetResult() && failure.GetResult() <= 10) {
         messages.Error("document-locked", {shownName},
-                       "The document " + path.filename().string() +
-                           " of the work folder cannot be changed: " + failure.GetReason().ToStd());
+                       Text("The document %1 of the work folder cannot be changed: %2", "Source",
+                            path.filename().string(), failure.GetReason()));
         return nullptr;
     }
     messages.Warn("document-damaged", {shownName},
-                  "The document " + path.filename().string() +
-                      " of the work folder could not be used and is made anew: " + failure.GetReason().ToStd());
+                  Text("The document %1 of the work folder could not be used and is made anew: %2", "Source",
+                       path.filename().string(), failure.GetReason()));
     return Kernel::MakeCounted<DocumentController>();
 }
 

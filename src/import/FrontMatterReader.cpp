@@ -1,5 +1,7 @@
 #include "import/FrontMatterReader.h"
 
+#include "import/Text.h"
+
 namespace Import
 {
 
@@ -127,7 +129,7 @@ FrontMatter ReadFrontMatter(std::string_view text, std::string const & shownName
             std::size_t const colon = line.find(':');
             if (std::string_view::npos == colon) {
                 messages.Warn("front-matter", {shownName, number, 1},
-                              "This line of the front matter has no \"key: value\".");
+                              Text("This line of the front matter has no \"key: value\".", "Source"));
                 continue;
             }
             key = Trimmed(line.substr(0, colon));
@@ -143,8 +145,8 @@ FrontMatter ReadFrontMatter(std::string_view text, std::string const & shownName
         }
         if (!isGood) {
             messages.Warn("front-matter", {shownName, number, 1},
-                          "The value of \"" + key +
-                              "\" is not closed by its quotation mark or bracket; it is ignored.");
+                          Text("The value of \"%1\" is not closed by its quotation mark or bracket; it is ignored.",
+                               "Source", key));
         } else if ("title" == key) {
             result.m_Title = values.front();
         } else if ("lang" == key) {

@@ -3,6 +3,7 @@
 #include "import/LinkTarget.h"
 #include "import/MarkdownReader.h"
 #include "import/SourceText.h"
+#include "import/Text.h"
 
 #include <algorithm>
 #include <set>
@@ -201,13 +202,13 @@ void Importer::CheckLinks(std::vector<Job> & jobs, MessageList & messages) const
             Place const place{name, link.m_Line};
             if (LinkTarget::Kind::Unknown == target.m_Kind) {
                 messages.Warn("link-file", place,
-                              "The link to " + link.m_Target +
-                                  " leads to no chapter of the book; its text is set without a link.");
+                              Text("The link to %1 leads to no chapter of the book; its text is set without a link.",
+                                   "Source", link.m_Target));
             } else if (LinkTarget::Kind::Chapter == target.m_Kind && !target.m_Id.empty() &&
                        !anchors[target.m_Chapter].contains(target.m_Id)) {
                 messages.Warn("link-anchor", place,
-                              "The link to " + link.m_Target + " leads nowhere: " + target.m_Chapter +
-                                  " has no anchor #" + target.m_Id + ".");
+                              Text("The link to %1 leads nowhere: %2 has no anchor #%3.", "Source", link.m_Target,
+                                   target.m_Chapter, target.m_Id));
             }
         }
     }
@@ -258,7 +259,8 @@ bool Importer::Run(std::vector<ImportedChapter> & chapters, MessageList & messag
     std::error_code error;
     fs::create_directories(m_Work, error);
     if (error || !fs::is_directory(m_Work, error)) {
-        messages.Error("work-folder", {m_Work.string()}, "The work folder cannot be made: " + error.message() + ".");
+        messages.Error("work-folder", {m_Work.string()},
+                       Text("The work folder cannot be made: %1.", "Source", error.message()));
         return false;
     }
 
@@ -307,7 +309,8 @@ bool Importer::Run(std::vector<ImportedChapter> & chapters, MessageList & messag
     }
     std::string problem;
     if (!m_State.Save(m_Work, problem)) {
-        messages.Error("work-folder", {m_Work.string()}, "The work folder cannot be written: " + problem + ".");
+        messages.Error("work-folder", {m_Work.string()},
+                       Text("The work folder cannot be written: %1.", "Source", problem));
         return false;
     }
     return isWhole;

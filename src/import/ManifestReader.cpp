@@ -1,4 +1,5 @@
 #include "import/BookPlan.h"
+#include "import/Text.h"
 #include "import/TomlReader.h"
 
 #include <algorithm>
@@ -62,7 +63,7 @@ bool ReadManifestText(std::string const & text, std::string const & shownName, B
             }
             options.ReportUnknown();
         } else {
-            reader.Refuse(*node, "output", "a table, written [output]");
+            reader.Refuse(*node, "output", Text("a table, written [%1]", "Source", "output"));
         }
     }
     if (auto const * node = reader.Find("book")) {
@@ -72,13 +73,13 @@ bool ReadManifestText(std::string const & text, std::string const & shownName, B
                 reader.Find(ignored);
             }
         } else {
-            reader.Refuse(*node, "book", "a table, written [book]");
+            reader.Refuse(*node, "book", Text("a table, written [%1]", "Source", "book"));
         }
     }
     if (auto const * node = reader.Find("chapters")) {
         reader.ForEachText(*node, "chapters", [&](std::string const & name, Place const & place) {
             if (name.empty()) {
-                messages.Error("toml-value", place, "A chapter's file name is empty.");
+                messages.Error("toml-value", place, Text("A chapter's file name is empty.", "Source"));
             } else {
                 AddChapter(plan, name, place, messages);
             }

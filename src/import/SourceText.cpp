@@ -1,5 +1,7 @@
 #include "import/SourceText.h"
 
+#include "import/Text.h"
+
 #include <cerrno>
 #include <cstring>
 #include <fstream>
@@ -88,7 +90,7 @@ std::optional<std::string> DecodeSourceText(std::string bytes, std::string const
     } else if (view.starts_with("\xFF\xFE") || view.starts_with("\xFE\xFF")) {
         bool const bigEndian = view.starts_with("\xFE\xFF");
         messages.Note("encoding", {shownName},
-                      "The file is in UTF-16 and was converted; save it as UTF-8 to avoid doubts.");
+                      Text("The file is in UTF-16 and was converted; save it as UTF-8 to avoid doubts.", "Source"));
         bytes = FromUtf16(view.substr(2), bigEndian);
     }
 
@@ -100,13 +102,14 @@ std::optional<std::string> DecodeSourceText(std::string bytes, std::string const
     if (0 == bytes[bad]) {
         bool const wide = 1 < bytes.size() && (0 == bytes[0] || 0 == bytes[1]);
         messages.Error("encoding", place,
-                       wide ? "The file looks like UTF-16 without a byte order mark; save it as UTF-8."
-                            : "The file holds a zero byte, so it is not text; save it as UTF-8.");
+                       wide ? Text("The file looks like UTF-16 without a byte order mark; save it as UTF-8.", "Source")
+                            : Text("The file holds a zero byte, so it is not text; save it as UTF-8.", "Source"));
     } else {
         char hex[8];
         std::snprintf(hex, sizeof hex, "0x%02X", static_cast<unsigned char>(bytes[bad]));
-        messages.Error("encoding", place,
-                       std::string("The byte ") + hex + " is not valid UTF-8 here; save the file as UTF-8.");
+        messages.Error(
+            "encoding", place,
+            Text("The byte %1 is not valid UTF-8 here; save the file as UTF-8.", "Source", std::string(hex)));
     }
     return std::nullopt;
 }
@@ -116,12 +119,13 @@ std::optional<std::string> ReadSourceText(std::filesystem::path const & path, st
 {
     std::error_code error;
     if (std::filesystem::is_directory(path, error)) {
-        messages.Error("unreadable", {shownName}, "This is a folder, not a text file.");
+        messages.Error("unreadable", {shownName}, Text("This is a folder, not a text file.", "Source"));
         return std::nullopt;
     }
     auto const size = std::filesystem::file_size(path, error);
     if (!error && g_LargestSource < size) {
-        messages.Error("unreadable", {shownName}, "The file is larger than 64 MB, which no chapter can be; split it.");
+        messages.Error("unreadable", {shownName},
+                       Text("The file is larger than 64 MB, which no chapter can be; split it.", "Source"));
         return std::nullopt;
     }
     errno = 0;
@@ -138,7 +142,7 @@ std::optional<std::string> ReadSourceText(std::filesystem::path const & path, st
     }
     if (!stream.is_open() || stream.bad()) {
         messages.Error("unreadable", {shownName},
-                       std::string("The file cannot be read: ") + std::strerror(errno ? errno : EIO) + ".");
+                       Text("The file cannot be read: %1.", "Source", std::strerror(errno ? errno : EIO)));
         return std::nullopt;
     }
     return DecodeSourceText(std::move(bytes), shownName, messages);

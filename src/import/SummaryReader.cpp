@@ -1,5 +1,6 @@
 #include "import/BookPlan.h"
 #include "import/MarkdownTree.h"
+#include "import/Text.h"
 
 namespace Import
 {
@@ -47,7 +48,8 @@ public:
         }
         cmark_iter_free(iterator);
         if (!m_Part.empty()) {
-            m_Messages.Warn("empty-part", m_PartPlace, "The part \"" + m_Part + "\" has no chapter and is left out.");
+            m_Messages.Warn("empty-part", m_PartPlace,
+                            Text("The part \"%1\" has no chapter and is left out.", "Source", m_Part));
         }
     }
 
@@ -93,17 +95,18 @@ private:
         std::string const title = PlainText(node);
         std::string target = DecodePercent(cmark_node_get_url(node));
         if (target.empty()) {
-            m_Messages.Note("draft-chapter", place, "\"" + title + "\" has no file yet and is left out.");
+            m_Messages.Note("draft-chapter", place, Text("\"%1\" has no file yet and is left out.", "Source", title));
             return;
         }
         if (std::string::npos != target.find("://")) {
             m_Messages.Warn("chapter-remote", place,
-                            "\"" + target + "\" is not a file of this folder and is left out.");
+                            Text("\"%1\" is not a file of this folder and is left out.", "Source", target));
             return;
         }
         if (std::size_t const hash = target.find('#'); std::string::npos != hash) {
-            m_Messages.Warn("chapter-anchor", place,
-                            "A chapter is a whole file; the part \"" + target.substr(hash) + "\" is ignored.");
+            m_Messages.Warn(
+                "chapter-anchor", place,
+                Text("A chapter is a whole file; the part \"%1\" is ignored.", "Source", target.substr(hash)));
             target.resize(hash);
         }
         if (target.empty() || !AddChapter(m_Plan, target, place, m_Messages)) {

@@ -1,5 +1,7 @@
 #include "import/Template.h"
 
+#include "import/Text.h"
+
 #include <algorithm>
 
 namespace Import
@@ -49,7 +51,7 @@ std::optional<fs::path> FindTemplate(std::string const & name, fs::path const & 
         if (fs::is_regular_file(path, error)) {
             return path;
         }
-        messages.Error("template-missing", {name}, "There is no such template file.");
+        messages.Error("template-missing", {name}, Text("There is no such template file.", "Source"));
         return std::nullopt;
     }
     std::vector<fs::path> folders = TemplateFolders();
@@ -63,9 +65,9 @@ std::optional<fs::path> FindTemplate(std::string const & name, fs::path const & 
     for (std::string const & candidate : ListTemplates()) {
         known += (known.empty() ? "" : ", ") + candidate;
     }
-    messages.Error("template-missing", {},
-                   "There is no template \"" + name + "\". Known are: " + known +
-                       "; or give the path of a .toml file.");
+    messages.Error(
+        "template-missing", {},
+        Text("There is no template \"%1\". Known are: %2; or give the path of a .toml file.", "Source", name, known));
     return std::nullopt;
 }
 

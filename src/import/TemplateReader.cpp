@@ -2,6 +2,7 @@
 
 #include "import/SourceText.h"
 #include "import/StyleReader.h"
+#include "import/Text.h"
 
 #include <algorithm>
 #include <array>
@@ -120,8 +121,9 @@ private:
                 m_Colours.emplace(key.str(), *colour);
                 m_Result.m_Settings.m_Swatches.push_back({String(key.str()), ToRaster(*colour)});
             } else {
-                reader.Refuse(node, key.str(),
-                              "a colour such as \"#8a1c1c\", \"grey(0.4)\" or \"cmyk(0, 0.9, 0.8, 0.2)\"");
+                reader.Refuse(
+                    node, key.str(),
+                    Text("a colour such as \"#8a1c1c\", \"grey(0.4)\" or \"cmyk(0, 0.9, 0.8, 0.2)\"", "Source"));
             }
         }
     }
@@ -150,8 +152,10 @@ private:
                 return;
             }
         }
-        reader.Refuse(*node, "size",
-                      "\"A4\", \"A5\", \"A6\", \"B5\", \"letter\", \"halfletter\" or two lengths of at least an inch");
+        reader.Refuse(
+            *node, "size",
+            Text("\"A4\", \"A5\", \"A6\", \"B5\", \"letter\", \"halfletter\" or two lengths of at least an inch",
+                 "Source"));
     }
 
     void ReadPage()
@@ -192,7 +196,8 @@ private:
         m_Result.m_Measure = setup.m_PageSize.width - m_Margins.m_Inside - m_Margins.m_Outside;
         double const height = setup.m_PageSize.height - m_Margins.m_Top - m_Margins.m_Bottom;
         if (m_Result.m_Measure < 36 || height < 72) {
-            m_Messages.Error("toml-value", reader.PlaceOf(*table), "The margins leave no room for text on the page.");
+            m_Messages.Error("toml-value", reader.PlaceOf(*table),
+                             Text("The margins leave no room for text on the page.", "Source"));
         }
     }
 
@@ -235,7 +240,7 @@ private:
                 style.m_BasedOn = String(base);
                 if (!list->contains(base)) {
                     reader.Refuse(*reader.Find("based-on"), "based-on",
-                                  "the name of another style under [" + kind + "]");
+                                  Text("the name of another style under [%1]", "Source", kind));
                 }
             }
             ReadStyleAttributes(reader, m_Colours, style.m_GlyphAtts, hasParagraph ? &style.m_ParagraphAtts : nullptr);
@@ -257,7 +262,7 @@ private:
                     ReadMaster(*table, std::string(key.str()), master);
                 } else {
                     m_Messages.Error("toml-value", m_Reader.PlaceOf(node),
-                                     "\"master." + std::string(key.str()) + "\" has to be a table.");
+                                     Text("\"%1\" has to be a table.", "Source", "master." + std::string(key.str())));
                 }
             }
         }
@@ -335,7 +340,7 @@ private:
             reader.Text("colour", name);
             auto const colour = ReadColour(name, m_Colours);
             if (!colour) {
-                reader.Refuse(*reader.Find("colour"), "colour", "a colour, or a name from [colours]");
+                reader.Refuse(*reader.Find("colour"), "colour", Text("a colour, or a name from [colours]", "Source"));
             }
             shape.m_Fill = ToRaster(colour.value_or(Story::Colour{}));
         } else {
@@ -346,8 +351,8 @@ private:
             reader.Choice("align", {"left", "centre", "right", "outside", "inside"}, alignment);
             if (!reader.Text("text", pattern) || !SplitFields(pattern, text.m_Parts)) {
                 m_Messages.Error("toml-value", reader.PlaceOf(table),
-                                 "\"" + prefix +
-                                     "text\" has to be a text in which {book}, {chapter} and {page} stand for those.");
+                                 Text("\"%1\" has to be a text in which {book}, {chapter} and {page} stand for those.",
+                                      "Source", prefix + "text"));
             }
         }
         reader.ReportUnknown();

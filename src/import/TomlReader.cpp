@@ -1,5 +1,7 @@
 #include "import/TomlReader.h"
 
+#include "import/Text.h"
+
 #include <algorithm>
 #include <charconv>
 
@@ -57,7 +59,7 @@ Place TomlReader::PlaceOf(toml::node const & node) const
 void TomlReader::Refuse(toml::node const & node, std::string_view key, std::string_view wanted)
 {
     m_Messages.Error("toml-value", PlaceOf(node),
-                     "\"" + m_Prefix + std::string(key) + "\" has to be " + std::string(wanted) + ".");
+                     Import::Text("\"%1\" has to be %2.", "Source", m_Prefix + std::string(key), wanted));
 }
 
 void TomlReader::ReportUnknown()
@@ -67,7 +69,8 @@ void TomlReader::ReportUnknown()
             Place const place{m_File, static_cast<int>(key.source().begin.line),
                               static_cast<int>(key.source().begin.column)};
             m_Messages.Warn("toml-key", place,
-                            "The key \"" + m_Prefix + std::string(key.str()) + "\" is not known and has no effect.");
+                            Import::Text("The key \"%1\" is not known and has no effect.", "Source",
+                                         m_Prefix + std::string(key.str())));
         }
     }
 }
@@ -76,7 +79,7 @@ bool TomlReader::Text(std::string_view key, std::string & value)
 {
     auto const * node = Find(key);
     if (node && !node->is_string()) {
-        Refuse(*node, key, "a text in quotes");
+        Refuse(*node, key, Import::Text("a text in quotes", "Source"));
         return false;
     }
     if (node) {
@@ -89,7 +92,7 @@ bool TomlReader::Switch(std::string_view key, bool & value)
 {
     auto const * node = Find(key);
     if (node && !node->is_boolean()) {
-        Refuse(*node, key, "true or false");
+        Refuse(*node, key, Import::Text("true or false", "Source"));
         return false;
     }
     if (node) {
@@ -106,7 +109,7 @@ bool TomlReader::Integer(std::string_view key, int & value, int least, int most)
     }
     auto const * number = node->as_integer();
     if (!number || number->get() < least || most < number->get()) {
-        Refuse(*node, key, "a whole number from " + std::to_string(least) + " to " + std::to_string(most));
+        Refuse(*node, key, Import::Text("a whole number from %1 to %2", "Source", least, most));
         return false;
     }
     value = static_cast<int>(number->get());
@@ -118,7 +121,7 @@ bool TomlReader::Number(std::string_view key, double & value)
     auto const * node = Find(key);
     auto const number = node ? node->value<double>() : std::optional<double>();
     if (node && (!number || !(std::abs(*number) < 100000))) {
-        Refuse(*node, key, "a number");
+        Refuse(*node, key, Import::Text("a number", "Source"));
         return false;
     }
     value = number.value_or(value);
@@ -137,7 +140,7 @@ bool TomlReader::Length(std::string_view key, double & value)
         return true;
     }
     if (!node->is_string() || !ReadLength(node->as_string()->get(), value)) {
-        Refuse(*node, key, "a length such as \"12pt\" or \"5mm\"");
+        Refuse(*node, key, Import::Text("a length such as \"12pt\" or \"5mm\"", "Source"));
         return false;
     }
     return true;
@@ -170,7 +173,7 @@ bool TomlReader::Choice(std::string_view key, std::vector<std::string_view> cons
         for (std::string_view const candidate : words) {
             list += (list.empty() ? "\"" : ", \"") + std::string(candidate) + "\"";
         }
-        Refuse(*node, key, "one of " + list);
+        Refuse(*node, key, Import::Text("one of %1", "Source", list));
         return false;
     }
     index = static_cast<int>(word - words.begin());
@@ -181,7 +184,7 @@ toml::table const * TomlReader::Table(std::string_view key)
 {
     auto const * node = Find(key);
     if (node && !node->is_table()) {
-        Refuse(*node, key, "a table, written [" + m_Prefix + std::string(key) + "]");
+        Refuse(*node, key, Import::Text("a table, written [%1]", "Source", m_Prefix + std::string(key)));
         return nullptr;
     }
     return node ? node->as_table() : nullptr;
@@ -192,14 +195,14 @@ void TomlReader::ForEachText(toml::node const & node, std::string_view key,
 {
     auto const * list = node.as_array();
     if (!list) {
-        Refuse(node, key, "a list of texts");
+        Refuse(node, key, Import::Text("a list of texts", "Source"));
         return;
     }
     for (toml::node const & element : *list) {
         if (auto const * text = element.as_string()) {
             use(text->get(), PlaceOf(element));
         } else {
-            Refuse(element, key, "a list of texts");
+            Refuse(element, key, Import::Text("a list of texts", "Source"));
         }
     }
 }

@@ -216,6 +216,40 @@ TEST_F(BookVerbsTest, SaveAsLeavesTheOldBookAlone)
     EXPECT_FALSE(Exists("other.kvbook.lock"));
 }
 
+TEST_F(BookVerbsTest, APackageIsWholeOrNotThere)
+{
+    std::string const before = Read("book.kvbook");
+    fs::create_directories(m_Folder / "empty");
+    for (std::string const target : {"@package", "@empty", "@slash/"}) {
+        auto const outcome = Run({"package", "@book.kvbook", target});
+        ASSERT_EQ(outcome.m_Code, 0) << outcome.m_Err;
+    }
+    EXPECT_TRUE(Read("book.kvbook") == before);
+
+    // On another machine the old documents are not there.
+    fs::create_directories(m_Folder / "moved");
+    fs::rename(m_Folder / "package", m_Folder / "moved/package");
+    fs::rename(m_Folder / "docs", m_Folder / "elsewhere");
+    EXPECT_EQ(Chapters("@moved/package/book.kvbook"), "*a@1 b c");
+    auto const status = RunJson({"status", "@moved/package/book.kvbook"});
+    for (auto const & chapter : status["chapters"]) {
+        EXPECT_EQ(chapter["status"], "ok") << chapter.dump();
+        EXPECT_TRUE(chapter["path"].get<std::string>().starts_with((m_Folder / "moved/package").string()));
+    }
+
+    auto const full = Run({"package", "@book.kvbook", "@moved"});
+    EXPECT_EQ(full.m_Code, 1);
+    auto const missing = Run({"package", "@book.kvbook", "@incomplete", "--no-locate"});
+    EXPECT_EQ(missing.m_Code, 1) << "chapters are missing";
+    auto const nowhere = Run({"package", "@moved/package/book.kvbook", "@nowhere/package"});
+    EXPECT_EQ(nowhere.m_Code, 1);
+    EXPECT_NE(nowhere.m_Err.find("cannot be made"), std::string::npos) << nowhere.m_Err;
+    for (auto const & entry : fs::directory_iterator(m_Folder)) {
+        std::string const name = entry.path().filename().string();
+        EXPECT_FALSE(name.starts_with("incomplete") || name.ends_with(".partial")) << name;
+    }
+}
+
 TEST_F(BookVerbsTest, ABookThatAnotherProgramHasIsLeftToIt)
 {
     App::BookFileLock lock;
@@ -230,6 +264,37 @@ TEST_F(BookVerbsTest, ABookThatAnotherProgramHasIsLeftToIt)
         EXPECT_NE(outcome.m_Err.find("process " + std::to_string(getpid())), std::string::npos) << outcome.m_Err;
     }
     EXPECT_TRUE(Read("book.kvbook") == before);
+}
+
+TEST_F(BookVerbsTest, InterruptingLeavesTheOldBookOrTheNewOne)
+{
+    for (int patience = 1; patience <= 16; patience += 3) {
+        SCOPED_TRACE(patience);
+        fs::remove(m_Folder / "copy.kvbook");
+        ASSERT_EQ(Run({"save-as", "@book.kvbook", "@copy"}).m_Code, 0);
+        for (auto const & arguments : std::vector<std::vector<std::string>>{
+                 {"add", "@copy.kvbook", "@docs/d.kvdoc", "--before", "1"},
+                 {"package", "@copy.kvbook", "@package"},
+             }) {
+            std::string const before = Chapters("@copy.kvbook");
+            auto const outcome = [&] {
+                ImpatientUser const user(patience);
+                return Run(arguments);
+            }();
+            if (0 == outcome.m_Code) {
+                EXPECT_TRUE("package" != arguments[0] || Exists("package/copy.kvbook"));
+                EXPECT_TRUE("add" != arguments[0] || "d@1 *a@1 b c" == Chapters("@copy.kvbook"));
+            } else {
+                EXPECT_EQ(outcome.m_Code, 1);
+                EXPECT_NE(outcome.m_Err.find("nterrupted"), std::string::npos) << outcome.m_Err;
+                EXPECT_EQ(Chapters("@copy.kvbook"), before);
+                EXPECT_TRUE("package" != arguments[0] || !Exists("package"));
+            }
+            EXPECT_FALSE(Exists("package.partial"));
+            EXPECT_FALSE(Exists("copy.kvbook.lock"));
+            fs::remove_all(m_Folder / "package");
+        }
+    }
 }
 
 TEST_F(BookVerbsTest, ResultsAreForMachinesToo)

@@ -1,10 +1,5 @@
 #include "ProgramTest.h"
 
-#include "app/Interruption.h"
-#include "framework/kernel/BroadcastNotification.h"
-
-#include <atomic>
-
 class BuildVerbTest : public ProgramTest
 {
 };
@@ -125,24 +120,6 @@ TEST_F(BuildVerbTest, DamagedWorkFilesAreMadeAnew)
         EXPECT_TRUE(RunJson({"build", "@book"})["upToDate"].get<bool>());
     }
 }
-
-/// A user who presses Ctrl-C at the n-th thing that the program tells of.
-class ImpatientUser final : public BroadcastNotificationSink
-{
-public:
-    explicit ImpatientUser(int patience) : m_Patience(patience) { BroadcastNotification::RegisterBroadcastSink(this); }
-    ~ImpatientUser() override { BroadcastNotification::UnregisterBroadcastSink(this); }
-
-    void Notify(Kernel::Counted<Kernel::Notification>) override
-    {
-        if (--m_Patience <= 0) {
-            App::Interruption::Raise();
-        }
-    }
-
-private:
-    std::atomic<int> m_Patience;
-};
 
 TEST_F(BuildVerbTest, InterruptingLeavesNothingHalfWritten)
 {

@@ -1,5 +1,9 @@
 #pragma once
 
+#include "app/Interruption.h"
+#include "framework/kernel/BroadcastNotification.h"
+
+#include <atomic>
 #include <filesystem>
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -34,6 +38,24 @@ protected:
     [[nodiscard]] std::map<std::string, std::string> Documents() const;
 
     std::filesystem::path m_Folder;
+};
+
+/// A user who presses Ctrl-C at the n-th thing that the program tells of.
+class ImpatientUser final : public BroadcastNotificationSink
+{
+public:
+    explicit ImpatientUser(int patience) : m_Patience(patience) { BroadcastNotification::RegisterBroadcastSink(this); }
+    ~ImpatientUser() override { BroadcastNotification::UnregisterBroadcastSink(this); }
+
+    void Notify(Kernel::Counted<Kernel::Notification>) override
+    {
+        if (--m_Patience <= 0) {
+            App::Interruption::Raise();
+        }
+    }
+
+private:
+    std::atomic<int> m_Patience;
 };
 
 /// A PDF that is whole: head, end, and nothing that qpdf complains about.
