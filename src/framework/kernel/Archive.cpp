@@ -173,22 +173,22 @@ Counted<Archive> Archive::OpenLocked(Counted<FileLock> lock, IDTag type, OpenRes
 
 String Archive::GetResultText(OpenResult result, String const & path)
 {
-    static constexpr char const * Texts[] = {
-        "%1 is open.",
-        "%1 does not exist.",
-        "%1 is a folder, not a file.",
-        "You have no permission to read %1.",
-        "Access to %1 was denied by the system.",
-        "%1 is open elsewhere. Close it there first.",
-        "%1 cannot be opened because too many files are open.",
-        "%1 cannot be read: the disk reports an error.",
-        "%1 is not a file of this program.",
-        "%1 is a file of this program, but of another kind than expected.",
-        "%1 was written by a later version of this program. Update the program to open it.",
-        "%1 ends too early; the copy may be incomplete. Restore it from a backup.",
-        "%1 is damaged. Restore it from a backup.",
+    LocalisedString const texts[] = {
+        LocalisedString("%1 is open.", "File"),
+        LocalisedString("%1 does not exist.", "File"),
+        LocalisedString("%1 is a folder, not a file.", "File"),
+        LocalisedString("You have no permission to read %1.", "File"),
+        LocalisedString("Access to %1 was denied by the system.", "File"),
+        LocalisedString("%1 is open elsewhere. Close it there first.", "File"),
+        LocalisedString("%1 cannot be opened because too many files are open.", "File"),
+        LocalisedString("%1 cannot be read: the disk reports an error.", "File"),
+        LocalisedString("%1 is not a file of this program.", "File"),
+        LocalisedString("%1 is a file of this program, but of another kind than expected.", "File"),
+        LocalisedString("%1 was written by a later version of this program. Update the program to open it.", "File"),
+        LocalisedString("%1 ends too early; the copy may be incomplete. Restore it from a backup.", "File"),
+        LocalisedString("%1 is damaged. Restore it from a backup.", "File"),
     };
-    return Format(Texts[static_cast<int>(result)], path);
+    return Format(texts[static_cast<int>(result)], path);
 }
 
 Counted<Archive> Archive::CreateWithTemporary(String const & path, IDTag type, CreateResult & result)
@@ -203,9 +203,10 @@ Counted<Archive> Archive::CreateWithTemporary(String const & path, IDTag type, C
     auto file = ReplacementFile::Create(path, File::ShareMode::RespectLocks, ownLock, opened);
     if (!file) {
         result.m_Code = ToCreateCode(opened);
-        result.m_Text = result.m_Code == CreateResult::FolderMissing
-                            ? Format("The folder %1 does not exist. Make it first.", Path::GetFolder(path))
-                            : File::GetResultText(opened, path);
+        result.m_Text =
+            result.m_Code == CreateResult::FolderMissing
+                ? Format(LocalisedString("The folder %1 does not exist. Make it first.", "File"), Path::GetFolder(path))
+                : File::GetResultText(opened, path);
         return nullptr;
     }
     result = CreateResult();

@@ -24,15 +24,18 @@ String UidText(ClassUID uid)
 }
 
 ArchiveCorruptionException::ArchiveCorruptionException(String path, String const & place, String const & fault)
-    : Exception(Format("The file %1 is damaged (%2: %3). Restore it from a backup.", path, place, fault)),
+    : Exception(Format(LocalisedString("The file %1 is damaged (%2: %3). Restore it from a backup.", "File"), path,
+                       place, fault)),
       m_Path(std::move(path))
 {
 }
 
 FutureVersionException::FutureVersionException(String path, ClassUID uid, unsigned short found, unsigned short known)
-    : Exception(Format("The file %1 was written by a later version of this program (%2 version %3, known up to %4). "
-                       "Update the program to open it.",
-                       path, UidText(uid), static_cast<int>(found), static_cast<int>(known))),
+    : Exception(Format(
+          LocalisedString("The file %1 was written by a later version of this program (%2 version %3, known up to %4). "
+                          "Update the program to open it.",
+                          "File"),
+          path, UidText(uid), static_cast<int>(found), static_cast<int>(known))),
       m_Path(std::move(path)),
       m_ClassUID(uid),
       m_Found(found)

@@ -137,7 +137,7 @@ void Archive::Writer::Write(IDTag type)
     target.ThrowFailure();
     if (!done) {
         throw FileIOException(FileIOException::Reason::WriteFailed, m_File->GetTarget(),
-                              Format("Cannot write %1: %2.", m_File->GetTarget(), message));
+                              Format(LocalisedString("Cannot write %1: %2.", "File"), m_File->GetTarget(), message));
     }
 }
 

@@ -250,28 +250,28 @@ File::OpenUnmanagedResult File::ResultFromErrno(int errorNumber)
 
 String File::GetResultText(OpenUnmanagedResult result, String const & path)
 {
-    static constexpr char const * Texts[] = {
-        "%1 is open.",
-        "%1 can be read and not written.",
-        "%1 does not exist.",
-        "%1 was to be opened in an unknown way.",
-        "The folder of %1 does not exist. Make it first.",
-        "Access to %1 was denied by the system.",
-        "You have no permission for %1. Change its permissions, or choose another place.",
-        "%1 is in use by another program. Close it there.",
-        "%1 is locked by another program. Close it there.",
-        "%1 is in use by the system. Try again later.",
-        "%1 lies on a disk that cannot be written to. Choose another place.",
-        "%1 is a folder, not a file.",
-        "%1 cannot be opened because too many files are open.",
-        "%1 cannot be opened because memory is short.",
-        "%1 cannot be opened because the device reports an error.",
-        "The disk of %1 is full. Make room on it, or choose another place.",
-        "Your quota on the disk of %1 is used up.",
-        "The name of %1 is too long for its file system.",
-        "%1 cannot be opened.",
+    LocalisedString const texts[] = {
+        LocalisedString("%1 is open.", "File"),
+        LocalisedString("%1 can be read and not written.", "File"),
+        LocalisedString("%1 does not exist.", "File"),
+        LocalisedString("%1 was to be opened in an unknown way.", "File"),
+        LocalisedString("The folder of %1 does not exist. Make it first.", "File"),
+        LocalisedString("Access to %1 was denied by the system.", "File"),
+        LocalisedString("You have no permission for %1. Change its permissions, or choose another place.", "File"),
+        LocalisedString("%1 is in use by another program. Close it there.", "File"),
+        LocalisedString("%1 is locked by another program. Close it there.", "File"),
+        LocalisedString("%1 is in use by the system. Try again later.", "File"),
+        LocalisedString("%1 lies on a disk that cannot be written to. Choose another place.", "File"),
+        LocalisedString("%1 is a folder, not a file.", "File"),
+        LocalisedString("%1 cannot be opened because too many files are open.", "File"),
+        LocalisedString("%1 cannot be opened because memory is short.", "File"),
+        LocalisedString("%1 cannot be opened because the device reports an error.", "File"),
+        LocalisedString("The disk of %1 is full. Make room on it, or choose another place.", "File"),
+        LocalisedString("Your quota on the disk of %1 is used up.", "File"),
+        LocalisedString("The name of %1 is too long for its file system.", "File"),
+        LocalisedString("%1 cannot be opened.", "File"),
     };
-    return Format(Texts[static_cast<int>(result)], path);
+    return Format(texts[static_cast<int>(result)], path);
 }
 
 }

@@ -37,7 +37,9 @@ FileIOException FileIOException::FromErrno(int errorNumber, String const & path,
 {
     String const text = GetSystemErrorText(errorNumber);
     return FileIOException(ToReason(errorNumber, writing), path,
-                           Format(writing ? "Cannot write to %1: %2." : "Cannot read %1: %2.", path, text));
+                           Format(writing ? LocalisedString("Cannot write to %1: %2.", "File")
+                                          : LocalisedString("Cannot read %1: %2.", "File"),
+                                  path, text));
 }
 
 }
