@@ -148,6 +148,19 @@ TEST_F(DispatchTest, HandsInWhatAnEventCallsForAndNothingElse)
     CloseInFront(document);
 }
 
+TEST_F(DispatchTest, TopicsAndAnchorsOfAChapterAreTheBooksToSave)
+{
+    Counted<DocumentController const> const document = OpenInFront(PathOf(0));
+    Post<IndexTopicsChangedNotification>(document);
+    BookBuilder::Rest();
+    EXPECT_TRUE(m_Book->IsDirty());
+    m_Book->SetIsDirty(false);
+    Post<AnchorsChangedNotification>(document, false);
+    BookBuilder::Rest();
+    EXPECT_TRUE(m_Book->IsDirty());
+    CloseInFront(document);
+}
+
 TEST_F(DispatchTest, WhatAnUpdateItselfProvokesStartsNoOther)
 {
     Counted<DocumentController const> const document = OpenInFront(PathOf(1));
