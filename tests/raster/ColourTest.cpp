@@ -1,9 +1,11 @@
+#include "framework/kernel/Trace.h"
 #include "framework/raster/ColourTransform.h"
 #include "framework/raster/DynamicBitmap.h"
 #include "framework/raster/PngEncoder.h"
 #include "framework/raster/Picture.h"
 
 #include <gtest/gtest.h>
+#include <algorithm>
 #include <thread>
 
 using namespace Raster;
@@ -116,6 +118,92 @@ TEST(ColourTest, APixelHasItsColourInEveryFormat)
     DynamicPixel const white({255, 255, 255, 255}, Format::Laba16);
     EXPECT_NEAR(reinterpret_cast<std::uint16_t const *>(white.GetBytes())[0], 65535, 20);
     EXPECT_NEAR(reinterpret_cast<std::uint16_t const *>(white.GetBytes())[1], 32896, 30);
+}
+
+/// The default RGB profile without the numbers that its colours are made from.
+Kernel::Consolidated<ICCProfile> HollowProfile()
+{
+    std::vector<unsigned char> bytes = ICCManager::GetInstance().GetDefaultProfileForFormat(Format::Rgba8)->GetBytes();
+    for (std::string_view const tag : {"rXYZ", "gXYZ", "bXYZ"}) {
+        auto const at = std::search(bytes.begin() + 128, bytes.end(), tag.begin(), tag.end());
+        *(at + 3) = '?';
+    }
+    String reason;
+    return ICCProfile::FromBytes(bytes, reason);
+}
+
+TEST(ColourTest, ProfilesWithoutATransformAreTracedAndColoursGoByPlainArithmetic)
+{
+    std::vector<std::string> lines;
+    Kernel::SetTraceTarget([&lines](String const & line) { lines.push_back(line.ToStd()); });
+    DynamicBuffer buffer;
+    buffer.Create(2, 2, Format::Cmyka8);
+    buffer.Fill(DynamicPixel({51, 102, 153, 255}, Format::Cmyka8));
+    auto const hollow = HollowProfile();
+    ASSERT_TRUE(hollow);
+    auto const bitmap = ConvertBitmap(buffer, nullptr, Format::Rgba8, hollow, RenderingIntent::Perceptual, true);
+    Kernel::SetTraceTarget({});
+    ASSERT_TRUE(bitmap);
+    EXPECT_EQ(std::vector<int>(bitmap->GetRow(1), bitmap->GetRow(1) + 4), (std::vector<int>{51, 102, 153, 255}));
+    EXPECT_EQ(lines, (std::vector<std::string>{
+                         "Colour engine failed to create transform between FOGRA39L Coated and sRGB\r\n"}));
+    // A profile of other colours than the bitmap's does not apply either.
+    auto const grey = ICCManager::GetInstance().GetDefaultProfileForFormat(Format::GreyAlpha8);
+    auto const mismatched = ConvertBitmap(buffer, grey, Format::Rgba8, nullptr, RenderingIntent::Perceptual, true);
+    EXPECT_EQ(mismatched->GetPixels(), bitmap->GetPixels());
+}
+
+TEST(ColourTest, ProfilesConvertBetweenAllFormatsWithColours)
+{
+    Format const formats[] = {Format::Rgba8,  Format::Rgba16, Format::GreyAlpha8, Format::GreyAlpha16,
+                              Format::Cmyka8, Format::Laba16, Format::RgbaFloat};
+    DynamicBuffer buffer;
+    buffer.Create(3, 1, Format::Rgba8);
+    std::uint8_t const greys[] = {255, 255, 255, 255, 128, 128, 128, 77, 64, 64, 64, 255};
+    std::copy(std::begin(greys), std::end(greys), buffer.GetRow(0));
+    for (Format const there : formats) {
+        auto const first = ConvertBitmap(buffer, nullptr, there, nullptr, RenderingIntent::RelativeColorimetric, true);
+        ASSERT_TRUE(first);
+        EXPECT_EQ(first->GetFormat(), there);
+        for (Format const next : formats) {
+            auto const second = ConvertBitmap(*first, nullptr, next, nullptr, RenderingIntent::RelativeColorimetric, true);
+            auto const back =
+                ConvertBitmap(*second, nullptr, Format::Rgba8, nullptr, RenderingIntent::RelativeColorimetric, true);
+            for (int i = 0; i < 12; ++i) {
+                EXPECT_NEAR(back->GetRow(0)[i], greys[i], i % 4 == 3 ? 0 : 6)
+                    << static_cast<int>(there) << " " << static_cast<int>(next) << ", channel " << i;
+            }
+        }
+    }
+    EXPECT_FALSE(ConvertBitmap(buffer, nullptr, Format::Alpha8, nullptr, RenderingIntent::Perceptual, true));
+}
+
+TEST(ColourTest, APngStatesTheProfileThatItsNumbersAreMeantIn)
+{
+    auto const standard = ICCManager::GetInstance().GetDefaultProfileForFormat(Format::Rgba8);
+    std::vector<unsigned char> bytes = standard->GetBytes();
+    bytes[25] ^= 1;
+    String reason;
+    auto const other = ICCProfile::FromBytes(bytes, reason);
+    for (auto const & profile : {standard, other}) {
+        DynamicBuffer buffer;
+        buffer.Create(4, 2, Format::Rgba8);
+        auto const data = Kernel::MakeCounted<CompressedRasterData>();
+        ExportOptions options;
+        options.m_Dpi = 300;
+        PNGBase png(data, 4, 2, options);
+        ASSERT_TRUE(png.Write(buffer, nullptr, profile, RenderingIntent::RelativeColorimetric, true));
+        auto const raw = data->RelinquishOwnership();
+        EXPECT_TRUE(data->GetBytes().empty()) << "the bytes were given away";
+        PictureProblem problem;
+        auto const picture = Picture::FromBytes(
+            std::make_shared<std::vector<unsigned char>>(raw->GetData(), raw->GetData() + raw->GetSize()), "x", problem);
+        ASSERT_TRUE(picture) << problem.m_Text;
+        EXPECT_NEAR(picture->GetInfo().m_DpiX, 300, 0.01);
+        auto const read = picture->ReadProfile();
+        ASSERT_EQ(static_cast<bool>(read), profile == other) << "sRGB is named, not embedded";
+        EXPECT_TRUE(!read || read->IsSame(*other));
+    }
 }
 
 TEST(ColourTest, AnEncodedPngReadsBackInEveryFormatWithColours)

@@ -1,11 +1,12 @@
 #include "framework/raster/PngEncoder.h"
 
 #include "framework/kernel/Assert.h"
+#include "framework/raster/PixelConversion.h"
 
+#include <algorithm>
 #include <cmath>
-#include <cstring>
-#include <libdeflate.h>
-#include <memory>
+#include <csetjmp>
+#include <png.h>
 
 namespace Raster
 {
@@ -13,54 +14,56 @@ namespace Raster
 namespace
 {
 
-void AppendBig32(std::string & text, std::uint32_t value)
+void WriteToData(png_structp png, png_bytep bytes, std::size_t size)
 {
-    for (int shift = 24; shift >= 0; shift -= 8) {
-        text += static_cast<char>(value >> shift & 0xFF);
-    }
+    static_cast<CompressedRasterData *>(png_get_io_ptr(png))->Append(bytes, size);
 }
 
-/// The PNG's rows, each behind the number of the filter that looks best for it: the least sum of absolute values
-/// (ISO 15948, 12.8).
-std::string FilteredRows(DynamicBitmap const & bitmap)
+void NothingToFlush(png_structp) {}
+void IgnoreWarning(png_structp, png_const_charp) {}
+/// libpng's own would print the message first.
+[[noreturn]] void LeaveQuietly(png_structp png, png_const_charp)
 {
-    constexpr std::size_t step = 4;
-    std::size_t const size = bitmap.GetRowBytes();
-    std::vector<std::uint8_t> const nothing(size, 0);
-    std::string rows;
-    rows.reserve((size + 1) * static_cast<std::size_t>(bitmap.GetHeight()));
-    std::string tries[5];
-    for (int y = 0; y < bitmap.GetHeight(); ++y) {
-        std::uint8_t const * const row = bitmap.GetRow(y);
-        std::uint8_t const * const above = y > 0 ? bitmap.GetRow(y - 1) : nothing.data();
-        int best = 0;
-        unsigned long bestSum = ~0UL;
-        for (int filter = 0; filter < 5; ++filter) {
-            std::string & tried = tries[filter];
-            tried.assign(1, static_cast<char>(filter));
-            unsigned long sum = 0;
-            for (std::size_t i = 0; i < size; ++i) {
-                int const left = i >= step ? row[i - step] : 0;
-                int const up = above[i];
-                int const corner = i >= step ? above[i - step] : 0;
-                int const guess = left + up - corner;
-                int const nearLeft = std::abs(guess - left);
-                int const nearUp = std::abs(guess - up);
-                int const nearCorner = std::abs(guess - corner);
-                int const paeth = nearLeft <= nearUp && nearLeft <= nearCorner ? left : nearUp <= nearCorner ? up : corner;
-                int const predicted[] = {0, left, up, (left + up) / 2, paeth};
-                auto const value = static_cast<std::int8_t>(row[i] - predicted[filter]);
-                sum += static_cast<unsigned long>(std::abs(static_cast<int>(value)));
-                tried += static_cast<char>(value);
-            }
-            if (sum < bestSum) {
-                bestSum = sum;
-                best = filter;
-            }
-        }
-        rows += tries[best];
+    png_longjmp(png, 1);
+}
+
+/// What the file says besides its pixels.
+struct PngHeader
+{
+    png_uint_32 m_Width;
+    png_uint_32 m_Height;
+    int m_Compression;
+    /// Pixels to the metre; 0 states none.
+    png_uint_32 m_Density;
+    /// Null for sRGB.
+    ICCProfile const * m_Profile;
+};
+
+/// libpng leaves by longjmp, so nothing in this frame has a destructor.
+bool WriteRows(png_structp png, png_infop info, PngHeader const & header, png_bytepp rows)
+{
+    if (setjmp(png_jmpbuf(png))) {
+        return false;
     }
-    return rows;
+    // A profile that libpng finds fault with is left out, and does not end the file.
+    png_set_benign_errors(png, 1);
+    png_set_IHDR(png, info, header.m_Width, header.m_Height, 8, PNG_COLOR_TYPE_RGB_ALPHA, PNG_INTERLACE_NONE,
+                 PNG_COMPRESSION_TYPE_BASE, PNG_FILTER_TYPE_BASE);
+    png_set_compression_level(png, header.m_Compression);
+    if (header.m_Profile) {
+        png_set_iCCP(png, info, "ICC profile", PNG_COMPRESSION_TYPE_BASE,
+                     header.m_Profile->GetBytes().data(),
+                     static_cast<png_uint_32>(header.m_Profile->GetBytes().size()));
+    } else {
+        png_set_sRGB(png, info, PNG_sRGB_INTENT_RELATIVE);
+    }
+    if (header.m_Density > 0) {
+        png_set_pHYs(png, info, header.m_Density, header.m_Density, PNG_RESOLUTION_METER);
+    }
+    png_write_info(png, info);
+    png_write_image(png, rows);
+    png_write_end(png, nullptr);
+    return true;
 }
 
 }
@@ -78,42 +81,52 @@ Kernel::Counted<Kernel::RawData> CompressedRasterData::RelinquishOwnership()
     return data;
 }
 
-Kernel::Counted<DynamicBitmap> ConvertToRgba8(DynamicBase const & bitmap, Kernel::Consolidated<ICCProfile> const & source,
-                                              Kernel::Consolidated<ICCProfile> const & target, RenderingIntent intent,
-                                              bool blackPointCompensation)
+Kernel::Counted<DynamicBitmap> ConvertBitmap(DynamicBase const & bitmap, Kernel::Consolidated<ICCProfile> const & source,
+                                             Format format, Kernel::Consolidated<ICCProfile> const & target,
+                                             RenderingIntent intent, bool blackPointCompensation)
 {
     using Layout = ColourTransform::Layout;
-    ColourSpace const space = SpaceOfFormat(bitmap.GetFormat());
-    KORVANE_ASSERT(target && target->GetSpace() == ColourSpace::Rgb);
-    if (space == ColourSpace::None || (source && source->GetSpace() != space)) {
+    ColourSpace const from = SpaceOfFormat(bitmap.GetFormat());
+    ColourSpace const to = SpaceOfFormat(format);
+    if (from == ColourSpace::None || to == ColourSpace::None) {
         return nullptr;
     }
     Kernel::Counted<DynamicBitmap> converted = Kernel::MakeCounted<DynamicBitmap>();
-    converted->Create(bitmap.GetWidth(), bitmap.GetHeight(), Format::Rgba8, MipmapMode::None,
-                      HardwareCachePolicy::Default);
-    std::size_t const bytes = BytesPerChannel(bitmap.GetFormat());
-    bool const isFloat = bytes == 4;
-    // Floats are brought to 16 bits first: what lies outside of 0 to 1 has no place in the target.
+    converted->Create(bitmap.GetWidth(), bitmap.GetHeight(), format, MipmapMode::OnDemand, HardwareCachePolicy::Default);
+    ICCManager const & manager = ICCManager::GetInstance();
+    Kernel::Consolidated<ICCProfile> const profile = source ? source : manager.GetDefaultProfileForSpace(from);
+    Kernel::Consolidated<ICCProfile> const targetProfile = target ? target : manager.GetDefaultProfileForSpace(to);
+    // Floats pass through 16 bits: what lies outside of 0 to 1 has no place in the profiles.
+    bool const isFloat = BytesPerChannel(bitmap.GetFormat()) == 4;
+    bool const isFloatTarget = BytesPerChannel(format) == 4;
     Kernel::Counted<ColourTransform const> const transform =
-        ColourTransform::Get(source ? source : ICCManager::GetInstance().GetDefaultProfileForSpace(space),
-                             bytes == 1 ? Layout::Channels8Alpha : Layout::Channels16Alpha, target,
-                             Layout::Channels8Alpha, intent, blackPointCompensation);
+        profile->GetSpace() == from && targetProfile->GetSpace() == to && !profile->IsSame(*targetProfile)
+            ? ColourTransform::Get(
+                  profile, BytesPerChannel(bitmap.GetFormat()) == 1 ? Layout::Channels8Alpha : Layout::Channels16Alpha,
+                  targetProfile, BytesPerChannel(format) == 1 ? Layout::Channels8Alpha : Layout::Channels16Alpha, intent,
+                  blackPointCompensation)
+            : nullptr;
     if (!transform) {
-        return nullptr;
+        ConvertPixels(bitmap, *converted);
+        return converted;
     }
     std::size_t const width = static_cast<std::size_t>(bitmap.GetWidth());
-    std::vector<std::uint16_t> deep(isFloat ? width * 4 : 0);
+    std::vector<float> wide(isFloat || isFloatTarget ? width * 4 : 0);
+    std::vector<std::uint16_t> deep(wide.size());
     for (int y = 0; y < bitmap.GetHeight(); ++y) {
         void const * row = bitmap.GetRow(y);
         if (isFloat) {
-            for (std::size_t i = 0; i < deep.size(); ++i) {
-                float value = 0;
-                std::memcpy(&value, bitmap.GetRow(y) + i * sizeof(float), sizeof(float));
-                deep[i] = static_cast<std::uint16_t>(std::lround(std::clamp(value, 0.0F, 1.0F) * 65535.0F));
-            }
+            ToFloatPixels(bitmap.GetFormat(), row, wide.data(), width);
+            FromFloatPixels(Format::Rgba16, wide.data(), deep.data(), width);
             row = deep.data();
         }
-        transform->Convert(row, converted->GetRow(y), width);
+        if (isFloatTarget) {
+            transform->Convert(row, deep.data(), width);
+            ToFloatPixels(Format::Rgba16, deep.data(), wide.data(), width);
+            FromFloatPixels(format, wide.data(), converted->GetRow(y), width);
+        } else {
+            transform->Convert(row, converted->GetRow(y), width);
+        }
     }
     return converted;
 }
@@ -124,56 +137,35 @@ PNGBase::PNGBase(Kernel::Counted<CompressedRasterData> data, int width, int heig
     KORVANE_ASSERT(m_Data);
 }
 
-void PNGBase::WriteChunk(char const (&type)[5], std::string_view data)
-{
-    std::string chunk;
-    AppendBig32(chunk, static_cast<std::uint32_t>(data.size()));
-    chunk.append(type, 4);
-    chunk += data;
-    AppendBig32(chunk, libdeflate_crc32(0, chunk.data() + 4, chunk.size() - 4));
-    m_Data->Append(chunk.data(), chunk.size());
-}
-
 bool PNGBase::Write(DynamicBase const & buffer, Kernel::Consolidated<ICCProfile> const & source,
                     Kernel::Consolidated<ICCProfile> const & destination, RenderingIntent intent,
                     bool blackPointCompensation)
 {
+    KORVANE_ASSERT(destination && destination->GetSpace() == ColourSpace::Rgb);
     if (buffer.GetWidth() != m_Width || buffer.GetHeight() != m_Height || m_Width < 1 || m_Height < 1) {
         return false;
     }
     Kernel::Counted<DynamicBitmap> const bitmap =
-        ConvertToRgba8(buffer, source, destination, intent, blackPointCompensation);
+        ConvertBitmap(buffer, source, Format::Rgba8, destination, intent, blackPointCompensation);
     if (!bitmap) {
         return false;
     }
-    m_Data->Append("\x89PNG\r\n\x1A\n", 8);
-    std::string header;
-    AppendBig32(header, static_cast<std::uint32_t>(m_Width));
-    AppendBig32(header, static_cast<std::uint32_t>(m_Height));
-    // 8 bits, colours with alpha, deflate, the standard filters, not interlaced.
-    header.append("\x08\x06\x00\x00\x00", 5);
-    WriteChunk("IHDR", header);
-    if (destination->IsSame(*ICCManager::GetInstance().GetDefaultProfileForFormat(Format::Rgba8))) {
-        WriteChunk("sRGB", std::string_view("\x01", 1));
+    bool const isStandard = destination->IsSame(*ICCManager::GetInstance().GetDefaultProfileForFormat(Format::Rgba8));
+    PngHeader const header{static_cast<png_uint_32>(m_Width), static_cast<png_uint_32>(m_Height),
+                           std::clamp(m_Options.m_Compression, 1, 9),
+                           static_cast<png_uint_32>(std::clamp(m_Options.m_Dpi / 0.0254 + 0.5, 0.0, 2147483647.0)),
+                           isStandard ? nullptr : destination.Get()};
+    std::vector<png_bytep> rows;
+    for (int y = 0; y < m_Height; ++y) {
+        rows.push_back(bitmap->GetRow(y));
     }
-    if (m_Options.m_Dpi > 0) {
-        std::string density;
-        auto const perMetre = static_cast<std::uint32_t>(std::lround(m_Options.m_Dpi / 0.0254));
-        AppendBig32(density, perMetre);
-        AppendBig32(density, perMetre);
-        density += '\x01';
-        WriteChunk("pHYs", density);
-    }
-    std::string const rows = FilteredRows(*bitmap);
-    std::unique_ptr<libdeflate_compressor, void (*)(libdeflate_compressor *)> const compressor(
-        libdeflate_alloc_compressor(m_Options.m_Compression), libdeflate_free_compressor);
-    KORVANE_ASSERT(compressor);
-    std::string packed(libdeflate_zlib_compress_bound(compressor.get(), rows.size()), '\0');
-    packed.resize(
-        libdeflate_zlib_compress(compressor.get(), rows.data(), rows.size(), packed.data(), packed.size()));
-    WriteChunk("IDAT", packed);
-    WriteChunk("IEND", {});
-    return true;
+    png_structp png = png_create_write_struct(PNG_LIBPNG_VER_STRING, nullptr, LeaveQuietly, IgnoreWarning);
+    png_infop info = png ? png_create_info_struct(png) : nullptr;
+    KORVANE_ASSERT(info);
+    png_set_write_fn(png, m_Data.Get(), WriteToData, NothingToFlush);
+    bool const isWritten = WriteRows(png, info, header, rows.data());
+    png_destroy_write_struct(&png, &info);
+    return isWritten;
 }
 
 }

@@ -36,6 +36,11 @@ void ReadFromSource(png_structp png, png_bytep target, std::size_t size)
 }
 
 void IgnoreWarning(png_structp, png_const_charp) {}
+/// libpng's own would print the message first.
+[[noreturn]] void LeaveQuietly(png_structp png, png_const_charp)
+{
+    png_longjmp(png, 1);
+}
 
 /// libpng leaves by longjmp, so nothing in this frame has a destructor.
 bool ReadRows(png_structp png, png_infop info, DynamicBitmap * bitmap, png_bytep * rows)
@@ -190,7 +195,7 @@ Kernel::Counted<DynamicBitmap> DecodePng(PictureBytes bytes, PictureInfo const &
         rows.push_back(bitmap->GetRow(y));
     }
     Source source{bytes};
-    png_structp png = png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, IgnoreWarning);
+    png_structp png = png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, LeaveQuietly, IgnoreWarning);
     png_infop pngInfo = png ? png_create_info_struct(png) : nullptr;
     bool read = false;
     if (pngInfo) {

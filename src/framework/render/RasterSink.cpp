@@ -5,6 +5,7 @@
 #include "framework/raster/PngEncoder.h"
 
 #include <cairo.h>
+#include <cmath>
 #include <cstring>
 #include <memory>
 
@@ -88,12 +89,33 @@ private:
     double m_LastY = 0;
 };
 
+/// How pictures are brought to fewer and to more pixels.
+struct Resamplers
+{
+    enum Raster::ResamplerType m_Down;
+    enum Raster::ResamplerType m_Up;
+};
+
+cairo_filter_t FilterFor(enum Raster::ResamplerType resampler)
+{
+    switch (resampler) {
+    case Raster::ResamplerNearest:
+        return CAIRO_FILTER_NEAREST;
+    case Raster::ResamplerBilinear:
+        return CAIRO_FILTER_GOOD;
+    case Raster::ResamplerBicubic:
+    case Raster::ResamplerLanczos3:
+        break;
+    }
+    return CAIRO_FILTER_BEST;
+}
+
 /// One drawing of one list.
 class Painter
 {
 public:
-    Painter(cairo_t * context, Schema const & schema, std::vector<Warning> * warnings)
-        : m_Context(context), m_Schema(schema), m_Warnings(warnings)
+    Painter(cairo_t * context, Schema const & schema, Resamplers resamplers, std::vector<Warning> * warnings)
+        : m_Context(context), m_Schema(schema), m_Resamplers(resamplers), m_Warnings(warnings)
     {
     }
 
@@ -283,7 +305,11 @@ private:
             cairo_matrix_t toPixels;
             cairo_matrix_init_scale(&toPixels, width, height);
             cairo_pattern_set_matrix(pattern.get(), &toPixels);
-            cairo_pattern_set_filter(pattern.get(), CAIRO_FILTER_GOOD);
+            cairo_matrix_t toDevice;
+            cairo_get_matrix(m_Context, &toDevice);
+            bool const isReduced = std::hypot(toDevice.xx, toDevice.yx) * std::hypot(toDevice.xy, toDevice.yy) <
+                                   static_cast<double>(width) * height;
+            cairo_pattern_set_filter(pattern.get(), FilterFor(isReduced ? m_Resamplers.m_Down : m_Resamplers.m_Up));
             // Edge pixels go on outwards, so that the picture's rim is not mixed with nothing.
             cairo_pattern_set_extend(pattern.get(), CAIRO_EXTEND_PAD);
             cairo_set_source(m_Context, pattern.get());
@@ -294,6 +320,7 @@ private:
 
     cairo_t * m_Context;
     Schema const & m_Schema;
+    Resamplers m_Resamplers;
     std::vector<Warning> * m_Warnings;
     std::vector<double> m_Opacities;
 };
@@ -342,7 +369,7 @@ Kernel::Counted<Raster::DynamicBitmap> RasterSink::Draw(DisplayList const & list
     }
     cairo_matrix_t const matrix = MatrixOf(toPixels);
     cairo_set_matrix(context.get(), &matrix);
-    Painter(context.get(), *m_Schema, warnings).Draw(list);
+    Painter(context.get(), *m_Schema, {m_Down, m_Up}, warnings).Draw(list);
     if (cairo_status(context.get()) != CAIRO_STATUS_SUCCESS) {
         return nullptr;
     }

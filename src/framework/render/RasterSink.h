@@ -5,6 +5,7 @@
 #include "framework/kernel/Counted.h"
 #include "framework/kernel/StringT.h"
 #include "framework/raster/DynamicBitmap.h"
+#include "framework/raster/ResamplerType.h"
 #include "framework/render/DisplayList.h"
 #include "framework/render/Schema.h"
 #include "framework/render/Warning.h"
@@ -22,6 +23,13 @@ public:
 
     explicit RasterSink(Kernel::Counted<Schema const> schema) : m_Schema(std::move(schema)) {}
 
+    /// How placed pictures are brought to fewer and to more pixels than they have. Bilinear at first.
+    void SetResamplers(enum Raster::ResamplerType down, enum Raster::ResamplerType up)
+    {
+        m_Down = down;
+        m_Up = up;
+    }
+
     /// A bitmap of `width` by `height` pixels that shows the list through `toPixels`, on a transparent ground. Null if a
     /// side is below 1 or above the maximum, or if there is no memory. `warnings` may be null. Safe on any thread.
     [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap> Draw(DisplayList const & list, int width, int height,
@@ -30,6 +38,8 @@ public:
 
 private:
     Kernel::Counted<Schema const> m_Schema;
+    enum Raster::ResamplerType m_Down = Raster::ResamplerBilinear;
+    enum Raster::ResamplerType m_Up = Raster::ResamplerBilinear;
 };
 
 }
