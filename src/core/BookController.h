@@ -154,6 +154,7 @@ public:
     [[nodiscard]] Kernel::Counted<PDFBookmarkManager const> GetPDFBookmarks() const;
     /// A bitmap of the key chapter's first spread; null if none is known.
     [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap const> GetThumbnail() const;
+    /// The key chapter's document has drawn its first spread anew. A handle swap, without a lock.
     void UpdateThumbnail(Kernel::Counted<Raster::DynamicBitmap const> thumbnail);
     [[nodiscard]] Kernel::Counted<Story::Index const> GetMasterIndex() const;
 
@@ -213,8 +214,6 @@ public:
     /// The same for a book file that is to be moved together with the copies of these chapters: it names them by their
     /// place beside it. In the open book the chapters keep their paths.
     void SaveBookAsPackage(DocumentSaveResult & result, String const & path, ChapterPaths packaged);
-    /// The book file's preview pictures; null if the book has none.
-    [[nodiscard]] Kernel::Counted<Kernel::ArchiveThumbnails> CreateThumbnails() const;
 
     // Chapter documents -----------------------------------------------------------------------------------------------
 
@@ -349,6 +348,14 @@ private:
 
     /// With stand-ins for the chapters that are written under another path.
     [[nodiscard]] ChapterList RecordsToWrite(ChapterList chapters) const;
+
+    /// The preview for the book file: the thumbnail in the present shape of the key chapter's first spread, as one PNG of
+    /// at most 512 pixels. Null if previews are not wanted, there is no key chapter or no thumbnail, or the spread is so
+    /// thin that a side has no pixel left.
+    [[nodiscard]] Kernel::Counted<Kernel::ArchiveThumbnails> CreateThumbnails() const;
+    /// A bitmap of a document's first spread; null if that has no area.
+    [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap>
+    RenderChapterThumbnail(Kernel::Counted<DocumentController const> const & document) const;
 
     // The steps of LoadChapterDocument.
     void WaitForClose(Kernel::Counted<BookChapter const> const & chapter) const;

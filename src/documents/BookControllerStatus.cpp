@@ -115,6 +115,8 @@ bool BookController::UpdateChapterStatus(Kernel::Counted<BookChapter> chapter,
     if (chapter->IsKey()) {
         if (auto const bitmap = document->GetDocumentCacheBitmap(0, false)) {
             m_Thumbnail.Set(bitmap);
+        } else if (!m_Thumbnail.Get()) {
+            m_Thumbnail.Set(RenderChapterThumbnail(document));
         }
     }
 

@@ -1,6 +1,7 @@
 #include "framework/document/DocumentController.h"
 
 #include "framework/document/AnchorVisitor.h"
+#include "framework/document/DocumentCacheBitmap.h"
 #include "framework/document/DocumentComposer.h"
 #include "framework/document/DocumentFile.h"
 #include "framework/document/DocumentLinks.h"
@@ -38,7 +39,8 @@ Kernel::Counted<DocumentFacts const> PublishedDocumentFacts::Get() const
 DocumentController::DocumentController()
     : m_Store(Kernel::MakeCounted<DocumentStore>()),
       m_Document(Kernel::MakeCounted<DocumentNode>(Kernel::MakeCounted<DocumentPictures>(m_Store))),
-      m_UnitConverter(Kernel::MakeCounted<Kernel::UnitValueConverter>(72.0))
+      m_UnitConverter(Kernel::MakeCounted<Kernel::UnitValueConverter>(72.0)),
+      m_CacheBitmap(Kernel::MakeCounted<DocumentCacheBitmap>())
 {
     m_Facts.Change([](DocumentFacts & facts) { facts.m_Guid = Kernel::Uuid().ToString(); });
 }
@@ -103,9 +105,30 @@ void DocumentController::CollectAnchors()
     m_AnchorsCurrent = true;
 }
 
-Kernel::Counted<Raster::DynamicBitmap const> DocumentController::GetDocumentCacheBitmap(int, bool) const
+Kernel::Counted<Raster::DynamicBitmap const> DocumentController::GetDocumentCacheBitmap(int spreadIndex,
+                                                                                       bool current) const
 {
-    return nullptr;
+    if (spreadIndex != 0 || !m_KeepsCacheBitmap) {
+        return nullptr;
+    }
+    if (current && !m_CacheBitmap->IsCurrent(GetAppearanceCount())) {
+        m_CacheBitmap->Render(*this);
+    }
+    return m_CacheBitmap->Get();
+}
+
+void DocumentController::KeepCacheBitmap()
+{
+    if (!m_KeepsCacheBitmap.exchange(true)) {
+        m_CacheBitmap->Dirty();
+        AddBackgroundTask(m_CacheBitmap);
+    }
+}
+
+void DocumentController::SetSoloNode(Kernel::JailCounted<Node> node)
+{
+    m_SoloNode = std::move(node);
+    ++m_LayoutCount;
 }
 
 namespace
@@ -149,6 +172,7 @@ ComposeOutcome DocumentController::ComposeText(bool force, bool * abort)
     }
     if (outcome.m_LayoutChanged || outcome.m_PagesChanged) {
         SetAnchorsOutOfDate();
+        ++m_LayoutCount;
     }
     if (outcome.m_PagesChanged) {
         MarkChanged();
@@ -195,6 +219,9 @@ void DocumentController::ProcessCommand(Kernel::Counted<DomainCommand> command,
     // Nobody composes a background document later on: whoever waits for the command reads true pages.
     if (IsTextDirty() && !GetWantBackgroundTasks() && m_Loaded) {
         AppendComposeNotifications(ComposeText(false, nullptr), notifications);
+    }
+    if (m_KeepsCacheBitmap && !m_CacheBitmap->IsCurrent(GetAppearanceCount())) {
+        m_CacheBitmap->Dirty();
     }
 }
 

@@ -10,13 +10,18 @@
 #include "framework/document/EmbeddedDocumentNode.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/kernel/DomainController.h"
-#include "framework/raster/DynamicBitmap.h"
 
 #include <atomic>
 
 struct DocumentLinks;
 struct DocumentSettings;
+class DocumentCacheBitmap;
 class DocumentStore;
+
+namespace Raster
+{
+class DynamicBitmap;
+}
 
 /// How `LoadDocument` goes about it.
 enum LoadDocumentMode
@@ -116,8 +121,10 @@ public:
     [[nodiscard]] DocumentPictures const & GetPictures() const { return *m_Document->GetPictures(); }
     /// Placed documents that can't be read without a password, in tree order.
     [[nodiscard]] std::vector<Kernel::JailCounted<EmbeddedDocumentNode>> GetProtectedImages() const;
-    /// The one node that a view shows alone; there are no such views, so null.
-    [[nodiscard]] Kernel::JailCounted<Node> GetSoloNode() const { return nullptr; }
+    /// The one node that the user's view shows alone; null for none. Previews show it alone, too. No file keeps it. Set
+    /// under the writer lock.
+    [[nodiscard]] Kernel::JailCounted<Node> const & GetSoloNode() const { return m_SoloNode; }
+    void SetSoloNode(Kernel::JailCounted<Node> node);
 
     // State. Safe on any thread.
 
@@ -169,8 +176,16 @@ public:
     void CollectAnchors();
     /// Where anchors stand, or which there are, may have changed.
     void SetAnchorsOutOfDate() { m_AnchorsCurrent = false; }
-    /// A picture of the spread that is kept ready; documents without windows keep none, so null.
-    [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap const> GetDocumentCacheBitmap(int spreadIndex, bool wait) const;
+    /// A picture of the spread that is kept ready: documents in front keep one of the first spread, in the document's
+    /// format and on a transparent ground (see `DocumentCacheBitmap`). Null for any other spread and document. With
+    /// `current` a picture that is missing or behind the document is made first, on the calling thread under the reader
+    /// lock; without it the answer is what there is.
+    [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap const> GetDocumentCacheBitmap(int spreadIndex,
+                                                                                      bool current) const;
+    /// Begins to keep the picture. For a document that comes in front; again, nothing.
+    void KeepCacheBitmap();
+    /// Grows with everything that may make the document look different.
+    [[nodiscard]] std::uint64_t GetAppearanceCount() const { return m_ChangeCount + m_LayoutCount; }
 
     /// Whether its commands post notifications: only those of documents in front do.
     void SetWantNotifications(bool want) { SetSuppressNotifications(!want); }
@@ -222,11 +237,16 @@ private:
     /// The open file; its own lock.
     Kernel::Counted<DocumentStore> const m_Store;
     Kernel::JailCounted<DocumentNode> const m_Document;
+    Kernel::JailCounted<Node> m_SoloNode;
     DocumentHistory m_History;
     PublishedDocumentFacts m_Facts;
     Kernel::Counted<Kernel::UnitValueConverter const> const m_UnitConverter;
     std::atomic<std::uint64_t> m_ChangeCount{0};
     std::atomic<std::uint64_t> m_SavedCount{0};
+    /// Layouts that composing has changed, and views.
+    std::atomic<std::uint64_t> m_LayoutCount{0};
+    Kernel::Counted<DocumentCacheBitmap> const m_CacheBitmap;
+    std::atomic<bool> m_KeepsCacheBitmap{false};
     std::atomic<bool> m_FromOlderVersion{false};
     std::atomic<bool> m_Restricted{false};
     std::atomic<bool> m_TextDirty{false};

@@ -64,6 +64,9 @@ public:
     /// spread, on a page or not, if `includeItems`. Empty if there is nothing of the kind.
     [[nodiscard]] Kernel::RectT<double> GetSpreadExtents(bool includePages, bool includeBleed, bool includeItems) const;
 
+    /// All that may look different once the spread has changed: its pages with their bleed, and everything on it.
+    [[nodiscard]] Kernel::RectT<double> GetInvalidRect() const { return GetSpreadExtents(true, true, true); }
+
     /// Previews of this spread keep the paper transparent.
     [[nodiscard]] bool HasTransparentBackground() const { return m_TransparentBackground; }
     void SetTransparentBackground(bool transparent) { m_TransparentBackground = transparent; }

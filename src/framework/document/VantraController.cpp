@@ -175,6 +175,7 @@ void VantraController::IntroduceFront(Counted<DocumentController> const & docume
     document->SetWantNotifications(true);
     document->SetWantBackgroundTasks(true);
     document->StartBackgroundTaskPump();
+    document->KeepCacheBitmap();
     Broadcast(Kernel::MakeCounted<NewDocumentNotification>(document));
 }
 
