@@ -61,6 +61,7 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     AddSaveAsVerb(verbs);
     AddPackageVerb(verbs);
     AddStatusVerb(verbs);
+    AddPreflightVerb(verbs);
     AddLocateVerb(verbs);
     AddWatchVerb(verbs);
     AddShowVerb(verbs);

@@ -53,6 +53,8 @@ void AddSaveAsVerb(VerbList & verbs);
 void AddPackageVerb(VerbList & verbs);
 /// Tells the state of a book's chapters.
 void AddStatusVerb(VerbList & verbs);
+/// Checks a book's chapters before output.
+void AddPreflightVerb(VerbList & verbs);
 /// Finds chapters again whose files have moved.
 void AddLocateVerb(VerbList & verbs);
 /// Keeps a book open, and tells of each chapter that changes.

@@ -369,6 +369,10 @@ private:
                                                             bool reconcile);
     void AskForPasswords(Kernel::Counted<BookChapter> const & chapter,
                          Kernel::Counted<DocumentController> const & document) const;
+    /// Enters the document in the table and counts a use, in one step.
+    void StoreAndUse(Kernel::Counted<BookChapter const> const & chapter,
+                     Kernel::Counted<DocumentController> const & document, bool adopted) const;
+    /// The caller holds the lock of the table.
     void StoreChapterDocument(Kernel::Counted<BookChapter const> const & chapter,
                               Kernel::Counted<DocumentController> document, bool adopted) const;
     /// Takes the chapter out of the table; the caller holds its lock.

@@ -90,9 +90,13 @@ Kernel::Counted<DocumentController> BookController::LoadChapterDocument(Kernel::
     if (!document) {
         return nullptr;
     }
-    if (GetDocumentControllerForChapter(chapter, false) == document) {
-        application.RegisterBackgroundController(document);
-        return document;
+    {
+        // One step with the release that takes a document of the user's out of the table again.
+        Kernel::ScopedLock const lock(m_ChapterDocumentsLock);
+        if (GetDocumentControllerForChapter(chapter, false) == document) {
+            application.RegisterBackgroundController(document);
+            return document;
+        }
     }
     if (application.GetRegisteredDocumentControllerFromPath(path) == document) {
         return AdoptForegroundDocument(chapter, document, reconcile);
@@ -104,8 +108,7 @@ Kernel::Counted<DocumentController>
 BookController::AdoptForegroundDocument(Kernel::Counted<BookChapter const> const & chapter,
                                         Kernel::Counted<DocumentController> document, bool reconcile)
 {
-    StoreChapterDocument(chapter, document, true);
-    VantraController::GetInstance().RegisterBackgroundController(document);
+    StoreAndUse(chapter, document, true);
     // Not under the lock of the table: bringing the index in step waits for commands of this and other documents.
     if (reconcile) {
         ReconcileIndex(document);
@@ -121,11 +124,10 @@ Kernel::Counted<DocumentController>
 BookController::UseDocumentLoadedElsewhere(Kernel::Counted<BookChapter const> const & chapter,
                                            Kernel::Counted<DocumentController> document)
 {
-    StoreChapterDocument(chapter, document, false);
+    StoreAndUse(chapter, document, false);
     if (auto const mutableChapter = GetMutableChapter(chapter)) {
         mutableChapter->SetStatus(BookChapter::Status::OpenForEdit);
     }
-    VantraController::GetInstance().RegisterBackgroundController(document);
     document->SetCanShowProgress(false);
     return document;
 }
@@ -167,6 +169,7 @@ BookController::OpenChapterDocument(Kernel::Counted<BookChapter const> const & c
             ReconcileAnchors(mutableChapter, document);
         }
     }
+    Kernel::ScopedLock const lock(m_ChapterDocumentsLock);
     StoreChapterDocument(chapter, document, false);
     return document;
 }
@@ -204,10 +207,18 @@ void BookController::AskForPasswords(Kernel::Counted<BookChapter> const & chapte
     answered.Wait(0);
 }
 
+void BookController::StoreAndUse(Kernel::Counted<BookChapter const> const & chapter,
+                                 Kernel::Counted<DocumentController> const & document, bool adopted) const
+{
+    // One step: a release that comes between would take the document out of the table, and its use could not be ended.
+    Kernel::ScopedLock const lock(m_ChapterDocumentsLock);
+    StoreChapterDocument(chapter, document, adopted);
+    VantraController::GetInstance().RegisterBackgroundController(document);
+}
+
 void BookController::StoreChapterDocument(Kernel::Counted<BookChapter const> const & chapter,
                                           Kernel::Counted<DocumentController> document, bool adopted) const
 {
-    Kernel::ScopedLock const lock(m_ChapterDocumentsLock);
     ChapterDocuments documents = *m_ChapterDocuments.Get();
     // What another book was the last to use, and closed, would otherwise stay in memory here.
     std::erase_if(documents, [](auto const & entry) { return entry.second->IsCommandEnqueueDisabled(); });
@@ -243,9 +254,9 @@ bool BookController::ReleaseChapterDocument(Kernel::Counted<BookChapter const> c
             mutableChapter->SetStatus(BookChapter::Status::Ok);
         }
         CloseChapterDocument(chapter, document);
-    } else if (application.IsPurelyForegroundController(document)) {
+    } else {
         Kernel::ScopedLock const lock(m_ChapterDocumentsLock);
-        if (m_AdoptedChapters.erase(chapter) > 0) {
+        if (application.IsPurelyForegroundController(document) && m_AdoptedChapters.erase(chapter) > 0) {
             ForgetChapterDocument(chapter);
             document->SetCanShowProgress(true);
         }

@@ -232,6 +232,7 @@ void BookController::UpdatePreflightStatus(Kernel::Counted<BookChapter> chapter,
     }
     auto status = PreflightResult::Status::NotRun;
     String text = PreflightNotRun();
+    Kernel::Counted<PreflightResults const> results;
     if (document) {
         if (run) {
             auto const check = Kernel::MakeCounted<PreflightCheckDocumentCommand>(PreflightForOperation::Check);
@@ -242,8 +243,7 @@ void BookController::UpdatePreflightStatus(Kernel::Counted<BookChapter> chapter,
             }
             VantraController::GetInstance().EnqueueCommandAndWait(check, document, false);
         }
-        auto const results = document->GetPreflightResults();
-        chapter->SetPreflightResults(results);
+        results = document->GetPreflightResults();
         if (results) {
             PreflightResults::Summary const summary = results->GetSummary();
             status = summary.m_Status;
@@ -253,6 +253,7 @@ void BookController::UpdatePreflightStatus(Kernel::Counted<BookChapter> chapter,
             ReleaseChapterDocument(chapter, false);
         }
     }
+    chapter->SetPreflightResults(results);
     if (chapter->SetPreflightStatus(status, text)) {
         MarkChanged();
     }

@@ -2,8 +2,13 @@
 #include "commands/UpdateChapterCommand.h"
 #include "core/BookCollection.h"
 #include "core/BookNotification.h"
+#include "framework/commands/ModifySectionCommand.h"
+#include "framework/document/CloseDocumentCommand.h"
 #include "framework/document/DocumentMetadata.h"
+#include "framework/document/VantraController.h"
+#include "framework/kernel/Clock.h"
 #include "framework/kernel/FileSystem.h"
+#include "framework/kernel/Trace.h"
 #include "framework/kernel/UnitValueConverter.h"
 #include "framework/raster/ICCProfile.h"
 #include "framework/story/Story.h"
@@ -126,6 +131,43 @@ TEST_F(ChapterStatusTest, AFullPassFindsWhatHappenedToTheFiles)
     book->UpdateChapters();
     BookBuilder::Rest();
     EXPECT_FALSE(book->IsDirty()) << "a pass that finds nothing new leaves the book alone";
+}
+
+TEST_F(ChapterStatusTest, ManyCallsCostOnePassAndTheForegroundPassOpensNothing)
+{
+    auto const book = m_Builder.NewBook({m_Builder.WriteChapter("a.kvdoc"), m_Builder.WriteChapter("b.kvdoc")});
+    Kernel::ManualClock clock(Kernel::TimeStamp(1'000'000'000));
+    BookBuilder::Rest();
+    Kernel::Clock::Set(&clock);
+    NotificationRecorder recorder;
+    for (int call = 0; call < 5; ++call) {
+        book->UpdateChapters();
+    }
+    EXPECT_EQ(recorder.All<ChapterChangedNotification>().size(), 1u);
+
+    OpenDocumentFailedNotification failure(book->GetChapterAtIndex(0)->GetPath(), true);
+    auto const document =
+        VantraController::GetInstance().OpenDocument(book->GetChapterAtIndex(0)->GetPath(), failure);
+    ASSERT_TRUE(document);
+    BookBuilder::Rest();
+    auto const command = MakeCounted<ModifySectionCommand>(0u);
+    command->SetStartNumberingAt(9);
+    VantraController::GetInstance().EnqueueCommandAndWait(command, document, false);
+    Kernel::FileSystem::Delete(book->GetChapterAtIndex(1)->GetPath(), 0);
+    int loads = 0;
+    Kernel::SetTraceTarget([&loads](String const & line) { loads += line.View().starts_with("LoadChapter:") ? 1 : 0; });
+    for (int call = 0; call < 5; ++call) {
+        book->UpdateForegroundChapters();
+    }
+    BookBuilder::Rest();
+    Kernel::SetTraceTarget({});
+    EXPECT_EQ(loads, 0);
+    EXPECT_EQ(book->GetChapterAtIndex(0)->DescribePages(), "9 - 9") << "read from the open document, unsaved";
+    EXPECT_EQ(book->GetChapterAtIndex(1)->GetStatus(), BookChapter::Status::Ok) << "nobody has looked";
+    VantraController::GetInstance().EnqueueCommandAndWait(
+        MakeCounted<CloseDocumentCommand>(document, nullptr, false, true));
+    BookBuilder::Rest();
+    Kernel::Clock::Set(nullptr);
 }
 
 TEST_F(ChapterStatusTest, OneChapterIsUpdatedByItsCommand)

@@ -42,6 +42,7 @@ bool DocumentRegistry::ClaimForLoading(String const & path, Document & controlle
 {
     std::string const key = Key(path);
     bool isPrepared = !beforeWaiting;
+    RecordPointer awaited;
     std::thread::id const thread = std::this_thread::get_id();
     std::unique_lock lock(m_Lock);
     for (;;) {
@@ -55,7 +56,9 @@ bool DocumentRegistry::ClaimForLoading(String const & path, Document & controlle
             return true;
         }
         if (record->m_State == State::Open) {
-            record->m_Promised.push_back(thread);
+            if (record != awaited) {
+                record->m_Promised.push_back(thread);
+            }
             Document open = record->m_Controller;
             lock.unlock();
             controller.Swap(open);
@@ -68,6 +71,10 @@ bool DocumentRegistry::ClaimForLoading(String const & path, Document & controlle
             beforeWaiting();
             lock.lock();
             continue;
+        }
+        if (record->m_State == State::Loading && record != awaited) {
+            record->m_Awaiting.push_back(thread);
+            awaited = record;
         }
         Document const closing = record->m_State == State::Closing ? record->m_Controller : nullptr;
         if (closing && closing->IsCommandEnqueueDisabled()) {
@@ -103,6 +110,7 @@ void DocumentRegistry::EndLoading(String const & path, Document controller, bool
             record->m_State = State::Open;
             record->m_InFront = inFront;
             record->m_Listed = inFront;
+            record->m_Promised = std::move(record->m_Awaiting);
             if (!inFront) {
                 record->m_Promised.push_back(std::this_thread::get_id());
             }

@@ -89,6 +89,8 @@ private:
         /// Threads that were given the document and have not counted themselves in yet.
         std::vector<std::thread::id> m_Promised;
         std::thread::id m_Loader;
+        /// Threads that wait for the load: they are promised the document, so that nobody has to load it again.
+        std::vector<std::thread::id> m_Awaiting;
         std::uint64_t m_Order = 0;
     };
     using RecordPointer = std::shared_ptr<Record>;

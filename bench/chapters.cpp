@@ -1,0 +1,179 @@
+// What a book's chapters cost while it looks at them: one chapter's load, status and release; a pass over a long book;
+// a pass over what the user has open.
+
+#include "commands/AddChapterCommand.h"
+#include "commands/CloseBookCommand.h"
+#include "commands/NewBookCommand.h"
+#include "commands/UpdateChaptersCommand.h"
+#include "core/BookCollection.h"
+#include "framework/document/CloseDocumentCommand.h"
+#include "framework/document/DocumentController.h"
+#include "framework/document/DocumentSettings.h"
+#include "framework/document/OpenDocumentFailedNotification.h"
+#include "framework/document/VantraController.h"
+#include "framework/kernel/Trace.h"
+#include "framework/story/SpecialGlyphs.h"
+#include "framework/story/StoryBuilder.h"
+
+#include <benchmark/benchmark.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+
+using Kernel::Counted;
+using Kernel::MakeCounted;
+
+namespace
+{
+
+namespace fs = std::filesystem;
+
+/// Thirty A5 pages with sixty headings.
+void WriteChapter(String const & path)
+{
+    DocumentSettings settings;
+    settings.m_PageSetup.m_FirstMaster = "Body";
+    settings.m_PageSetup.m_BodyMaster = "Body";
+    MasterPageSettings page;
+    page.m_TextRect = {50, 60, 370, 530};
+    settings.m_Masters.push_back({"Body", page, page});
+    settings.m_Metadata.m_Title = "Chapter";
+    Story::StoryBuilder builder;
+    std::string text = "The quick brown fox jumps over the lazy dog";
+    for (int word = 0; word < 14; ++word) {
+        text += " and the quick brown fox jumps over";
+    }
+    for (int section = 0; section < 60; ++section) {
+        builder.AppendObject(MakeCounted<Story::AnchorGlyph>(MakeCounted<Story::AnchorData>(
+                                 "Section", true, true, "uid-" + std::to_string(section), 1)),
+                             nullptr);
+        builder.AppendText("Section", nullptr);
+        builder.EndParagraph(nullptr);
+        for (int paragraph = 0; paragraph < 3; ++paragraph) {
+            builder.AppendText(text + ".", nullptr);
+            builder.EndParagraph(nullptr);
+        }
+    }
+    Counted<DocumentController> const document = DocumentController::CreateDocument(settings, builder.Finish());
+    DocumentSaveResult result;
+    document->SaveDocument(result, path);
+    if (!result.IsSuccess()) {
+        std::abort();
+    }
+    document->ShutDownArchive();
+}
+
+double PeakMegabytes()
+{
+    std::ifstream status("/proc/self/status");
+    std::string line;
+    while (std::getline(status, line)) {
+        if (line.starts_with("VmHWM:")) {
+            return std::stod(line.substr(6)) / 1024;
+        }
+    }
+    return 0;
+}
+
+/// A book of so many chapters of one kind, in a folder that goes with it.
+class LongBook
+{
+public:
+    explicit LongBook(int chapters)
+    {
+        std::string pattern = (fs::temp_directory_path() / "korvane-bench-XXXXXX").string();
+        m_Folder = mkdtemp(pattern.data());
+        Book::BookCollection::GetInstance().SetUpdatePageNumbersAutomatically(false);
+        auto const command = MakeCounted<Book::NewBookCommand>();
+        VantraController::GetInstance().EnqueueCommand(Counted<VantraCommand>(command));
+        m_Book = command->GetBookController();
+        String const first((m_Folder / "0.kvdoc").string());
+        WriteChapter(first);
+        std::vector<String> paths{first};
+        for (int chapter = 1; chapter < chapters; ++chapter) {
+            paths.emplace_back((m_Folder / (std::to_string(chapter) + ".kvdoc")).string());
+            fs::copy_file(first.ToStd(), paths.back().ToStd());
+        }
+        Book::BookCollection::GetInstance().EnqueueCommandAndWait(
+            MakeCounted<Book::AddChapterCommand>(paths, nullptr), m_Book);
+        Rest();
+    }
+    ~LongBook()
+    {
+        VantraController::GetInstance().EnqueueCommandAndWait(MakeCounted<Book::CloseBookCommand>(m_Book));
+        m_Book->WaitUntilCommandQueueEmpty();
+        Book::BookCollection::GetInstance().RemoveBookController(m_Book);
+        Rest();
+        std::error_code ignored;
+        fs::remove_all(m_Folder, ignored);
+    }
+    LongBook(LongBook const &) = delete;
+    LongBook & operator=(LongBook const &) = delete;
+
+    static void Rest() { VantraController::GetInstance().WaitUntilIdle(); }
+
+    fs::path m_Folder;
+    Counted<Book::BookController> m_Book;
+};
+
+void BM_LoadStatusRelease(benchmark::State & state)
+{
+    LongBook const book(1);
+    Counted<Book::BookChapter> const chapter = book.m_Book->GetChapterAtIndex(0);
+    for (auto _ : state) {
+        // Each round also waits for the close of the one before.
+        book.m_Book->UpdateChapterStatus(chapter, nullptr, false, false);
+    }
+    state.counters["pages"] = chapter->GetPageCount();
+    LongBook::Rest();
+}
+BENCHMARK(BM_LoadStatusRelease)->Unit(benchmark::kMillisecond);
+
+void BM_FullPass(benchmark::State & state)
+{
+    LongBook const book(static_cast<int>(state.range(0)));
+    double const before = PeakMegabytes();
+    std::size_t mostOpen = 0;
+    Kernel::SetTraceTarget([&](String const & line) {
+        if (line.View().starts_with("LoadChapter:")) {
+            mostOpen = std::max(mostOpen, VantraController::GetInstance().GetDocumentControllers().size());
+        }
+    });
+    for (auto _ : state) {
+        book.m_Book->UpdateChapters();
+        LongBook::Rest();
+    }
+    Kernel::SetTraceTarget({});
+    state.counters["open at a load"] = static_cast<double>(mostOpen);
+    state.counters["peak MB"] = PeakMegabytes();
+    state.counters["grown MB"] = PeakMegabytes() - before;
+}
+BENCHMARK(BM_FullPass)->Arg(100)->Arg(1000)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+void BM_ForegroundPass(benchmark::State & state)
+{
+    LongBook const book(10);
+    std::vector<Counted<DocumentController>> open;
+    for (int chapter = 0; chapter < 10; ++chapter) {
+        String const path = book.m_Book->GetChapterAtIndex(chapter)->GetPath();
+        OpenDocumentFailedNotification failure(path, true);
+        open.push_back(VantraController::GetInstance().OpenDocument(path, failure));
+    }
+    LongBook::Rest();
+    for (auto _ : state) {
+        Book::BookCollection::GetInstance().EnqueueCommandAndWait(
+            Counted<Book::BookCommand>(MakeCounted<Book::UpdateChaptersCommand>(true)), book.m_Book);
+    }
+    for (Counted<DocumentController> const & document : open) {
+        VantraController::GetInstance().EnqueueCommandAndWait(
+            MakeCounted<CloseDocumentCommand>(document, nullptr, false, true));
+    }
+    LongBook::Rest();
+}
+BENCHMARK(BM_ForegroundPass)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+}
+
+BENCHMARK_MAIN();
