@@ -55,7 +55,8 @@ public:
     {
         BookFileLock lock;
         std::string problem;
-        if (!lock.Take(m_File, problem)) {
+        // Who only reads may do so beside another program, and in a folder that can't be written.
+        if (Saving::Never != m_Plan.m_Saving && !lock.Take(m_File, problem)) {
             m_Messages.Error("book-locked", {m_File.string()}, problem);
             return;
         }

@@ -53,7 +53,7 @@ enum class Saving
     IfDirty,
     /// Saved in any case: the change is one that a book does not count as unsaved work.
     Always,
-    /// The verb itself has saved, or has only looked.
+    /// This file is only read: what is written, if anything, is another one.
     Never
 };
 

@@ -4,6 +4,7 @@
 #include "framework/kernel/FileSystem.h"
 #include "framework/raster/Picture.h"
 #include "import/SourceText.h"
+#include "import/Text.h"
 
 #include <algorithm>
 #include <cstring>
@@ -52,43 +53,65 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
     std::string const extension = LoweredExtension(picture.m_Path);
     bool const isRemote = std::string::npos != picture.m_Path.find("://");
     if (isRemote) {
-        return {"", 0, 0, "is on the web; save it beside the chapter", "picture-remote"};
+        return {"",
+                0,
+                0,
+                Kernel::LocalisedString("The picture %1 is on the web; save it beside the chapter", "Source"),
+                "picture-remote",
+                {}};
     }
     KnownFile & known = m_Known[path];
     known.m_Stamp = FileStamp::Of(path);
     if (!known.m_Stamp.Exists()) {
-        return {"", 0, 0, "is missing", "picture-missing"};
+        return {"", 0, 0, Kernel::LocalisedString("The picture %1 is missing", "Source"), "picture-missing", {}};
     }
     std::ifstream stream(path, std::ios::binary);
     auto const bytes = std::make_shared<std::vector<unsigned char>>(static_cast<std::size_t>(known.m_Stamp.m_Size));
     stream.read(reinterpret_cast<char *>(bytes->data()), known.m_Stamp.m_Size);
     if (!stream || stream.gcount() != known.m_Stamp.m_Size) {
-        return {"", 0, 0, "cannot be read", "picture-unreadable"};
+        return {"", 0, 0, Kernel::LocalisedString("The picture %1 cannot be read", "Source"), "picture-unreadable", {}};
     }
     known.m_Hash = HashBytes({reinterpret_cast<char const *>(bytes->data()), bytes->size()});
     if (".svg" == extension || ".pdf" == extension) {
-        return {"", 0, 0, "is a drawing in " + extension.substr(1) + ", which cannot be placed yet", "later-picture"};
+        return {"",
+                0,
+                0,
+                Kernel::LocalisedString("The picture %1 is a drawing in %2, which cannot be placed yet", "Source"),
+                "later-picture",
+                extension.substr(1)};
     }
 
     Raster::PictureProblem problem;
     auto const opened = Raster::Picture::FromBytes(bytes, String(picture.m_Path), problem);
     if (!opened) {
         bool const isOtherKind = Raster::PictureProblem::Code::UnknownKind == problem.m_Code;
-        return {"", 0, 0,
-                isOtherKind ? "is neither PNG nor JPEG, whatever its name says"
-                            : "cannot be used (" + problem.m_Text.ToStd() + ")",
-                isOtherKind ? "picture-kind" : "picture-damaged"};
+        if (isOtherKind) {
+            return {"",
+                    0,
+                    0,
+                    Kernel::LocalisedString("The picture %1 is neither PNG nor JPEG, whatever its name says", "Source"),
+                    "picture-kind",
+                    {}};
+        }
+        return {"",
+                0,
+                0,
+                Kernel::LocalisedString("The picture %1 cannot be used (%2)", "Source"),
+                "picture-damaged",
+                problem.m_Text.ToStd()};
     }
     Raster::PictureInfo const & info = opened->GetInfo();
     if (!HasEnd(*bytes, info.m_Kind) && !opened->Decode(problem)) {
-        return {"", 0, 0, "is cut short or damaged", "picture-damaged"};
+        return {
+            "", 0, 0, Kernel::LocalisedString("The picture %1 is cut short or damaged", "Source"), "picture-damaged",
+            {}};
     }
     std::string const promised = ".jpeg" == extension ? ".jpg" : extension;
     std::string const actual = Raster::PictureKind::Png == info.m_Kind ? ".png" : ".jpg";
     if (promised != actual) {
         m_Messages.Warn("picture-kind", {m_ShownName, picture.m_Line},
-                        "The picture " + picture.m_Path + " is a " + (".png" == actual ? "PNG" : "JPEG") +
-                            " under another name; it is set all the same.");
+                        Text("The picture %1 is a %2 under another name; it is set all the same.", "Source",
+                             picture.m_Path, ".png" == actual ? "PNG" : "JPEG"));
     }
 
     DocumentPictures::Entry entry;
@@ -119,11 +142,14 @@ Story::PictureGlyph::Fields PictureLoader::Load(Picture const & picture)
     fields.m_NaturalHeight = loaded.m_Height;
     fields.m_WantedWidth = picture.m_Width;
     fields.m_WantedMeasurePart = picture.m_WidthShare;
-    if (!loaded.m_Problem.empty()) {
-        std::string const sentence = "The picture " + picture.m_Path + " " + loaded.m_Problem;
+    if (!loaded.m_Problem.Empty()) {
         fields.m_IsMissing = true;
-        fields.m_MissingReason = String(sentence + ".");
-        m_Messages.Warn(loaded.m_Kind, {m_ShownName, picture.m_Line}, sentence + "; a marked box stands in its place.");
+        // This goes into the document, which must not depend on who looks at it: the untranslated text.
+        fields.m_MissingReason =
+            Kernel::Format(String(loaded.m_Problem.SourceText()), picture.m_Path, loaded.m_Detail) + ".";
+        m_Messages.Warn(loaded.m_Kind, {m_ShownName, picture.m_Line},
+                        Text("%1; a marked box stands in its place.", "Source",
+                             Kernel::Format(loaded.m_Problem, picture.m_Path, loaded.m_Detail)));
     }
     return fields;
 }

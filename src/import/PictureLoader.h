@@ -1,5 +1,6 @@
 #pragma once
 
+#include "framework/kernel/LocalisedString.h"
 #include "framework/story/PictureGlyph.h"
 #include "import/ChapterText.h"
 #include "import/Message.h"
@@ -31,8 +32,10 @@ private:
         std::string m_DataId;
         double m_Width = 0;
         double m_Height = 0;
-        std::string m_Problem;
+        /// Why the picture can't be shown, with %1 for its path and %2 for the detail; empty if it can.
+        Kernel::LocalisedString m_Problem;
         std::string m_Kind;
+        std::string m_Detail;
     };
 
     [[nodiscard]] Loaded Read(std::string const & path, Picture const & picture);

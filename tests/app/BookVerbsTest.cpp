@@ -257,11 +257,17 @@ TEST_F(BookVerbsTest, ABookThatAnotherProgramHasIsLeftToIt)
     ASSERT_TRUE(lock.Take(m_Folder / "book.kvbook", problem)) << problem;
     std::string const before = Read("book.kvbook");
     for (auto const & arguments : std::vector<std::vector<std::string>>{{"remove", "@book.kvbook", "1"},
-                                                                        {"set", "@book.kvbook", "--links", "no"},
-                                                                        {"save-as", "@book.kvbook", "@x"}}) {
+                                                                        {"set", "@book.kvbook", "--links", "no"}}) {
         auto const outcome = Run(arguments);
         EXPECT_EQ(outcome.m_Code, 1);
         EXPECT_NE(outcome.m_Err.find("process " + std::to_string(getpid())), std::string::npos) << outcome.m_Err;
+    }
+    for (auto const & arguments : std::vector<std::vector<std::string>>{{"status", "@book.kvbook"},
+                                                                        {"set", "@book.kvbook"},
+                                                                        {"save-as", "@book.kvbook", "@x"},
+                                                                        {"package", "@book.kvbook", "@y"}}) {
+        auto const outcome = Run(arguments);
+        EXPECT_EQ(outcome.m_Code, 0) << "reading takes nothing away: " << outcome.m_Err;
     }
     EXPECT_TRUE(Read("book.kvbook") == before);
 }
