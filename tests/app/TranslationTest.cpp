@@ -25,8 +25,8 @@ protected:
 
     Outcome Speak(std::string const & environment, std::string const & arguments) const
     {
-        return Shell("cd '" + m_Folder.string() + "' && env -i HOME=/tmp " + environment +
-                     " '" KORVANE_BINARY_FOLDER "/src/app/korvane' " + arguments);
+        return Shell("cd '" + m_Folder.string() + "' && env -u LC_ALL -u LC_MESSAGES -u LANG -u LANGUAGE " +
+                     environment + " '" KORVANE_BINARY_FOLDER "/src/app/korvane' " + arguments);
     }
 
     Outcome German(std::string const & arguments) const { return Speak("LANG=de_DE.UTF-8", arguments); }
