@@ -59,7 +59,7 @@ std::vector<BookWatch::State> BookWatch::ReadStates() const
 void BookWatch::Begin()
 {
     m_Files = LookAtFiles();
-    m_Session.RefreshChapters();
+    Refresh();
     std::vector<State> const now = ReadStates();
     Tell({}, now);
     m_States = now;
@@ -87,11 +87,12 @@ void BookWatch::Refresh()
         return;
     }
     std::vector<State> const now = ReadStates();
-    bool const isHeld = std::any_of(now.begin(), now.end(), [](State const & state) {
-        return Book::BookChapter::Status::Locked == state.m_Status;
-    });
+    auto const isAny = [&now](Book::BookChapter::Status status) {
+        return std::any_of(now.begin(), now.end(), [status](State const & state) { return state.m_Status == status; });
+    };
+    bool const isChanged = isAny(Book::BookChapter::Status::OutOfDate) || (!m_States.empty() && now != m_States);
     // A chapter that another program has open will be back: the others are not numbered as if it were gone.
-    if (isHeld || now.empty() || now == m_States) {
+    if (!isChanged || isAny(Book::BookChapter::Status::Locked)) {
         return;
     }
     Book::BookCollection::GetInstance().UpdatePageNumbers(m_Session.GetBook(), m_Session.GetChapters().front());
@@ -127,7 +128,7 @@ void BookWatch::TellChapter(std::size_t index, State const * before, State const
         return;
     }
     std::string line = TimeOfDay() + "  " + std::to_string(index + 1) + ". " + chapter->GetName().ToStd() + "  " +
-                       Describe(now.m_Status).m_Text;
+                       Describe(*chapter).m_Text;
     if (!now.m_Pages.empty()) {
         line += "  " + (before && !before->m_Pages.empty() && before->m_Pages != now.m_Pages
                             ? Text("pages %1 (before: %2)", "Program", now.m_Pages, before->m_Pages)

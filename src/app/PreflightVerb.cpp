@@ -61,7 +61,7 @@ void Findings::Add(Book::BookChapter const & chapter, int index)
     if (!results) {
         ++m_Unchecked;
         m_Lines.push_back(title);
-        m_Lines.push_back("  " + Text("not checked: %1", "Program", Describe(chapter.GetStatus()).m_Text));
+        m_Lines.push_back("  " + Text("not checked: %1", "Program", Describe(chapter).m_Text));
     } else if (!results->GetResults().empty()) {
         m_Lines.push_back(title);
         for (PreflightResult const & finding : results->GetResults()) {

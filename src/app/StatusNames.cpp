@@ -2,6 +2,8 @@
 
 #include "import/Text.h"
 
+#include <filesystem>
+
 namespace App
 {
 
@@ -26,9 +28,10 @@ char const * NameOf(Book::BookChapter::Status status)
     return "restricted";
 }
 
-TableCell Describe(Book::BookChapter::Status status)
+TableCell Describe(Book::BookChapter const & chapter)
 {
-    switch (status) {
+    std::error_code error;
+    switch (chapter.GetStatus()) {
     case Book::BookChapter::Status::Ok:
         return {Text("ok", "Chapter state"), CellLook::Good};
     case Book::BookChapter::Status::OpenForEdit:
@@ -36,7 +39,9 @@ TableCell Describe(Book::BookChapter::Status status)
     case Book::BookChapter::Status::Locked:
         return {Text("locked", "Chapter state"), CellLook::Warning};
     case Book::BookChapter::Status::NotFound:
-        return {Text("missing", "Chapter state"), CellLook::Bad};
+        return {std::filesystem::exists(chapter.GetPath().ToStd(), error) ? Text("unusable", "Chapter state")
+                                                                          : Text("missing", "Chapter state"),
+                CellLook::Bad};
     case Book::BookChapter::Status::OutOfDate:
         return {Text("changed", "Chapter state"), CellLook::Warning};
     case Book::BookChapter::Status::Restricted:

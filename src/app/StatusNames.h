@@ -8,7 +8,8 @@ namespace App
 
 /// The names of the statuses in JSON: stable words, not the user's language.
 [[nodiscard]] char const * NameOf(Book::BookChapter::Status status);
-/// The same for people, in a word or two.
-[[nodiscard]] TableCell Describe(Book::BookChapter::Status status);
+/// How the chapter stands, for people, in a word or two. A file that is there and can't be used is another matter than
+/// one that is gone.
+[[nodiscard]] TableCell Describe(Book::BookChapter const & chapter);
 
 }

@@ -16,16 +16,6 @@ using Import::Text;
 namespace
 {
 
-/// A file that is there and can't be used is another matter than one that is gone.
-TableCell DescribeState(Book::BookChapter const & chapter)
-{
-    std::error_code error;
-    bool const isThere = fs::exists(chapter.GetPath().ToStd(), error);
-    return Book::BookChapter::Status::NotFound == chapter.GetStatus() && isThere
-               ? TableCell{Text("unusable", "Chapter state"), CellLook::Bad}
-               : Describe(chapter.GetStatus());
-}
-
 CellLook LookOf(PreflightResult::Status status)
 {
     return PreflightResult::Status::Error == status     ? CellLook::Bad
@@ -55,7 +45,7 @@ std::vector<TableCell> MakeRow(Book::BookChapter const & chapter, int index)
             {chapter.GetName().ToStd(), CellLook::Plain},
             {chapter.DescribePages().ToStd(), CellLook::Plain},
             {0 < pages ? std::to_string(pages) : "", CellLook::Dim},
-            DescribeState(chapter),
+            Describe(chapter),
             {chapter.GetPreflightDescription().ToStd(), LookOf(chapter.GetPreflightStatus())},
             {fs::path(chapter.GetPath().ToStd()).filename().string(), CellLook::Dim}};
 }
