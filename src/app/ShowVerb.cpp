@@ -1,5 +1,6 @@
 #include "app/BookSession.h"
 #include "app/DescribeDocument.h"
+#include "app/PreviewFile.h"
 #include "app/FileKind.h"
 #include "app/VerbList.h"
 #include "core/BookChapter.h"
@@ -79,12 +80,22 @@ std::vector<std::string> Summarise(Json const & json)
     return lines;
 }
 
-int RunShow(VerbContext & context, std::string const & file)
+struct ShowOptions
 {
+    std::string m_File;
+    /// Where the preview goes; empty for nowhere.
+    std::string m_Thumbnail;
+};
+
+int RunShow(VerbContext & context, ShowOptions const & options)
+{
+    std::string const & file = options.m_File;
     Import::MessageList messages;
     Console & console = context.m_Console;
     std::error_code error;
     fs::path const path = fs::absolute(file, error).lexically_normal();
+    fs::path const thumbnail =
+        options.m_Thumbnail.empty() ? fs::path() : fs::absolute(options.m_Thumbnail, error).lexically_normal();
     Json json;
     switch (KindOf(path)) {
     case FileKind::Missing:
@@ -103,6 +114,9 @@ int RunShow(VerbContext & context, std::string const & file)
         BookSession session(console, listener);
         if (session.Open(path.string(), messages)) {
             json = DescribeBook(session, path);
+            if (!thumbnail.empty()) {
+                WriteBookPreview(file, path, thumbnail, messages);
+            }
         }
         messages.Append(listener.TakeMessages());
         break;
@@ -113,6 +127,9 @@ int RunShow(VerbContext & context, std::string const & file)
         if (document->LoadDocument(String(path.string()), false, true, LoadWhole, nullptr, failure, false)) {
             json = DescribeDocument(*document);
             json["path"] = path.string();
+            if (!thumbnail.empty()) {
+                WriteDocumentPreview(file, document, thumbnail, messages);
+            }
         } else {
             std::string const place =
                 failure.GetPlace().Empty() ? std::string() : " (" + failure.GetPlace().ToStd() + ")";
@@ -145,11 +162,12 @@ int RunShow(VerbContext & context, std::string const & file)
 
 void AddShowVerb(VerbList & verbs)
 {
-    auto const file = std::make_shared<std::string>();
+    auto const options = std::make_shared<ShowOptions>();
     CLI::App & verb = verbs.Add("show", Text("Tell what is in a book or document file", "Help"),
                                 "  korvane show my-book/.korvane/chapter1.kvdoc --json",
-                                [file](VerbContext & context) { return RunShow(context, *file); });
-    verb.add_option("FILE", *file, Text("A .kvbook or .kvdoc file", "Help"))->required();
+                                [options](VerbContext & context) { return RunShow(context, *options); });
+    verb.add_option("FILE", options->m_File, Text("A .kvbook or .kvdoc file", "Help"))->required();
+    verb.add_option("--thumbnail", options->m_Thumbnail, Text("Write the preview picture to this PNG file", "Help"));
 }
 
 }
