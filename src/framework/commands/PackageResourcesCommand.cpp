@@ -209,6 +209,11 @@ Kernel::LocalisedString PackageResourcesCommand::GetDescription() const
 
 void PackageResourcesCommand::Do()
 {
+    if (!m_Folder.Empty() && !Kernel::FileSystem::IsFolder(m_Folder)) {
+        m_Problems.push_back(Kernel::Format(
+            Kernel::LocalisedString("The folder \"%1\" does not exist. Make it first.", "Package"), m_Folder));
+        return;
+    }
     PackageManagerInfo info;
     GetDocumentInfo(Self(), info);
     if (m_WantPictures) {

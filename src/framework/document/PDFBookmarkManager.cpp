@@ -1,5 +1,44 @@
 #include "framework/document/PDFBookmarkManager.h"
 
+#include "framework/document/DocumentRecords.h"
+
+Kernel::ClassProperties const PDFBookmarkManager::ms_ClassProperties(
+    Kernel::ClassUID("PdBM"),
+    [] { return Kernel::Counted<Kernel::Serialisable>(Kernel::MakeCounted<PDFBookmarkManager>()); }, 1, {}, nullptr);
+static Kernel::ClassPropertiesBase::Init const s_PDFBookmarkManagerInit(PDFBookmarkManager::GetTypeClassProperties());
+
+Kernel::ClassProperties const & PDFBookmarkManager::GetObjectClassProperties() const
+{
+    return ms_ClassProperties;
+}
+
+Kernel::ClassProperties const & PDFBookmarkManager::GetTypeClassProperties()
+{
+    return ms_ClassProperties;
+}
+
+void PDFBookmarkManager::Save(Kernel::OutSerialiser & out) const
+{
+    std::vector<Kernel::Counted<BookmarkRecord>> records;
+    for (auto const & [uid, data] : m_Data) {
+        records.push_back(Kernel::MakeCounted<BookmarkRecord>());
+        records.back()->m_Data = data;
+    }
+    out.SaveObjects("bkmk", records);
+}
+
+bool PDFBookmarkManager::Load(Kernel::InSerialiser const & in, Kernel::FileStore &, unsigned short)
+{
+    std::vector<Kernel::Counted<BookmarkRecord>> records;
+    in.LoadObjects("bkmk", records);
+    for (Kernel::Counted<BookmarkRecord> const & record : records) {
+        if (record) {
+            Add(record->m_Data);
+        }
+    }
+    return true;
+}
+
 PDFBookmarkManager::PDFBookmarkManager() = default;
 PDFBookmarkManager::~PDFBookmarkManager() = default;
 

@@ -1,13 +1,14 @@
 #pragma once
 
 #include "framework/document/Anchors.h"
+#include "framework/kernel/Serialisable.h"
 
 #include <map>
 
 /// Bookmarks that anchors stand for, known by the anchors' uids: names and order that a book keeps above its chapters.
 ///
 /// Shared between threads once it hangs in a document or book: change a clone and put that in its place.
-class PDFBookmarkManager : public virtual Kernel::Countable
+class PDFBookmarkManager : public Kernel::Serialisable
 {
 public:
     PDFBookmarkManager();
@@ -27,6 +28,14 @@ public:
     [[nodiscard]] std::size_t GetCount() const { return m_Data.size(); }
     [[nodiscard]] std::map<String, Kernel::Counted<Story::AnchorData>> const & GetData() const { return m_Data; }
 
+    void Save(Kernel::OutSerialiser & out) const override;
+    /// A bookmark that makes no sense is left out.
+    bool Load(Kernel::InSerialiser const & in, Kernel::FileStore & store, unsigned short version) override;
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
+    static Kernel::ClassProperties const & GetTypeClassProperties();
+
 private:
+    static Kernel::ClassProperties const ms_ClassProperties;
+
     std::map<String, Kernel::Counted<Story::AnchorData>> m_Data;
 };

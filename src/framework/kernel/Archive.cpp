@@ -13,6 +13,7 @@
 
 #include <cerrno>
 #include <cstring>
+#include <sys/stat.h>
 
 namespace Kernel
 {
@@ -83,20 +84,20 @@ Archive::CreateResult::Code ToCreateCode(File::OpenUnmanagedResult result)
     }
 }
 
-ArchiveFileException::Reason ToReason(FileIOException::Reason reason)
+/// With what the general reasons of files do not tell apart.
+ArchiveFileException FailureOf(Archive const * archive, FileIOException const & exception)
 {
-    switch (reason) {
-    case FileIOException::Reason::AccessDenied:
-        return ArchiveFileException::Reason::AccessDenied;
-    case FileIOException::Reason::PermissionDenied:
-        return ArchiveFileException::Reason::PermissionDenied;
-    case FileIOException::Reason::OutOfSpace:
-        return ArchiveFileException::Reason::OutOfSpace;
-    case FileIOException::Reason::DeviceError:
-        return ArchiveFileException::Reason::DeviceError;
-    default:
-        return ArchiveFileException::Reason::Unknown;
-    }
+    auto const whatFile = exception.IsWriting() ? ArchiveFileException::WhatFile::Written
+                                                : ArchiveFileException::WhatFile::Read;
+    return ArchiveFileException(archive, ArchiveFileException::ReasonFromErrno(exception.GetErrno()), whatFile, nullptr,
+                                exception.GetMessage());
+}
+
+/// A pipe or a device: opening or reading one may never end.
+bool IsSpecialFile(String const & path)
+{
+    struct stat facts;
+    return ::stat(path.c_str(), &facts) == 0 && !S_ISREG(facts.st_mode) && !S_ISDIR(facts.st_mode);
 }
 
 }
@@ -125,7 +126,8 @@ std::optional<IDTag> Archive::IdentifyType(void const * start, std::size_t size)
 std::optional<IDTag> Archive::IdentifyType(String const & path)
 {
     File file;
-    if (file.OpenEx(path.c_str(), "rb", File::ShareMode::Shared, File::VisibilityMode::Normal) !=
+    if (IsSpecialFile(path) ||
+        file.OpenEx(path.c_str(), "rb", File::ShareMode::Shared, File::VisibilityMode::Normal) !=
         File::OpenUnmanagedResult::Success) {
         return std::nullopt;
     }
@@ -139,6 +141,10 @@ std::optional<IDTag> Archive::IdentifyType(String const & path)
 
 Counted<Archive> Archive::Open(String const & path, OpenMode mode, IDTag type, OpenResult & result)
 {
+    if (IsSpecialFile(path)) {
+        result = OpenResult::NotAnArchive;
+        return nullptr;
+    }
     if (mode == OpenMode::ReadUnlocked) {
         auto file = std::make_shared<File>();
         result = ToOpenResult(file->OpenEx(path.c_str(), "rb", File::ShareMode::Shared, File::VisibilityMode::Normal));
@@ -199,6 +205,17 @@ Counted<Archive> Archive::CreateWithTemporary(String const & path, IDTag type, C
 Counted<Archive> Archive::CreateWithTemporary(String const & path, IDTag type, CreateResult & result,
                                               FileLock * ownLock)
 {
+    if (Path::GetFileName(path).Empty()) {
+        result.m_Code = CreateResult::IsFolder;
+        result.m_Text = path.Empty() ? String(LocalisedString("There is no name to save under. Choose one.", "File"))
+                                     : File::GetResultText(File::OpenUnmanagedResult::IsFolder, path);
+        return nullptr;
+    }
+    if (IsSpecialFile(path)) {
+        result.m_Code = CreateResult::AccessDenied;
+        result.m_Text = Format(LocalisedString("%1 is a device or a pipe, not a file. Choose another name.", "File"), path);
+        return nullptr;
+    }
     File::OpenUnmanagedResult opened{};
     auto file = ReplacementFile::Create(path, File::ShareMode::RespectLocks, ownLock, opened);
     if (!file) {
@@ -240,8 +257,7 @@ Counted<RawData const> Archive::ReadItem(String const & name) const
     try {
         return m_Reader->Read(name, *item);
     } catch (FileIOException const & exception) {
-        throw ArchiveFileException(this, ToReason(exception.GetReason()), ArchiveFileException::WhatFile::Read, nullptr,
-                                   exception.GetMessage());
+        throw FailureOf(this, exception);
     }
 }
 
@@ -258,7 +274,7 @@ bool Archive::LoadFile(String const & name, FileStoreItem & item)
 Archive::SessionResult Archive::CreateSessionAdv(ArchiveSessionHandle & handle, SessionType, bool const * abort,
                                                  bool verify)
 {
-    if (!m_Writer || m_Writer->m_HadSession) {
+    if (!m_Writer || m_Writer->m_HadSession || !m_Writer->m_File->IsInPlace()) {
         return SessionResult::NotWritable;
     }
     m_Writer->m_HadSession = true;
@@ -289,8 +305,7 @@ void Archive::CloseSession(ArchiveSessionHandle & handle, bool discard)
         m_Lock = writer->m_File->TakeLock();
         FileSystem::GetModifiedTime(m_Path, m_ModifiedTime);
     } catch (FileIOException const & exception) {
-        throw ArchiveFileException(this, ToReason(exception.GetReason()), ArchiveFileException::WhatFile::Written,
-                                   nullptr, exception.GetMessage());
+        throw FailureOf(this, exception);
     }
 }
 

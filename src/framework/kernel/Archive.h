@@ -93,7 +93,7 @@ public:
     enum class SessionResult
     {
         Success = 0,
-        /// The archive was opened for reading, or has had its session.
+        /// The archive was opened for reading, or has had its session, or somebody has taken its new file away.
         NotWritable = 1,
     };
 

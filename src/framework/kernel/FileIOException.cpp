@@ -39,7 +39,8 @@ FileIOException FileIOException::FromErrno(int errorNumber, String const & path,
     return FileIOException(ToReason(errorNumber, writing), path,
                            Format(writing ? LocalisedString("Cannot write to %1: %2.", "File")
                                           : LocalisedString("Cannot read %1: %2.", "File"),
-                                  path, text));
+                                  path, text),
+                           errorNumber, writing);
 }
 
 }

@@ -21,9 +21,7 @@ public:
     };
 
     FileIOException(Reason reason, String path, String message)
-        : Exception(std::move(message)),
-          m_Reason(reason),
-          m_Path(std::move(path))
+        : FileIOException(reason, std::move(path), std::move(message), 0, reason != Reason::ReadFailed)
     {
     }
 
@@ -32,8 +30,23 @@ public:
 
     [[nodiscard]] Reason GetReason() const { return m_Reason; }
     [[nodiscard]] String const & GetPath() const { return m_Path; }
+    /// The system's own number, for those who tell more reasons apart; 0 if it gave none.
+    [[nodiscard]] int GetErrno() const { return m_Errno; }
+    /// It failed while writing, and not while reading.
+    [[nodiscard]] bool IsWriting() const { return m_Writing; }
 
 private:
+    FileIOException(Reason reason, String path, String message, int errorNumber, bool writing)
+        : Exception(std::move(message)),
+          m_Errno(errorNumber),
+          m_Writing(writing),
+          m_Reason(reason),
+          m_Path(std::move(path))
+    {
+    }
+
+    int m_Errno;
+    bool m_Writing;
     Reason m_Reason;
     String m_Path;
 };

@@ -9,6 +9,7 @@
 #include <atomic>
 #include <cerrno>
 #include <cstring>
+#include <dirent.h>
 #include <string>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -31,24 +32,50 @@ std::string PrefixOf(String const & target)
     return "." + Path::GetFileName(target).ToStd().substr(0, 180) + "-";
 }
 
+/// What stands between prefix and suffix: two numbers. Anything else belongs to another target.
+bool IsNumberPair(std::string_view text)
+{
+    std::size_t const dash = text.find('-');
+    return dash != std::string_view::npos && dash != 0 && dash + 1 < text.size() &&
+           text.find_first_not_of("0123456789", dash + 1) == std::string_view::npos &&
+           text.substr(0, dash).find_first_not_of("0123456789") == std::string_view::npos;
+}
+
 /// Removes what programs that were killed have left beside the target. One that is still being written is locked.
 void RemoveLeftovers(String const & target)
 {
     std::string const prefix = PrefixOf(target);
-    std::vector<String> names;
-    if (!FileSystem::ListFolder(Path::GetFolder(target), names)) {
-        return;
-    }
-    for (String const & name : names) {
-        if (!name.View().starts_with(prefix) || !name.View().ends_with(Suffix)) {
+    String const folder = Path::GetFolderWithSeparator(target);
+    // Read directly: the folder may hold thousands of files, of which none is of interest.
+    std::unique_ptr<DIR, int (*)(DIR *)> const listing(::opendir(folder.Empty() ? "." : folder.c_str()), &::closedir);
+    while (dirent const * const entry = listing ? ::readdir(listing.get()) : nullptr) {
+        std::string_view const name(entry->d_name);
+        if (name.size() <= prefix.size() + Suffix.size() || !name.starts_with(prefix) || !name.ends_with(Suffix) ||
+            !IsNumberPair(name.substr(prefix.size(), name.size() - prefix.size() - Suffix.size()))) {
             continue;
         }
-        String const path = Path::GetFolderWithSeparator(target) + name;
+        String const path = folder + String(name);
         FileLock::Result result{};
-        if (FileLock::Acquire(path, FileLock::Kind::Exclusive, result)) {
+        if (Counted<FileLock> const lock = FileLock::Acquire(path, FileLock::Kind::Exclusive, result);
+            lock && lock->GetKind() == FileLock::Kind::Exclusive &&
+            DiskFault::Ask(DiskOperation::Delete, path.c_str()) == 0) {
             ::unlink(path.c_str());
         }
     }
+}
+
+/// So that a file stays its owner's when somebody else who may do so saves it.
+void TakeOwnerAndPermissions(String const & target, int descriptor)
+{
+    struct stat facts;
+    if (::stat(target.c_str(), &facts) != 0) {
+        return;
+    }
+    if (::fchown(descriptor, facts.st_uid, facts.st_gid) != 0) {
+        // Only some may give files away: then the new one is the saver's own.
+        static_cast<void>(errno);
+    }
+    ::fchmod(descriptor, facts.st_mode & 07777);
 }
 
 /// Why the target may not be replaced, or Success.
@@ -95,27 +122,28 @@ std::unique_ptr<ReplacementFile> ReplacementFile::Create(String const & target, 
     if (result != OpenResult::Success) {
         return nullptr;
     }
-    RemoveLeftovers(replacement->m_Target);
-    do {
+    for (;;) {
         replacement->m_Path = Path::GetFolderWithSeparator(replacement->m_Target) + PrefixOf(replacement->m_Target) +
                               std::to_string(::getpid()) + "-" + std::to_string(++s_Counter) + std::string(Suffix);
-    } while (FileSystem::Exists(replacement->m_Path));
-    replacement->m_File = std::make_shared<File>();
-    result = replacement->m_File->OpenEx(replacement->m_Path.c_str(), "w+bx", File::ShareMode::Shared,
-                                         File::VisibilityMode::Normal);
-    if (result != OpenResult::Success) {
-        replacement->m_Path = String();
-        return nullptr;
+        if (FileSystem::Exists(replacement->m_Path)) {
+            continue;
+        }
+        replacement->m_File = std::make_shared<File>();
+        result = replacement->m_File->OpenEx(replacement->m_Path.c_str(), "w+bx", File::ShareMode::Shared,
+                                             File::VisibilityMode::Normal);
+        if (result != OpenResult::Success) {
+            replacement->m_Path = String();
+            return nullptr;
+        }
+        replacement->m_Lock = FileLock::AcquireOn(replacement->m_File, FileLock::Kind::Exclusive);
+        if (replacement->IsInPlace()) {
+            break;
+        }
+        // Somebody who clears away leftovers came between making and locking it: it is his, take another name.
+        replacement->m_Lock = nullptr;
     }
-    replacement->m_Lock = FileLock::AcquireOn(replacement->m_File, FileLock::Kind::Exclusive);
-    if (!replacement->m_Lock) {
-        result = OpenResult::LockViolation;
-        return nullptr;
-    }
-    struct stat facts;
-    if (::stat(replacement->m_Target.c_str(), &facts) == 0) {
-        ::fchmod(replacement->m_File->GetDescriptor(), facts.st_mode & 07777);
-    }
+    TakeOwnerAndPermissions(replacement->m_Target, replacement->m_File->GetDescriptor());
+    RemoveLeftovers(replacement->m_Target);
     return replacement;
 }
 
@@ -139,7 +167,13 @@ bool ReplacementFile::EqualsTarget() const
     std::vector<char> others(BlockSize);
     for (std::uint64_t at = 0;; at += BlockSize) {
         std::size_t const got = m_File->ReadAt(at, mine.data(), BlockSize);
-        if (target.ReadAt(at, others.data(), BlockSize) != got || std::memcmp(mine.data(), others.data(), got) != 0) {
+        try {
+            if (target.ReadAt(at, others.data(), BlockSize) != got ||
+                std::memcmp(mine.data(), others.data(), got) != 0) {
+                return false;
+            }
+        } catch (FileIOException const &) {
+            // A target that can't be read any more is all the more to be replaced.
             return false;
         }
         if (got < BlockSize) {

@@ -13,7 +13,7 @@ namespace Kernel
 /// next one that writes there removes.
 ///
 /// The new file is locked exclusively from its creation on, before it has the target's name. It gets the target's
-/// permissions. A target that is a link stays one: the file it points at is replaced.
+/// owner, as far as the system allows it, and permissions. A target that is a link stays one: the file it points at is replaced.
 class ReplacementFile
 {
 public:
@@ -37,6 +37,8 @@ public:
     /// For writing, and for reading back.
     [[nodiscard]] File & GetFile() { return *m_File; }
     [[nodiscard]] String const & GetTarget() const { return m_Target; }
+    /// Nobody has taken the file away or put another in its place.
+    [[nodiscard]] bool IsInPlace() const { return m_Lock && m_Lock->IsFor(m_Path); }
 
     /// Compares with the target if `keepIfEqual`; flushes, gives the file a modification time above the target's,
     /// renames and flushes the folder. Throws `FileIOException`; the target is untouched then. A failure to flush the
