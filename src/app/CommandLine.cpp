@@ -50,6 +50,8 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     AddBuildVerb(verbs);
     AddImportVerb(verbs);
     AddExportVerb(verbs);
+    AddPrintVerb(verbs);
+    AddPlanVerb(verbs);
     AddNewVerb(verbs);
     AddAddVerb(verbs);
     AddRemoveVerb(verbs);

@@ -35,6 +35,10 @@ void AddBuildVerb(VerbList & verbs);
 void AddImportVerb(VerbList & verbs);
 /// Writes a book into a PDF.
 void AddExportVerb(VerbList & verbs);
+/// Lays a book's pages on sheets of paper.
+void AddPrintVerb(VerbList & verbs);
+/// Tells where each page of a book lands.
+void AddPlanVerb(VerbList & verbs);
 /// Makes a book.
 void AddNewVerb(VerbList & verbs);
 /// Shape a book's chapter list.

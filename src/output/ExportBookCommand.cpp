@@ -21,6 +21,7 @@
 #include "framework/render/PdfExport.h"
 #include "framework/render/PrintersMarks.h"
 #include "framework/render/Schema.h"
+#include "output/BookLockSession.h"
 #include "output/ExportBookCompleteNotification.h"
 #include "output/ExportErrorHandler.h"
 #include "output/ExportPdfWalk.h"
@@ -30,22 +31,6 @@ namespace Book
 
 namespace
 {
-
-/// Holds the user's open chapters still for as long as it lives.
-class BookLockSession
-{
-public:
-    explicit BookLockSession(Kernel::Counted<BookController> book) : m_Book(std::move(book))
-    {
-        m_Book->EngageBookLock(true);
-    }
-    ~BookLockSession() { m_Book->EngageBookLock(false); }
-    BookLockSession(BookLockSession const &) = delete;
-    BookLockSession & operator=(BookLockSession const &) = delete;
-
-private:
-    Kernel::Counted<BookController> m_Book;
-};
 
 /// What it means for the user that the target could not be opened.
 ExportResult ResultOf(Kernel::File::OpenUnmanagedResult result)

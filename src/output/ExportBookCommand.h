@@ -79,7 +79,9 @@ public:
     ProgressType GetProgressType() override;
     bool * GetProgressAbortPointer() const override;
 
-    // The plan. Each step reads only chapter records.
+    // The plan. Each step reads only chapter records, so who wants nothing but the plan can take these steps anywhere.
+    /// What becomes of single pages where two chapters meet: blanks, or sharing a spread. `Do` takes it from the book.
+    void SetStrayHandling(bool pad, bool merge);
     void BuildExportMap();
     void BuildPageMaps();
     void CollateAnchors(Kernel::Counted<BookChapter const> chapter);
@@ -117,9 +119,6 @@ public:
 
 protected:
     ExportBookCommand();
-
-    /// What becomes of single pages where two chapters meet: blanks, or sharing a spread. `Do` takes it from the book.
-    void SetStrayHandling(bool pad, bool merge);
 
     /// Puts the XMP metadata of the key chapter into the finished file at `path`, in place of what it has. Success without
     /// doing anything if the options don't ask for metadata.

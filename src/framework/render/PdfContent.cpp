@@ -3,6 +3,7 @@
 #include "framework/kernel/Assert.h"
 #include "framework/kernel/Utf.h"
 #include "framework/raster/ColourTransform.h"
+#include "framework/render/PdfExport.h"
 
 #include <cmath>
 
@@ -42,7 +43,7 @@ PdfContent::PdfContent(Schema const & schema, PdfResources & resources, FormStor
 {
 }
 
-std::string PdfContent::Write(std::initializer_list<DisplayList const *> lists,
+std::string PdfContent::Write(std::vector<PlacedForm> const & forms, std::initializer_list<DisplayList const *> lists,
                               Raster::AffineTransform::Params const & toPage, PdfUses & uses)
 {
     KORVANE_ASSERT_MESSAGE(toPage.a == 1 && toPage.b == 0 && toPage.c == 0 && toPage.d == -1,
@@ -54,12 +55,28 @@ std::string PdfContent::Write(std::initializer_list<DisplayList const *> lists,
     m_State = GraphicsState();
     m_ForbiddenFonts.clear();
     m_HadMissingGlyph = false;
+    // First, while colours and line styles are those that every content stream begins with: a form has them from here.
+    for (PlacedForm const & form : forms) {
+        Place(form);
+    }
     for (DisplayList const * list : lists) {
         WriteList(*list);
     }
     EndText();
     uses = m_Uses;
     return std::move(m_Text);
+}
+
+void PdfContent::Place(PlacedForm const & form)
+{
+    m_Text += "q\n";
+    AppendPath(Path::Rectangle(form.m_Clip));
+    m_Text += "W n\n";
+    AppendMatrix(m_Text, ToForm.Inverse().Then(form.m_Transform).Then(m_ToPage));
+    m_Text += "cm/X";
+    AppendInteger(m_Text, static_cast<std::uint32_t>(form.m_Form) + 1);
+    m_Text += " Do\nQ\n";
+    m_Uses.m_Forms.insert(static_cast<std::uint32_t>(form.m_Form));
 }
 
 void PdfContent::WriteList(DisplayList const & list)

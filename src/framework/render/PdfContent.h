@@ -13,6 +13,8 @@
 namespace Renderer::RenderTree
 {
 
+struct PlacedForm;
+
 /// Turns display lists into content streams (ISO 32000-2, 7.8.2). One object serves all pages of a file, one after the
 /// other.
 class PdfContent
@@ -26,9 +28,13 @@ public:
 
     PdfContent(Schema const & schema, PdfResources & resources, FormStore storeForm, ImageSource images);
 
-    /// The content stream of a page that shows these lists, one over the other. `toPage` goes from the list's coordinates
-    /// to PDF's, y up. What it uses is in `uses`.
-    [[nodiscard]] std::string Write(std::initializer_list<DisplayList const *> lists,
+    /// From the coordinates of a form's list to those of its content stream.
+    static constexpr Raster::AffineTransform::Params ToForm{1, 0, 0, -1, 0, 0};
+
+    /// The content stream of a page that shows these forms, and these lists one over the other. `toPage` goes from the
+    /// list's coordinates to PDF's, y up. What it uses is in `uses`.
+    [[nodiscard]] std::string Write(std::vector<PlacedForm> const & forms,
+                                    std::initializer_list<DisplayList const *> lists,
                                     Raster::AffineTransform::Params const & toPage, PdfUses & uses);
 
     /// Fonts of the last page whose licence forbids embedding, each once a page.
@@ -63,6 +69,7 @@ private:
         GraphicsState m_OuterState;
     };
 
+    void Place(PlacedForm const & form);
     void WriteList(DisplayList const & list);
     void BeginGroup(Group const & group);
     void EndGroup();

@@ -133,12 +133,18 @@ public:
 
     void AddLink(PdfHyperlink const & link, Raster::AffineTransform::Params const & toPage);
     void Warn(std::vector<Warning> * warnings, Warning::Code code, String const & path, String const & text);
+    /// Tells of fonts and characters of the content that was written last.
+    void WarnOfContent(std::vector<Warning> * warnings);
+    /// Packs a content stream on the thread beside; `range` says where it has gone to, and stays where it is.
+    void Pack(std::string text, SpillRange & range);
 
     Kernel::Counted<PdfSchema> m_Schema;
     Kernel::Counted<Kernel::OutStream> m_Stream;
     String m_Filename;
     String m_Error;
     bool m_Closed = false;
+    /// Forms for sheets so far, for warnings.
+    int m_FormPages = 0;
     PdfFile m_File;
     PdfSpill m_Spill;
     PdfCompressor::Deflater m_Deflater;
@@ -171,12 +177,34 @@ void PdfExport::State::AddLink(PdfHyperlink const & link, Raster::AffineTransfor
     m_File.m_Links.push_back(record);
 }
 
+void PdfExport::State::WarnOfContent(std::vector<Warning> * warnings)
+{
+    for (Typeset::FontFace const * face : m_Content.GetForbiddenFonts()) {
+        Warn(warnings, Warning::Code::FontNotEmbeddable, face->GetPath(),
+                   Kernel::ConcatString({"The licence of the font ", face->GetPostScriptName().View(),
+                                         " forbids embedding it; its text is drawn as outlines."}));
+    }
+    if (m_Content.HadMissingGlyph()) {
+        Warn(warnings, Warning::Code::GlyphMissing, String(),
+                   "The page has a character that no installed font contains.");
+    }
+}
+
 void PdfExport::State::Warn(std::vector<Warning> * warnings, Warning::Code code, String const & path,
                             String const & text)
 {
     if (warnings) {
         warnings->push_back({code, static_cast<int>(m_File.m_Pages.size()) + 1, path, text});
     }
+}
+
+void PdfExport::State::Pack(std::string text, SpillRange & range)
+{
+    std::size_t const size = text.size();
+    m_Compressor.Add(size, [&spill = m_Spill, &range, text = std::move(text)](PdfCompressor::Deflater & deflater) {
+        std::string_view const packed = deflater.Compress(text, PdfCompressor::Deflater::Effort::Quick);
+        range = spill.Append(packed.data(), packed.size());
+    });
 }
 
 PdfExport::PdfExport(Kernel::Counted<PdfSchema> schema, Kernel::Counted<Kernel::UnitValueConverter const>)
@@ -219,6 +247,32 @@ PdfSchema const & PdfExport::GetSchema() const
     return *m_State->m_Schema;
 }
 
+int PdfExport::AddForm(DisplayList const & content, Kernel::Rect const & bounds, std::vector<Warning> * warnings)
+{
+    State & state = *m_State;
+    if (!state.IsUsable() || state.m_Schema->IsAborted()) {
+        return -1;
+    }
+    KORVANE_ASSERT(!bounds.IsEmpty());
+    try {
+        PdfResources & resources = state.m_File.m_Resources;
+        state.m_Pictures.BeginPage(++state.m_FormPages, warnings);
+        PdfUses uses;
+        std::string text = state.m_Content.Write({}, {&content}, PdfContent::ToForm, uses);
+        state.WarnOfContent(warnings);
+        PdfForm form;
+        form.m_Bounds = Mapped(bounds, PdfContent::ToForm);
+        form.m_IsGroup = false;
+        form.m_Uses = resources.AddUses(uses);
+        std::uint32_t const number = resources.AddForm(form);
+        state.Pack(std::move(text), resources.GetForm(number).m_Data);
+        return static_cast<int>(number);
+    } catch (std::exception const & exception) {
+        state.Fail(exception.what());
+    }
+    return -1;
+}
+
 bool PdfExport::WritePage(PdfPage const & page, DisplayList const & content, std::vector<PdfHyperlink> const & links,
                           std::vector<Warning> * warnings)
 {
@@ -243,16 +297,8 @@ bool PdfExport::WritePage(PdfPage const & page, DisplayList const & content, std
             DrawPrintersMarks(*page.m_PrintersMarks, page.m_Boxes.GetTrim(), marks);
         }
         PdfUses uses;
-        std::string text = state.m_Content.Write({&marks, &content}, toPage, uses);
-        for (Typeset::FontFace const * face : state.m_Content.GetForbiddenFonts()) {
-            state.Warn(warnings, Warning::Code::FontNotEmbeddable, face->GetPath(),
-                       Kernel::ConcatString({"The licence of the font ", face->GetPostScriptName().View(),
-                                             " forbids embedding it; its text is drawn as outlines."}));
-        }
-        if (state.m_Content.HadMissingGlyph()) {
-            state.Warn(warnings, Warning::Code::GlyphMissing, String(),
-                       "The page has a character that no installed font contains.");
-        }
+        std::string text = state.m_Content.Write(page.m_Forms, {&marks, &content}, toPage, uses);
+        state.WarnOfContent(warnings);
 
         PdfPageRecord record;
         record.m_Uses = state.m_File.m_Resources.AddUses(uses);
@@ -266,12 +312,7 @@ bool PdfExport::WritePage(PdfPage const & page, DisplayList const & content, std
         }
         record.m_LinkCount = static_cast<std::uint32_t>(state.m_File.m_Links.size()) - record.m_FirstLink;
         state.m_File.m_Pages.push_back(record);
-        std::size_t const size = text.size();
-        state.m_Compressor.Add(size, [&spill = state.m_Spill, &range = state.m_File.m_Pages.back().m_Content,
-                                      text = std::move(text)](PdfCompressor::Deflater & deflater) {
-            std::string_view const packed = deflater.Compress(text, PdfCompressor::Deflater::Effort::Quick);
-            range = spill.Append(packed.data(), packed.size());
-        });
+        state.Pack(std::move(text), state.m_File.m_Pages.back().m_Content);
     } catch (std::exception const & exception) {
         state.Fail(exception.what());
     }

@@ -23,6 +23,16 @@ class OutStream;
 namespace Renderer::RenderTree
 {
 
+/// What `PdfExport::AddForm` keeps, placed on a page.
+struct PlacedForm
+{
+    int m_Form = -1;
+    /// From the coordinates of the form's list to those of the page.
+    Raster::AffineTransform::Params m_Transform;
+    /// What of it shows, in coordinates of the page.
+    Kernel::Rect m_Clip;
+};
+
 /// Frame of one page that is written.
 struct PdfPage
 {
@@ -40,6 +50,8 @@ struct PdfPage
         Below
     };
     Continues m_ContinuesSpread = Continues::Nothing;
+    /// Drawn beneath the page's own content, in this order.
+    std::vector<PlacedForm> m_Forms;
 };
 
 /// Writes one PDF file (ISO 32000-2) page by page: `Create`, `WritePage` for each page in order, `AddBookmarks`, `Close`.
@@ -69,6 +81,12 @@ public:
     /// The name given to `Create`.
     [[nodiscard]] String const & GetFilename() const;
     [[nodiscard]] PdfSchema const & GetSchema() const;
+
+    /// Keeps what a list draws within `bounds`, for pages that come later to show it, any number of times: its content,
+    /// fonts and pictures are in the file once. The form's number; -1 if the export has failed or was aborted.
+    /// `warnings` may be null.
+    [[nodiscard]] int AddForm(DisplayList const & content, Kernel::Rect const & bounds,
+                              std::vector<Warning> * warnings);
 
     /// Appends a page; the first has number 1. Links may lead to pages that come later. False if the export has failed
     /// or was aborted. `warnings` may be null.

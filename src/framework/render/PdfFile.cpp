@@ -110,15 +110,17 @@ private:
     void MakeUses()
     {
         std::vector<PdfUses const *> const & uses = m_File.m_Resources.GetUses();
-        std::vector<PdfForm> const & forms = m_File.m_Resources.GetForms();
+        std::deque<PdfForm> const & forms = m_File.m_Resources.GetForms();
         m_Uses.assign(uses.size(), Handle());
         for (PdfForm const & form : forms) {
             Handle stream = SpilledStream(form.m_Data, "/FlateDecode");
             Handle dictionary = stream.getDict();
             dictionary.replaceKey("/Type", Name("/XObject"));
             dictionary.replaceKey("/Subtype", Name("/Form"));
-            dictionary.replaceKey("/BBox", Box({-16000, 16000, 16000, -16000}));
-            dictionary.replaceKey("/Group", TransparencyGroup());
+            dictionary.replaceKey("/BBox", Box(form.m_Bounds));
+            if (form.m_IsGroup) {
+                dictionary.replaceKey("/Group", TransparencyGroup());
+            }
             dictionary.replaceKey("/Resources", UsesAt(form.m_Uses));
             m_Forms.push_back(stream);
         }
@@ -178,7 +180,11 @@ private:
 
     [[nodiscard]] bool HasTransparency(PdfUses const & uses) const
     {
-        bool transparent = !uses.m_Forms.empty() || !uses.m_Opacities.empty();
+        bool transparent = !uses.m_Opacities.empty();
+        for (std::uint32_t const number : uses.m_Forms) {
+            PdfForm const & form = m_File.m_Resources.GetForms()[number];
+            transparent = transparent || form.m_IsGroup || HasTransparency(*m_File.m_Resources.GetUses()[form.m_Uses]);
+        }
         for (std::uint32_t const image : uses.m_Images) {
             transparent = transparent || m_File.m_Resources.GetImages()[image].m_SoftMask != 0;
         }

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <deque>
 #include <map>
 #include <memory>
 #include <set>
@@ -7,6 +8,7 @@
 #include <unordered_map>
 #include <vector>
 
+#include "framework/kernel/Geometry.h"
 #include "framework/raster/ICCProfile.h"
 #include "framework/render/PdfFont.h"
 #include "framework/render/PdfSpill.h"
@@ -43,9 +45,13 @@ struct PdfImage
     std::uint32_t m_SoftMask = 0;
 };
 
-/// A group drawn as one picture: a form XObject.
+/// A form XObject: a group drawn as one picture, or a page that sheets show.
 struct PdfForm
 {
+    /// Extent in its own coordinates, y up: top is the greater number.
+    Kernel::Rect m_Bounds{-16000, 16000, 16000, -16000};
+    /// Composed by itself before it goes on what lies beneath.
+    bool m_IsGroup = true;
     SpillRange m_Data;
     std::uint32_t m_Uses = 0;
 };
@@ -62,7 +68,9 @@ public:
     [[nodiscard]] std::vector<PdfImage> const & GetImages() const { return m_Images; }
 
     std::uint32_t AddForm(PdfForm form);
-    [[nodiscard]] std::vector<PdfForm> const & GetForms() const { return m_Forms; }
+    [[nodiscard]] std::deque<PdfForm> const & GetForms() const { return m_Forms; }
+    /// Its address stays: a thread beside writes where its content lies.
+    [[nodiscard]] PdfForm & GetForm(std::uint32_t number) { return m_Forms[number]; }
 
     /// The number of a profile; equal ones get one number.
     std::uint32_t AddProfile(Kernel::Consolidated<Raster::ICCProfile> const & profile);
@@ -76,7 +84,7 @@ private:
     std::vector<std::unique_ptr<PdfFont>> m_Fonts;
     std::unordered_map<Typeset::FontFace const *, std::uint32_t> m_FontNumbers;
     std::vector<PdfImage> m_Images;
-    std::vector<PdfForm> m_Forms;
+    std::deque<PdfForm> m_Forms;
     std::vector<Kernel::Consolidated<Raster::ICCProfile>> m_Profiles;
     std::map<PdfUses, std::uint32_t> m_UseNumbers;
     std::vector<PdfUses const *> m_Uses;
