@@ -38,9 +38,11 @@ constexpr Paper Papers[] = {
     {"b6", 125, 176, PointsOfMillimetre},  {"letter", 8.5, 11, PointsOfInch},     {"legal", 8.5, 14, PointsOfInch},
     {"tabloid", 11, 17, PointsOfInch},     {"executive", 7.25, 10.5, PointsOfInch}};
 
+/// In small letters and without spaces.
 std::string Lowered(std::string_view text)
 {
     std::string lowered(text);
+    std::erase(lowered, ' ');
     for (char & c : lowered) {
         c = 'A' <= c && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
     }
@@ -56,9 +58,6 @@ std::optional<double> ReadNumber(std::string_view text, std::string_view & behin
         return std::nullopt;
     }
     behind = text.substr(static_cast<std::size_t>(read.ptr - text.data()));
-    while (!behind.empty() && behind.front() == ' ') {
-        behind.remove_prefix(1);
-    }
     return number;
 }
 

@@ -92,15 +92,60 @@ Kernel::Size LargestPage(ChapterList const & chapters, bool includeBleed)
     return largest;
 }
 
+/// Tiles of pages that are enlarged or reduced: cut in the size that they have on paper, and told in their own.
+class EnlargedTiles final : public Book::Paginator
+{
+public:
+    EnlargedTiles(double overlap, double scale) : m_Tiles(overlap), m_Scale(scale) {}
+
+    using Book::Paginator::Paginate;
+    std::vector<Book::PaginatorPage> Paginate(Kernel::Rect paper, std::vector<Book::PaginatorSource> & sources,
+                                              std::vector<int> & pageIndices, Renderer::FitTypeEnum fit,
+                                              Renderer::OrientationEnum orientation, double,
+                                              bool includeBleed) const override
+    {
+        std::vector<Book::PaginatorSource> enlarged = sources;
+        for (Book::PaginatorSource & source : enlarged) {
+            source.m_PageRect = Times(source.m_PageRect, m_Scale);
+            source.m_PageBox = Times(source.m_PageBox, m_Scale);
+        }
+        std::vector<Book::PaginatorPage> sheets =
+            m_Tiles.Paginate(paper, enlarged, pageIndices, fit, orientation, 1, includeBleed);
+        for (Book::PaginatorPage & sheet : sheets) {
+            for (Book::PaginatorTarget & target : sheet.m_Targets) {
+                target.m_PageRect = Times(target.m_PageRect, 1 / m_Scale);
+                target.m_PageBox = Times(target.m_PageBox, 1 / m_Scale);
+                target.m_BleedRect = Times(target.m_BleedRect, 1 / m_Scale);
+                target.m_Transform = Raster::AffineTransform::Params::Scale(m_Scale, m_Scale).Then(target.m_Transform);
+            }
+        }
+        return sheets;
+    }
+
+private:
+    static Kernel::Rect Times(Kernel::Rect const & rect, double factor)
+    {
+        return rect.IsEmpty()
+                   ? rect
+                   : Kernel::Rect{rect.left * factor, rect.top * factor, rect.right * factor, rect.bottom * factor};
+    }
+
+    Book::PaginatorTiled m_Tiles;
+    double m_Scale;
+};
+
 /// A grid whose margins and gaps have their size on paper. The paginator knows them in the size of the pages, so they
 /// are divided by the scale that fits the cells into what they leave of the paper.
 Kernel::Counted<Book::Paginator> MakeGrid(PrintLayout const & layout, ChapterList const & chapters,
                                           Renderer::OrientationEnum & orientation, Import::MessageList & messages)
 {
-    double const room = layout.m_Marks && layout.m_Paper ? Book::PrintSheet::MarksRoom : 0;
-    Kernel::Size const margins = layout.m_Margins.value_or(Kernel::Size{room, room});
-    double scale = layout.m_Scale.value_or(1);
+    Kernel::Size const page = LargestPage(chapters, false);
     Kernel::Size const cell = LargestPage(chapters, layout.m_IncludeBleed);
+    // The first cells' bleed and marks lie in the margins.
+    double const room = layout.m_Marks && layout.m_Paper ? Book::PrintSheet::MarksRoom : 0;
+    Kernel::Size const margins = layout.m_Margins.value_or(
+        Kernel::Size{room + (cell.width - page.width) / 2, room + (cell.height - page.height) / 2});
+    double scale = layout.m_Scale.value_or(1);
     double const cellsX = layout.m_Columns * cell.width;
     double const cellsY = layout.m_Rows * cell.height;
     if (FitOf(layout) != Renderer::FitTypeScale && cellsX > 0 && cellsY > 0) {
@@ -158,21 +203,15 @@ std::vector<Book::PaginatorPage> LaySheets(BookSession const & session, PrintLay
     }
 
     Kernel::Size const paper = layout.m_Paper.value_or(Kernel::Size{});
-    Kernel::Rect sheet{0, 0, std::min(paper.width, paper.height), std::max(paper.width, paper.height)};
+    Kernel::Rect const sheet{0, 0, std::min(paper.width, paper.height), std::max(paper.width, paper.height)};
     Renderer::OrientationEnum orientation = layout.m_Orientation;
-    double const scale = layout.m_Scale.value_or(1);
-    double paginatedScale = scale;
     Kernel::Counted<Book::Paginator> paginator;
     switch (layout.m_Kind) {
     case Kind::Single:
         paginator = Kernel::MakeCounted<Book::PaginatorSingle>();
         break;
     case Kind::Tiled:
-        // Cut in the page's own size, and enlarged on the paper.
-        paginator = Kernel::MakeCounted<Book::PaginatorTiled>(layout.m_Overlap / scale);
-        sheet.right /= scale;
-        sheet.bottom /= scale;
-        paginatedScale = 1;
+        paginator = Kernel::MakeCounted<EnlargedTiles>(layout.m_Overlap, layout.m_Scale.value_or(1));
         break;
     case Kind::NUp:
         paginator = MakeGrid(layout, chapters, orientation, messages);
@@ -189,13 +228,11 @@ std::vector<Book::PaginatorPage> LaySheets(BookSession const & session, PrintLay
     }
     std::vector<Book::PaginatorPage> sheets =
         paginator->Paginate(sheet, session.GetBook(), chapters, String(layout.m_Pages), -1, FitOf(layout), orientation,
-                            paginatedScale, layout.m_IncludeBleed);
+                            layout.m_Scale.value_or(1), layout.m_IncludeBleed);
     std::size_t cells = 0;
     for (Book::PaginatorPage & page : sheets) {
         cells += page.m_Targets.size();
-        if (layout.m_Kind == Kind::Tiled) {
-            page.m_Scale = scale;
-        } else if (layout.m_Orientation != Renderer::OrientationAuto) {
+        if (layout.m_Kind != Kind::Tiled && layout.m_Orientation != Renderer::OrientationAuto) {
             page.m_Orientation = layout.m_Orientation;
         }
     }

@@ -44,7 +44,7 @@ struct PrintLayout
     int m_Columns = 2;
     int m_Repeat = 1;
     int m_Skip = 0;
-    /// On paper, whatever the scale. Not said: none, or as much as the marks need on a given paper.
+    /// On paper, whatever the scale. Not said: as much as bleed and marks need on a given paper.
     std::optional<Kernel::Size> m_Margins;
     Kernel::Size m_Gaps{};
     bool m_Fill = false;

@@ -129,7 +129,8 @@ private:
             return entry;
         }
         int const spread = m_Place.m_Spread;
-        entry = {Ref({})};
+        entry.reserve(facing ? 2 : 1);
+        entry.push_back(Ref({}));
         StepOn();
         if (facing && m_Place.m_Spread == spread) {
             entry.push_back(Ref({}));
@@ -197,8 +198,11 @@ void ExportBookCommand::BuildPageMaps()
 {
     m_PrintersMarks.clear();
     auto const options = Kernel::CountedCast<Renderer::FileExportOptionsPDF const>(m_Options.GetCounted());
-    Kernel::Counted<BookChapter const> previous;
+    m_PrintersMarks.reserve(m_ExportMap.size());
     Kernel::Counted<BookChapter const> current;
+    Spreads spreads;
+    // Of the chapter before the current one; nothing before the first.
+    Kernel::Rect before;
     for (ExportPageEntry const & entry : m_ExportMap) {
         if (IsAborted()) {
             return;
@@ -209,13 +213,11 @@ void ExportBookCommand::BuildPageMaps()
         }
         Kernel::Counted<BookChapter const> const & chapter = m_Chapters[static_cast<std::size_t>(real->m_Chapter)];
         if (chapter != current) {
-            previous = current;
+            before = current ? RoundedOutwards(BoundsOfLastExportingSpread(*current), Tolerance) : Kernel::Rect{};
             current = chapter;
+            spreads = current->GetSpreadInfo();
         }
-        Spreads const spreads = current->GetSpreadInfo();
         SpreadInfo const & spread = At(spreads, real->m_Spread);
-        Kernel::Rect const before =
-            RoundedOutwards(previous ? BoundsOfLastExportingSpread(*previous) : Kernel::Rect{}, Tolerance);
         Kernel::Rect const bounds = RoundedOutwards(spread.m_SpreadBounds, Tolerance);
         Kernel::Rect const & page = spread.m_PageRects[static_cast<std::size_t>(real->m_Page)];
 
@@ -278,6 +280,7 @@ void ExportBookCommand::GetPagesPerStage(std::vector<float> & weights)
 {
     int count = 0;
     int current = -1;
+    Spreads spreads;
     for (ExportPageEntry const & entry : m_ExportMap) {
         ExportPageRef const * const real = FirstReal(entry);
         if (!real) {
@@ -289,8 +292,8 @@ void ExportBookCommand::GetPagesPerStage(std::vector<float> & weights)
             }
             current = real->m_Chapter;
             count = 0;
+            spreads = m_Chapters[static_cast<std::size_t>(current)]->GetSpreadInfo();
         }
-        Spreads const spreads = m_Chapters[static_cast<std::size_t>(current)]->GetSpreadInfo();
         SpreadInfo const & spread = At(spreads, real->m_Spread);
         switch (FormOf(entry, static_cast<int>(spread.m_PageRects.size()))) {
         case ExportPageForm::WholeSpread:
