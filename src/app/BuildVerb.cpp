@@ -129,6 +129,9 @@ private:
             return false;
         }
         Import::Importer importer(*m_Plan, *m_Look, m_Work, Interruption::Flag());
+        importer.SetPasswords([this](std::string const & path, bool isWrong) {
+            return m_Context.m_Answers.m_Passwords->Find(path, isWrong);
+        });
         if (!m_Options.m_IsForced && !m_Messages.HasErrors() && importer.IsEverythingCurrent(m_Messages) &&
             IsOutputCurrent(importer.State())) {
             m_IsUpToDate = true;

@@ -3,6 +3,8 @@
 #include "import/Text.h"
 
 #include <ostream>
+#include <termios.h>
+#include <unistd.h>
 
 namespace App
 {
@@ -13,6 +15,33 @@ namespace
 {
 
 constexpr char const * g_Version = "korvane 0.1.0";
+
+/// Keeps what is typed off the terminal for its own lifetime. Does nothing where there is none.
+class EchoOff
+{
+public:
+    EchoOff() : m_IsTerminal(0 == tcgetattr(STDIN_FILENO, &m_Before))
+    {
+        termios quiet = m_Before;
+        quiet.c_lflag &= ~static_cast<tcflag_t>(ECHO);
+        quiet.c_lflag |= ECHONL;
+        if (m_IsTerminal) {
+            tcsetattr(STDIN_FILENO, TCSAFLUSH, &quiet);
+        }
+    }
+    ~EchoOff()
+    {
+        if (m_IsTerminal) {
+            tcsetattr(STDIN_FILENO, TCSAFLUSH, &m_Before);
+        }
+    }
+    EchoOff(EchoOff const &) = delete;
+    EchoOff & operator=(EchoOff const &) = delete;
+
+private:
+    termios m_Before{};
+    bool m_IsTerminal;
+};
 
 /// What the command line's library says of itself, in the user's language.
 void TranslateHelp(CLI::App & program)
@@ -79,6 +108,13 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
 
     Interruption const interruption;
     Console console(out, err, verbs.Settings(), terminal);
+    if (ask) {
+        verbs.Answers().m_Passwords->SetAsk([&console, ask](std::string const & question, std::string & answer) {
+            console.EndProgress();
+            EchoOff const noEcho;
+            return ask(question, answer);
+        });
+    }
     VerbContext context{console, std::move(ask), verbs.Answers()};
     int code = ExitFine;
     try {

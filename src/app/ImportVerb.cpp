@@ -70,6 +70,9 @@ int RunImport(VerbContext & context, ImportOptions const & options)
         std::string problem;
         if (lock.Take(work / "book.kvbook", problem)) {
             Import::Importer importer(*plan, *look, work, Interruption::Flag());
+            importer.SetPasswords([&context](std::string const & source, bool isWrong) {
+                return context.m_Answers.m_Passwords->Find(source, isWrong);
+            });
             isGood = importer.Run(chapters, messages, [&](int done, int all) {
                 context.m_Console.Progress(Text("Importing chapters", "Program"), static_cast<double>(done) / all);
             });
@@ -116,6 +119,7 @@ void AddImportVerb(VerbList & verbs)
         ->type_name("DIR");
     verb.add_option("--template", options->m_Template, Text("Template by name or a .toml file", "Help"))
         ->type_name("NAME|FILE");
+    verbs.AddPasswords(verb);
 }
 
 }

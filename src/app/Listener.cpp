@@ -9,6 +9,7 @@
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/document/RequestPdfPasswordsNotification.h"
 #include "framework/kernel/CommandNotifications.h"
+#include "framework/kernel/DataSource.h"
 #include "import/SaveFailure.h"
 #include "import/Text.h"
 #include "output/ExportBookCompleteNotification.h"
@@ -122,9 +123,7 @@ void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
     } else if (auto const * prompt = dynamic_cast<DocumentPromptNotification const *>(heard)) {
         AnswerPrompt(*prompt);
     } else if (auto const * passwords = dynamic_cast<RequestPdfPasswordsNotification const *>(heard)) {
-        Add(Severity::Warning, "password", "",
-            Text("A placed PDF is protected by a password and stays closed.", "Program"));
-        passwords->Answer({});
+        AnswerPasswords(*passwords);
     }
 }
 
@@ -183,6 +182,31 @@ void Listener::AnswerFile(Book::ChooseChapterFileNotification const & prompt)
         m_HasGivenUp = true;
     }
     prompt.ProcessResponse(String());
+}
+
+void Listener::AnswerPasswords(RequestPdfPasswordsNotification const & request)
+{
+    RequestPdfPasswordsNotification::Passwords passwords;
+    for (Kernel::Counted<Kernel::DataSource const> const & source : request.GetSources()) {
+        std::string const path = source->GetPath().ToStd();
+        std::string const password = m_Answers.m_Passwords ? m_Answers.m_Passwords->Find(path, false) : std::string();
+        if (!password.empty()) {
+            passwords.emplace(source, String(password));
+            continue;
+        }
+        bool isNew = false;
+        {
+            std::lock_guard const lock(m_Lock);
+            isNew = m_ToldLocked.insert(path).second;
+        }
+        if (isNew) {
+            Add(Import::Severity::Warning, "picture-locked", path,
+                Text("The placed PDF is protected by a password and shows as a marked box; --password FILE=... gives "
+                     "it.",
+                     "Program"));
+        }
+    }
+    request.Answer(passwords);
 }
 
 void Listener::AnswerPermission(Book::PromptFixBookPermissionsNotification const & prompt)

@@ -1,15 +1,19 @@
 #pragma once
 
 #include "app/Console.h"
+#include "app/PasswordBook.h"
 #include "framework/kernel/BroadcastNotification.h"
 #include "import/Message.h"
 
 #include <condition_variable>
 #include <functional>
+#include <memory>
 #include <mutex>
+#include <set>
 #include <vector>
 
 class DocumentPromptNotification;
+class RequestPdfPasswordsNotification;
 class ExportBookCompleteNotification;
 
 namespace Book
@@ -39,6 +43,8 @@ struct StandingAnswers
     Choice m_Upgrade = Choice::Ask;
     /// Look for chapters whose files are gone.
     Choice m_Locate = Choice::Ask;
+    /// Passwords of placed files; null: none are known and nobody is asked.
+    std::shared_ptr<PasswordBook> m_Passwords;
 };
 
 /// The program's ear: hears every notification of the process, shows progress, keeps what went wrong, answers
@@ -67,6 +73,7 @@ public:
 private:
     void AnswerPrompt(DocumentPromptNotification const & prompt);
     void AnswerFile(Book::ChooseChapterFileNotification const & prompt);
+    void AnswerPasswords(RequestPdfPasswordsNotification const & request);
     void AnswerPermission(Book::PromptFixBookPermissionsNotification const & prompt);
     void Add(Import::Severity severity, char const * kind, std::string const & file, std::string const & text);
     /// Asks, or says which option would have answered.
@@ -81,6 +88,8 @@ private:
     bool m_WasSaved = false;
     /// The user had no file to name: the question whether to look on is answered with no.
     bool m_HasGivenUp = false;
+    /// Protected files that were told of; each load asks for their passwords again.
+    std::set<std::string> m_ToldLocked;
 };
 
 }

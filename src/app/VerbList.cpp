@@ -7,7 +7,10 @@ namespace App
 
 using Import::Text;
 
-VerbList::VerbList(CLI::App & program) : m_Program(program) {}
+VerbList::VerbList(CLI::App & program) : m_Program(program)
+{
+    m_Answers.m_Passwords = std::make_shared<PasswordBook>();
+}
 
 CLI::App & VerbList::Add(std::string const & name, std::string const & purpose, std::string const & example, Runner run)
 {
@@ -35,6 +38,37 @@ void VerbList::AddAnswers(CLI::App & verb)
                            Text("Look for chapters whose files are gone", "Help"));
     verb.add_flag_function("--no-locate", set(m_Answers.m_Locate, Choice::No),
                            Text("Go on without chapters whose files are gone", "Help"));
+    AddPasswords(verb);
+}
+
+void VerbList::AddPasswords(CLI::App & verb)
+{
+    PasswordBook & book = *m_Answers.m_Passwords;
+    verb.add_option_function<std::vector<std::string>>(
+            "--password",
+            [&book](std::vector<std::string> const & lines) {
+                for (std::string const & line : lines) {
+                    if (!book.AddLine(line)) {
+                        // Without the value, which may be a secret.
+                        throw CLI::ValidationError("--password", Text("needs the form FILE=PASSWORD", "Help"));
+                    }
+                }
+            },
+            Text("Password of a protected PDF that a chapter places; may be given again for others", "Help"))
+        ->type_name(Text("FILE=PASSWORD", "Help"))
+        ->type_size(1)
+        ->expected(1)
+        ->take_all();
+    verb.add_option_function<std::string>(
+            "--password-file",
+            [&book](std::string const & path) {
+                std::string problem;
+                if (!book.ReadFile(path, problem)) {
+                    throw CLI::ValidationError("--password-file", problem);
+                }
+            },
+            Text("File with a line FILE=PASSWORD for each protected PDF", "Help"))
+        ->type_name(Text("FILE", "Help"));
 }
 
 void VerbList::AddFixedTime(CLI::App & verb, long long & time)

@@ -21,6 +21,8 @@ public:
     CLI::App & Add(std::string const & name, std::string const & purpose, std::string const & example, Runner run);
     /// Options that answer the questions which opening documents may raise.
     void AddAnswers(CLI::App & verb);
+    /// Options that give the passwords of protected files; part of `AddAnswers`.
+    void AddPasswords(CLI::App & verb);
     /// Option for the moment that stands for now in the output; `time` stays as it is without it.
     void AddFixedTime(CLI::App & verb, long long & time);
 

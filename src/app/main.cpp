@@ -1,4 +1,5 @@
 #include "app/Language.h"
+#include "app/PasswordBook.h"
 #include "app/Verbs.h"
 
 #include <cstdlib>
@@ -38,6 +39,7 @@ int main(int argc, char ** argv)
     App::ChooseLanguage();
     bool const canAsk = isatty(STDIN_FILENO) && isatty(STDERR_FILENO);
     std::vector<std::string> const arguments(argv + 1, argv + argc);
+    App::HidePasswords(argc, argv);
     return App::RunProgram(arguments, std::cout, std::cerr, LookAtTerminal(),
                            canAsk ? App::AskUser(&AskOnTerminal) : nullptr);
 }

@@ -143,4 +143,15 @@ bool ReadWidth(std::string_view text, double & share, double & points)
     return 0 < factor;
 }
 
+bool ReadPageNumber(std::string_view text, int & page)
+{
+    int number = 0;
+    auto const [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    if (std::errc() != error || text.data() + text.size() != end || number < 1) {
+        return false;
+    }
+    page = number;
+    return true;
+}
+
 }

@@ -19,4 +19,7 @@ std::optional<Attributes> ReadAttributes(std::string_view text, std::size_t & le
 /// False if it is none of these or not above zero.
 bool ReadWidth(std::string_view text, double & share, double & points);
 
+/// A page of a PDF: a whole number from 1 on, in digits. False, and `page` as it was, if it is something else.
+bool ReadPageNumber(std::string_view text, int & page);
+
 }

@@ -273,6 +273,9 @@ void ChapterReader::ApplyToPicture(std::uint32_t index, Attributes const & attri
             Warn(
                 "picture-width", line,
                 Text("The width \"%1\" is not a length or a percentage; the picture keeps its size.", "Source", value));
+        } else if ("page" == key && !ReadPageNumber(value, picture.m_Page)) {
+            Warn("picture-page", line,
+                 Text("\"%1\" is no page of a PDF, which count from 1; the first one is set.", "Source", value));
         }
     }
 }

@@ -195,6 +195,8 @@ struct Picture
     double m_WidthShare = 0;
     /// Width in points from `width=5cm`, 0 if not given.
     double m_Width = 0;
+    /// Page of a PDF from `page=2`, from 1.
+    int m_Page = 1;
     int m_Line = 0;
 };
 

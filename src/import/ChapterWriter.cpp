@@ -131,7 +131,7 @@ bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
         return false;
     }
     PictureLoader pictures(planned.m_Path, planned.m_Name, document->GetPictures(), job.m_Known.m_Pictures,
-                           job.m_Messages);
+                           m_Passwords, job.m_Messages);
     StoryContext const context{planned.m_Name, m_Names, planned.m_Part, planned.m_Number,
                                [&](Picture const & picture) { return pictures.Load(picture); }};
     auto const story = StoryWriter(chapter, m_Look, context).Write();

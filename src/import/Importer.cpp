@@ -18,7 +18,7 @@ namespace
 {
 
 /// Raised whenever the importer makes another document from the same sources.
-constexpr std::uint64_t g_Generation = 1;
+constexpr std::uint64_t g_Generation = 2;
 constexpr std::size_t g_Threads = 2;
 
 /// Mixes facts into one number; the order counts.

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "import/BookPlan.h"
+#include "import/PictureLoader.h"
 #include "import/Template.h"
 #include "import/WorkState.h"
 
@@ -36,6 +37,9 @@ public:
 
     /// `abort` is polled between chapters and may be null. All are borrowed.
     Importer(BookPlan const & plan, Template const & look, std::filesystem::path work, std::atomic<bool> const * abort);
+
+    /// Who knows the passwords of protected PDFs that chapters place; without one they show as marked boxes.
+    void SetPasswords(PasswordSource passwords) { m_Passwords = std::move(passwords); }
 
     /// Imports what has changed, two chapters at a time. Chapters that can't be read are errors in `messages` and left
     /// out. False if the work folder can't be used or the user has aborted; then documents that were finished stay, and
@@ -80,6 +84,7 @@ private:
     Template const & m_Look;
     std::filesystem::path m_Work;
     std::atomic<bool> const * m_Abort = nullptr;
+    PasswordSource m_Passwords;
     WorkState m_State;
     std::vector<std::string> m_Names;
 };

@@ -16,6 +16,8 @@ namespace Import
 namespace
 {
 
+using Renderer::RenderTree::PlacedDrawing;
+
 /// Resolution of a picture that does not tell its own.
 constexpr double g_DefaultDpi = 96;
 
@@ -25,6 +27,15 @@ std::string LoweredExtension(std::filesystem::path const & path)
     std::transform(extension.begin(), extension.end(), extension.begin(),
                    [](unsigned char c) { return static_cast<char>(c < 0x80 ? std::tolower(c) : c); });
     return extension;
+}
+
+DocumentPictures::Entry EntryOf(std::string const & path, std::vector<unsigned char> const & bytes)
+{
+    DocumentPictures::Entry entry;
+    entry.m_SourcePath = String(path);
+    Kernel::FileSystem::GetModifiedTime(entry.m_SourcePath, entry.m_SourceTime);
+    entry.m_Size = bytes.size();
+    return entry;
 }
 
 /// Whether the file ends as its format wants it; a file cut short shows by this without being decoded.
@@ -39,20 +50,20 @@ bool HasEnd(std::vector<unsigned char> const & bytes, Raster::PictureKind kind)
 }
 
 PictureLoader::PictureLoader(std::filesystem::path const & chapter, std::string shownName, DocumentPictures & pictures,
-                             std::map<std::string, KnownFile> & known, MessageList & messages)
+                             std::map<std::string, KnownFile> & known, PasswordSource const & passwords,
+                             MessageList & messages)
     : m_Folder(chapter.parent_path()),
       m_ShownName(std::move(shownName)),
       m_Pictures(pictures),
       m_Known(known),
+      m_Passwords(passwords),
       m_Messages(messages)
 {
 }
 
 PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture const & picture)
 {
-    std::string const extension = LoweredExtension(picture.m_Path);
-    bool const isRemote = std::string::npos != picture.m_Path.find("://");
-    if (isRemote) {
+    if (std::string::npos != picture.m_Path.find("://")) {
         return {"",
                 0,
                 0,
@@ -72,15 +83,58 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
         return {"", 0, 0, Kernel::LocalisedString("The picture %1 cannot be read", "Source"), "picture-unreadable", {}};
     }
     known.m_Hash = HashBytes({reinterpret_cast<char const *>(bytes->data()), bytes->size()});
-    if (".svg" == extension || ".pdf" == extension) {
-        return {"",
-                0,
-                0,
-                Kernel::LocalisedString("The picture %1 is a drawing in %2, which cannot be placed yet", "Source"),
-                "later-picture",
-                extension.substr(1)};
-    }
+    return PlacedDrawing::KindOf(*bytes) ? ReadDrawing(bytes, path, picture) : ReadPixels(bytes, path, picture);
+}
 
+PictureLoader::Loaded PictureLoader::ReadDrawing(Raster::Picture::Bytes const & bytes, std::string const & path,
+                                                 Picture const & picture)
+{
+    using Code = Raster::PictureProblem::Code;
+    PlacedDrawing::Source source{bytes, String(path), picture.m_Page, String()};
+    Raster::PictureProblem problem;
+    auto drawing = PlacedDrawing::Open(source, problem);
+    bool const isProtected = !drawing && Code::Locked == problem.m_Code;
+    for (bool isWrong = false; !drawing && Code::Locked == problem.m_Code && m_Passwords; isWrong = true) {
+        source.m_Password = String(m_Passwords(path, isWrong));
+        if (source.m_Password.Empty()) {
+            break;
+        }
+        problem = {};
+        drawing = PlacedDrawing::Open(source, problem);
+    }
+    DocumentPictures::Entry entry = EntryOf(path, *bytes);
+    entry.m_DrawingKind = PlacedDrawing::KindOf(*bytes);
+    entry.m_IsProtected = isProtected;
+    Loaded loaded;
+    if (drawing || Code::Locked == problem.m_Code) {
+        loaded.m_DataId = PictureReference{m_Pictures.Add(bytes, entry), picture.m_Page}.ToString().ToStd();
+    }
+    if (drawing) {
+        loaded.m_Width = drawing->GetSize().width;
+        loaded.m_Height = drawing->GetSize().height;
+    } else if (Code::Locked == problem.m_Code) {
+        // With its password it would look otherwise, so this state is never one to rely on.
+        m_Known[path].m_Hash = 0;
+        m_Known[path].m_Stamp = {};
+        loaded.m_Problem = Kernel::LocalisedString(
+            "The picture %1 is protected by a password, which --password %1=... gives", "Source");
+        loaded.m_Kind = "picture-locked";
+    } else {
+        // The sentence names the file by its path; here the author's name for it is better.
+        std::string what = problem.m_Text.ToStd();
+        std::string const begin = "The picture " + path + " ";
+        what = what.starts_with(begin) ? what.substr(begin.size()) : what;
+        loaded.m_Problem = Kernel::LocalisedString("The picture %1 cannot be placed: it %2", "Source");
+        loaded.m_Detail = what.substr(0, what.find_last_not_of('.') + 1);
+        loaded.m_Kind = Code::NoSuchPage == problem.m_Code ? "picture-page" : "picture-damaged";
+    }
+    return loaded;
+}
+
+PictureLoader::Loaded PictureLoader::ReadPixels(Raster::Picture::Bytes const & bytes, std::string const & path,
+                                                Picture const & picture)
+{
+    std::string const extension = LoweredExtension(picture.m_Path);
     Raster::PictureProblem problem;
     auto const opened = Raster::Picture::FromBytes(bytes, String(picture.m_Path), problem);
     if (!opened) {
@@ -89,7 +143,8 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
             return {"",
                     0,
                     0,
-                    Kernel::LocalisedString("The picture %1 is neither PNG nor JPEG, whatever its name says", "Source"),
+                    Kernel::LocalisedString("The picture %1 is none of PNG, JPEG, PDF and SVG, whatever its name says",
+                                            "Source"),
                     "picture-kind",
                     {}};
         }
@@ -114,12 +169,8 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
                              picture.m_Path, ".png" == actual ? "PNG" : "JPEG"));
     }
 
-    DocumentPictures::Entry entry;
-    entry.m_SourcePath = String(path);
-    Kernel::FileSystem::GetModifiedTime(entry.m_SourcePath, entry.m_SourceTime);
-    entry.m_Size = bytes->size();
     Loaded loaded;
-    loaded.m_DataId = m_Pictures.Add(bytes, entry).ToStd();
+    loaded.m_DataId = m_Pictures.Add(bytes, EntryOf(path, *bytes)).ToStd();
     auto const points = [](int pixels, double dpi) { return pixels * 72.0 / (1 < dpi ? dpi : g_DefaultDpi); };
     loaded.m_Width = points(info.UprightWidth(), info.UprightDpiX());
     loaded.m_Height = points(info.UprightHeight(), info.UprightDpiY());
@@ -129,9 +180,9 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
 Story::PictureGlyph::Fields PictureLoader::Load(Picture const & picture)
 {
     std::string const path = (m_Folder / picture.m_Path).lexically_normal().string();
-    auto known = m_Loaded.find(path);
+    auto known = m_Loaded.find({path, picture.m_Page});
     if (known == m_Loaded.end()) {
-        known = m_Loaded.emplace(path, Read(path, picture)).first;
+        known = m_Loaded.emplace(std::pair(path, picture.m_Page), Read(path, picture)).first;
     }
     Loaded const & loaded = known->second;
     Story::PictureGlyph::Fields fields;

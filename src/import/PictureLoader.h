@@ -1,12 +1,14 @@
 #pragma once
 
 #include "framework/kernel/LocalisedString.h"
+#include "framework/raster/Picture.h"
 #include "framework/story/PictureGlyph.h"
 #include "import/ChapterText.h"
 #include "import/Message.h"
 #include "import/WorkState.h"
 
 #include <filesystem>
+#include <functional>
 #include <map>
 
 class DocumentPictures;
@@ -14,14 +16,19 @@ class DocumentPictures;
 namespace Import
 {
 
+/// Gives the password of a protected file, by its path; empty if none is known. `isWrong` says that the one given before
+/// did not open the file. Called on any thread of the importer, one call at a time.
+using PasswordSource = std::function<std::string(std::string const & path, bool isWrong)>;
+
 /// Takes the pictures of one chapter into its document. A picture that can't be set becomes a marked box with the
 /// reason in it, and a message. Used by one thread.
 class PictureLoader
 {
 public:
-    /// `chapter` is the chapter's file, `shownName` what messages call it. Borrows all but those two.
+    /// `chapter` is the chapter's file, `shownName` what messages call it. `passwords` may be empty. Borrows all but the
+    /// first two.
     PictureLoader(std::filesystem::path const & chapter, std::string shownName, DocumentPictures & pictures,
-                  std::map<std::string, KnownFile> & known, MessageList & messages);
+                  std::map<std::string, KnownFile> & known, PasswordSource const & passwords, MessageList & messages);
 
     [[nodiscard]] Story::PictureGlyph::Fields Load(Picture const & picture);
 
@@ -29,6 +36,7 @@ private:
     /// What a file gave; kept so that a picture that stands in many places is read once.
     struct Loaded
     {
+        /// A `PictureReference`.
         std::string m_DataId;
         double m_Width = 0;
         double m_Height = 0;
@@ -39,13 +47,19 @@ private:
     };
 
     [[nodiscard]] Loaded Read(std::string const & path, Picture const & picture);
+    [[nodiscard]] Loaded ReadPixels(Raster::Picture::Bytes const & bytes, std::string const & path,
+                                    Picture const & picture);
+    [[nodiscard]] Loaded ReadDrawing(Raster::Picture::Bytes const & bytes, std::string const & path,
+                                     Picture const & picture);
 
     std::filesystem::path m_Folder;
     std::string m_ShownName;
     DocumentPictures & m_Pictures;
     std::map<std::string, KnownFile> & m_Known;
+    PasswordSource const & m_Passwords;
     MessageList & m_Messages;
-    std::map<std::string, Loaded> m_Loaded;
+    /// By path and page.
+    std::map<std::pair<std::string, int>, Loaded> m_Loaded;
 };
 
 }

@@ -4,7 +4,7 @@
 #include "framework/document/BookSinkCollection.h"
 #include "framework/document/DOMVisitor.h"
 #include "framework/document/DocumentControllerSession.h"
-#include "framework/document/PictureNode.h"
+#include "framework/document/EmbeddedDocumentNode.h"
 #include "framework/document/SpreadNode.h"
 #include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Format.h"
@@ -17,6 +17,7 @@ namespace
 {
 
 using Kernel::LocalisedString;
+using Renderer::RenderTree::PlacedDrawing;
 
 /// The pictures that stand on pages by themselves.
 class PictureFinder : public DOMVisitorT<PictureFinder>
@@ -50,6 +51,19 @@ String WordsAt(Story::Story const & story, std::size_t offset)
     // Not in the middle of a surrogate pair.
     end += end < text.size() && 0xDC00 == (text[end] & 0xFC00) ? 1U : 0U;
     return story.GetString(offset, end);
+}
+
+/// The file has another content by now; another time alone is none.
+bool HasChanged(String const & id, DocumentPictures::Entry const & entry)
+{
+    Kernel::TimeStamp time;
+    if (entry.m_SourcePath.Empty() || !Kernel::FileSystem::GetModifiedTime(entry.m_SourcePath, time) ||
+        time == entry.m_SourceTime) {
+        return false;
+    }
+    Raster::PictureProblem problem;
+    Raster::Picture::Bytes const bytes = Raster::ReadPictureFile(entry.m_SourcePath, problem);
+    return bytes && DocumentPictures::IdOf(*bytes) != id;
 }
 
 /// Pixels to the inch of a picture that is set in this size; 0 if either is unknown.
@@ -204,28 +218,59 @@ void PreflightChecker::CheckLayoutPictures(TextFlow const & flow)
     if (!layout || !flow.EnsureGlyphData()) {
         return;
     }
+    DocumentPictures const & pictures = m_Document.GetPictures();
     for (std::uint32_t number = 0; number < layout->GetFrames().size(); ++number) {
         Kernel::JailCounted<TextFrameNode> const frame = flow.GetFrame(number);
         int const page = frame ? frame->GetPageIndex() : -1;
         for (Story::LayoutItem::Picture const & set : layout->GetPictures(layout->GetFrames()[number])) {
-            String const & id = layout->GetString(set.m_DataId);
-            m_PicturePages.try_emplace(id, page);
+            PictureReference const reference = PictureReference::Parse(layout->GetString(set.m_DataId));
+            m_PicturePages.try_emplace(reference.m_Id, page);
+            auto const entry = pictures.FindEntry(reference.m_Id);
             Raster::PictureProblem problem;
-            Kernel::Counted<Raster::Picture const> const picture = m_Document.GetPictures().Get(id, problem);
-            double const dpi = picture ? DpiOf(*picture, static_cast<double>(set.m_Right - set.m_Left),
-                                               static_cast<double>(set.m_Bottom - set.m_Top))
-                                       : 0;
-            if (!picture) {
-                Add(Status::Error, Problem::MissingPicture, problem.m_Path, page, problem.m_Text);
-            } else if (0 < dpi && dpi < PreflightResult::LeastPictureDpi) {
-                Add(Status::Warning, Problem::PictureResolution, picture->GetPath(), page,
-                    Kernel::Format(LocalisedString("The picture \"%1\" has only %2 pixels to the inch at its size here; "
-                                                   "%3 look sharp on paper.",
-                                                   "Preflight"),
-                                   picture->GetPath(), std::lround(dpi), std::lround(PreflightResult::LeastPictureDpi)));
+            if (entry && entry->m_DrawingKind) {
+                auto const drawing = pictures.GetDrawing(
+                    reference, m_Document.GetDocument()->GetPicturePassword(reference.m_Id), problem);
+                m_HasPdf = m_HasPdf || PlacedDrawing::Kind::Pdf == *entry->m_DrawingKind;
+                CheckDrawing(entry->m_SourcePath, drawing ? Raster::PictureProblem() : problem, page);
+            } else {
+                auto const picture = pictures.Get(reference.m_Id, problem);
+                CheckPixels(picture, problem, static_cast<double>(set.m_Right - set.m_Left),
+                            static_cast<double>(set.m_Bottom - set.m_Top), page);
             }
         }
     }
+}
+
+void PreflightChecker::CheckPixels(Kernel::Counted<Raster::Picture const> const & picture,
+                                   Raster::PictureProblem const & problem, double width, double height, int page)
+{
+    double const dpi = picture ? DpiOf(*picture, width, height) : 0;
+    if (!picture) {
+        Add(Status::Error, Problem::MissingPicture, problem.m_Path, page, problem.m_Text);
+    } else if (0 < dpi && dpi < PreflightResult::LeastPictureDpi) {
+        Add(Status::Warning, Problem::PictureResolution, picture->GetPath(), page,
+            Kernel::Format(LocalisedString("The picture \"%1\" has only %2 pixels to the inch at its size here; from %3 "
+                                           "on it looks sharp on paper.",
+                                           "Preflight"),
+                           picture->GetPath(), std::lround(dpi), std::lround(PreflightResult::LeastPictureDpi)));
+    }
+}
+
+void PreflightChecker::CheckDrawing(String const & path, Raster::PictureProblem const & problem, int page)
+{
+    if (Raster::PictureProblem::Code::Locked == problem.m_Code) {
+        AddLocked(path, page);
+    } else if (Raster::PictureProblem::Code::None != problem.m_Code) {
+        Add(Status::Error, Problem::MissingPicture, path, page, problem.m_Text);
+    }
+}
+
+void PreflightChecker::AddLocked(String const & path, int page)
+{
+    Add(Status::Error, Problem::LockedPicture, path, page,
+        Kernel::Format(LocalisedString("The placed PDF \"%1\" needs its password; a marked box stands in its place.",
+                                       "Preflight"),
+                       path));
 }
 
 void PreflightChecker::CheckStoryPictures(TextFlow const & flow, Story::Story const & story,
@@ -235,7 +280,11 @@ void PreflightChecker::CheckStoryPictures(TextFlow const & flow, Story::Story co
         std::size_t const offset = outerOffset.value_or(object.m_Offset);
         if (auto const * const picture = dynamic_cast<Story::PictureGlyph const *>(object.m_Glyph.Get())) {
             Story::PictureGlyph::Fields const & fields = picture->GetFields();
-            if (fields.m_IsMissing) {
+            auto const entry = m_Document.GetPictures().FindEntry(PictureReference::Parse(fields.m_DataId).m_Id);
+            if (fields.m_IsMissing && entry && entry->m_IsProtected) {
+                // It was locked when it was taken in: its size is not known until it is taken in anew.
+                AddLocked(entry->m_SourcePath, PageAt(flow, offset));
+            } else if (fields.m_IsMissing) {
                 Add(Status::Error, Problem::MissingPicture, fields.m_Path, PageAt(flow, offset),
                     fields.m_MissingReason.Empty()
                         ? Kernel::Format(LocalisedString("The picture \"%1\" is missing.", "Preflight"), fields.m_Path)
@@ -254,9 +303,7 @@ void PreflightChecker::CheckSourceFiles()
 {
     for (auto const & [id, entry] : m_Document.GetPictures().GetEntries()) {
         // The document holds the picture: its source may be gone, but when it is there it should be the same still.
-        Kernel::TimeStamp time;
-        if (!entry.m_SourcePath.Empty() && Kernel::FileSystem::GetModifiedTime(entry.m_SourcePath, time) &&
-            time != entry.m_SourceTime) {
+        if (HasChanged(id, entry)) {
             auto const page = m_PicturePages.find(id);
             Add(Status::Warning, Problem::ChangedPicture, entry.m_SourcePath,
                 page == m_PicturePages.end() ? -1 : page->second,
@@ -274,10 +321,28 @@ void PreflightChecker::CheckPlacedPictures()
     finder.Visit(m_Document.GetDocument());
     for (PictureNode const * const node : finder.m_Found) {
         Kernel::JailCounted<SpreadNode> const spread = node->GetSpreadNode();
-        if (!Kernel::FileSystem::Exists(node->GetPath())) {
-            Add(Status::Error, Problem::MissingPicture, node->GetPath(), spread ? spread->GetFirstPageIndex() : -1,
-                Kernel::Format(LocalisedString("The picture \"%1\" is missing.", "Preflight"), node->GetPath()));
+        if (!spread) {
+            continue;
         }
+        Kernel::Rect const box = node->GetSpreadBaseBox(false);
+        int const onSpread = spread->FindPage({(box.left + box.right) / 2, (box.top + box.bottom) / 2});
+        int const first = spread->GetFirstPageIndex();
+        int const page = first < 0 ? -1 : first + std::max(0, onSpread);
+        Raster::PictureProblem problem;
+        if (auto const * const embedded = dynamic_cast<EmbeddedDocumentNode const *>(node)) {
+            auto const drawing = PlacedDrawing::OpenFile(node->GetPath(), embedded->GetPassword(), problem);
+            m_HasPdf = m_HasPdf || (drawing && PlacedDrawing::Kind::Pdf == drawing->GetKind());
+            CheckDrawing(node->GetPath(), drawing ? Raster::PictureProblem() : problem, page);
+        } else {
+            CheckPixels(Raster::Picture::FromFile(node->GetPath(), problem), problem, std::abs(box.Width()),
+                        std::abs(box.Height()), page);
+        }
+    }
+    if (m_HasPdf && !PlacedDrawing::CanDrawPdfPages()) {
+        Add(Status::Warning, Problem::PicturePreview, String(), -1,
+            LocalisedString("Placed PDFs show as marked boxes in previews, as the program pdftocairo (package "
+                            "poppler-utils) is not installed; the PDF output has them.",
+                            "Preflight"));
     }
 }
 

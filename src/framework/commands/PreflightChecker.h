@@ -39,6 +39,11 @@ private:
     void Add(Status status, Problem problem, String subject, int page, String const & message);
     void CheckStoryPictures(TextFlow const & flow, Story::Story const & story, std::optional<std::size_t> outerOffset);
     void CheckLayoutPictures(TextFlow const & flow);
+    void CheckPixels(Kernel::Counted<Raster::Picture const> const & picture, Raster::PictureProblem const & problem,
+                     double width, double height, int page);
+    /// `problem` is empty if the drawing can be had.
+    void CheckDrawing(String const & path, Raster::PictureProblem const & problem, int page);
+    void AddLocked(String const & path, int page);
     void CheckSourceFiles();
     void CheckPlacedPictures();
     void CheckText(TextFlow const & flow);
@@ -52,4 +57,5 @@ private:
     std::set<String> m_OwnAnchors;
     /// The first page that each picture of the text shows on, by id.
     std::map<String, int> m_PicturePages;
+    bool m_HasPdf = false;
 };

@@ -60,7 +60,7 @@ void CollectPictures(Story::Story const & story, std::set<String> & ids)
 {
     for (Story::Story::Object const & object : story.GetObjects()) {
         if (auto const * const picture = dynamic_cast<Story::PictureGlyph const *>(object.m_Glyph.Get())) {
-            ids.insert(picture->GetFields().m_DataId);
+            ids.insert(PictureReference::Parse(picture->GetFields().m_DataId).m_Id);
         }
         for (std::size_t i = 0; i < object.m_Glyph->GetStoryCount(); ++i) {
             if (Kernel::Counted<Story::Story const> const inner = object.m_Glyph->GetStory(i)) {
@@ -147,6 +147,7 @@ void DocumentController::ReplaceContent(DocumentSettings const & settings, Kerne
     std::set<String> pictures;
     CollectPictures(*story, pictures);
     GetPictures().RemoveUnless([&pictures](String const & id) { return pictures.contains(id); });
+    m_Document->UpdateEmbeddedDocuments();
 
     ReplaceIndexTopics(*story);
     Kernel::Counted<TextFlow> const flow = Kernel::MakeCounted<TextFlow>(std::move(story));

@@ -290,6 +290,7 @@ bool DocumentFile::Read(Kernel::InSerialiser const & in, unsigned short version)
             m_Document.GetPictures().AddStored(record->m_Id, record->m_Entry);
         }
     }
+    node.UpdateEmbeddedDocuments();
 
     std::vector<Kernel::Counted<FlowRecord>> flows;
     in.LoadObjects(IDTag("flow"), flows);

@@ -1,5 +1,6 @@
 #include "framework/document/DocumentNode.h"
 
+#include "framework/document/EmbeddedDocumentNode.h"
 #include "framework/document/MasterSpreadNode.h"
 #include "framework/document/SpreadNode.h"
 #include "framework/document/TextFlow.h"
@@ -170,4 +171,26 @@ void DocumentNode::SetStyleSheet(Kernel::Counted<Story::StyleSheet const> styles
 {
     KORVANE_ASSERT(styles);
     m_StyleSheet = std::move(styles);
+}
+
+void DocumentNode::UpdateEmbeddedDocuments()
+{
+    RemoveChildren(NodeChildListItems);
+    for (auto const & [id, entry] : m_Pictures->GetEntries()) {
+        if (entry.m_IsProtected) {
+            AppendChild(NodeChildListItems, Kernel::MakeCounted<EmbeddedDocumentNode>(Kernel::Rect::Empty(),
+                                                                                      entry.m_SourcePath, id, true));
+        }
+    }
+}
+
+String DocumentNode::GetPicturePassword(String const & id) const
+{
+    for (Kernel::JailCounted<Node> const & child : GetChildren(NodeChildListItems)) {
+        auto const & embedded = static_cast<EmbeddedDocumentNode const &>(*child);
+        if (embedded.GetGUID() == id) {
+            return embedded.GetPassword();
+        }
+    }
+    return {};
 }

@@ -87,6 +87,11 @@ public:
     /// The picture files that the document holds; never null.
     [[nodiscard]] Kernel::Counted<DocumentPictures> const & GetPictures() const { return m_Pictures; }
 
+    /// Makes the nodes of the protected files that pictures of the text show, after the pictures have changed.
+    void UpdateEmbeddedDocuments();
+    /// The password of a picture of the text; empty if it needs none or none is known.
+    [[nodiscard]] String GetPicturePassword(String const & id) const;
+
     /// What running heads show as the document's title. Worked out from title and text; never saved.
     [[nodiscard]] String const & GetRunningTitle() const { return m_RunningTitle; }
     void SetRunningTitle(String const & title) { m_RunningTitle = title; }

@@ -484,6 +484,9 @@ void PictureRecord::Save(OutSerialiser & out) const
     out.SaveType(IDTag("path"), m_Entry.m_SourcePath);
     out.SaveType(IDTag("time"), m_Entry.m_SourceTime);
     out.SaveType(IDTag("size"), m_Entry.m_Size);
+    out.SaveType(IDTag("draw"), m_Entry.m_DrawingKind ? static_cast<std::uint8_t>(*m_Entry.m_DrawingKind)
+                                                      : std::uint8_t(0));
+    out.SaveType(IDTag("prot"), m_Entry.m_IsProtected);
 }
 
 bool PictureRecord::Load(InSerialiser const & in, Kernel::FileStore & store, unsigned short)
@@ -493,5 +496,12 @@ bool PictureRecord::Load(InSerialiser const & in, Kernel::FileStore & store, uns
     m_Entry.m_SourcePath = Kernel::PortablePath::Resolve(m_Entry.m_SourcePath, store.GetPath());
     in.LoadType(IDTag("time"), m_Entry.m_SourceTime);
     in.LoadType(IDTag("size"), m_Entry.m_Size);
-    return !m_Id.Empty();
+    in.LoadType(IDTag("prot"), m_Entry.m_IsProtected);
+    using Kind = Renderer::RenderTree::PlacedDrawing::Kind;
+    std::uint8_t kind = 0;
+    in.LoadType(IDTag("draw"), kind);
+    if (0 != kind) {
+        m_Entry.m_DrawingKind = static_cast<Kind>(kind);
+    }
+    return !m_Id.Empty() && kind <= static_cast<std::uint8_t>(Kind::Svg);
 }

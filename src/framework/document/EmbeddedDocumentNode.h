@@ -2,8 +2,11 @@
 
 #include "framework/document/PictureNode.h"
 
-/// A page of another document file, such as a PDF, placed on a page. Its password, where it needs one, is kept in
-/// memory only.
+/// The first page of another document file, such as a PDF, placed on a page. Its password, where it needs one, is kept
+/// in memory only.
+///
+/// A protected PDF that pictures of the text show has such a node too, as a child of the document itself, without a place
+/// and with the picture's id as its GUID: it carries the password for them.
 class EmbeddedDocumentNode : public PictureNode
 {
 public:

@@ -16,7 +16,8 @@ enum NodeChildListType
     NodeChildListSpreads,
     /// Of a spread or master spread: items beneath everything else, such as backgrounds.
     NodeChildListUnder,
-    /// Of a spread or master spread: text frames and pictures, back to front.
+    /// Of a spread or master spread: text frames and pictures, back to front. Of the document node: protected files that
+    /// the text shows.
     NodeChildListItems,
     /// Of a spread or master spread: items on top of everything else.
     NodeChildListOver,

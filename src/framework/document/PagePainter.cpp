@@ -1,6 +1,6 @@
 #include "framework/document/PagePainter.h"
 
-#include "framework/document/PictureNode.h"
+#include "framework/document/EmbeddedDocumentNode.h"
 #include "framework/document/ShapeNode.h"
 #include "framework/kernel/Format.h"
 
@@ -13,6 +13,15 @@ namespace
 bool Meets(Kernel::Rect const & a, Kernel::Rect const & b)
 {
     return a.left < b.right && b.left < a.right && a.top < b.bottom && b.top < a.bottom;
+}
+
+/// The largest rectangle of these proportions within `rect`, in its middle.
+Kernel::Rect Fitted(Kernel::Rect const & rect, double width, double height)
+{
+    double const scale = std::min(rect.Width() / width, rect.Height() / height);
+    double const dx = (rect.Width() - scale * width) / 2;
+    double const dy = (rect.Height() - scale * height) / 2;
+    return {rect.left + dx, rect.top + dy, rect.right - dx, rect.bottom - dy};
 }
 
 RenderTree::Role RoleOf(Story::LayoutItem::Role role, unsigned int headingLevel)
@@ -160,23 +169,22 @@ void PagePainter::PaintItem(Node const & item, RunningTextSetter::Fields const &
             Raster::Picture::FromFile(static_cast<PictureNode const &>(item).GetPath(), problem);
         Kernel::Rect rect = item.GetSpreadBaseBox(false).Moved(offset.x, offset.y);
         if (picture && 0 < picture->GetInfo().UprightWidth() && 0 < picture->GetInfo().UprightHeight()) {
-            double const scale = std::min(rect.Width() / picture->GetInfo().UprightWidth(),
-                                          rect.Height() / picture->GetInfo().UprightHeight());
-            double const dx = (rect.Width() - scale * picture->GetInfo().UprightWidth()) / 2;
-            double const dy = (rect.Height() - scale * picture->GetInfo().UprightHeight()) / 2;
-            rect = {rect.left + dx, rect.top + dy, rect.right - dx, rect.bottom - dy};
+            rect = Fitted(rect, picture->GetInfo().UprightWidth(), picture->GetInfo().UprightHeight());
         }
         PaintPicture(picture, problem, rect, String());
         break;
     }
-    case Node::Kind::EmbeddedDocument:
-        PaintMissing(item.GetSpreadBaseBox(false).Moved(offset.x, offset.y));
-        if (m_Warnings) {
-            String const & path = static_cast<PictureNode const &>(item).GetPath();
-            m_Warnings->push_back({RenderTree::Warning::Code::PictureMissing, 0, path,
-                                   Kernel::Format("The placed document \"%1\" shows as a marked box.", path)});
+    case Node::Kind::EmbeddedDocument: {
+        auto const & node = static_cast<EmbeddedDocumentNode const &>(item);
+        Raster::PictureProblem problem;
+        auto const drawing = RenderTree::PlacedDrawing::OpenFile(node.GetPath(), node.GetPassword(), problem);
+        Kernel::Rect rect = item.GetSpreadBaseBox(false).Moved(offset.x, offset.y);
+        if (drawing) {
+            rect = Fitted(rect, drawing->GetSize().width, drawing->GetSize().height);
         }
+        PaintDrawing(drawing, problem, rect, String());
         break;
+    }
     default:
         break;
     }
@@ -201,13 +209,10 @@ void PagePainter::PaintFrame(TextFrameNode const & frame)
     }
     PaintLines(*layout, laidOut, origin);
     for (Story::LayoutItem::Picture const & picture : layout->GetPictures(laidOut)) {
-        Raster::PictureProblem problem;
-        Kernel::Counted<Raster::Picture const> const content =
-            document ? document->GetPictures()->Get(layout->GetString(picture.m_DataId), problem) : nullptr;
-        PaintPicture(content, problem,
-                     {origin.x + picture.m_Left, origin.y + picture.m_Top, origin.x + picture.m_Right,
-                      origin.y + picture.m_Bottom},
-                     layout->GetString(picture.m_AltText));
+        PaintTextPicture(document.Get(), PictureReference::Parse(layout->GetString(picture.m_DataId)),
+                         {origin.x + picture.m_Left, origin.y + picture.m_Top, origin.x + picture.m_Right,
+                          origin.y + picture.m_Bottom},
+                         layout->GetString(picture.m_AltText));
     }
     for (Story::LayoutItem::Box const & box : layout->GetBoxes(laidOut)) {
         if (BoxKind::Strike == box.m_Kind) {
@@ -301,11 +306,48 @@ void PagePainter::PaintPicture(Kernel::Counted<Raster::Picture const> const & pi
         m_List->DrawPicture(picture, {rect.Width(), 0, 0, rect.Height(), rect.left, rect.top});
     } else {
         PaintMissing(rect);
-        if (m_Warnings) {
-            m_Warnings->push_back({RenderTree::Warning::Code::PictureMissing, 0, problem.m_Path, problem.m_Text});
-        }
+        WarnOf(problem);
     }
     m_List->EndMark();
+}
+
+void PagePainter::PaintTextPicture(DocumentNode const * document, PictureReference const & reference,
+                                   Kernel::RectT<double> const & rect, String const & altText)
+{
+    Raster::PictureProblem problem;
+    auto const entry = document ? document->GetPictures()->FindEntry(reference.m_Id) : std::nullopt;
+    if (entry && entry->m_DrawingKind) {
+        PaintDrawing(document->GetPictures()->GetDrawing(reference, document->GetPicturePassword(reference.m_Id),
+                                                         problem),
+                     problem, rect, altText);
+    } else {
+        PaintPicture(document ? document->GetPictures()->Get(reference.m_Id, problem) : nullptr, problem, rect,
+                     altText);
+    }
+}
+
+void PagePainter::PaintDrawing(Kernel::Counted<RenderTree::PlacedDrawing const> const & drawing,
+                               Raster::PictureProblem const & problem, Kernel::RectT<double> const & rect,
+                               String const & altText)
+{
+    m_List->BeginMark({RenderTree::Role::Figure, {}, altText});
+    if (drawing) {
+        m_List->DrawDrawing(drawing, {rect.Width(), 0, 0, rect.Height(), rect.left, rect.top});
+    } else {
+        PaintMissing(rect);
+        WarnOf(problem);
+    }
+    m_List->EndMark();
+}
+
+void PagePainter::WarnOf(Raster::PictureProblem const & problem)
+{
+    if (m_Warnings) {
+        m_Warnings->push_back({Raster::PictureProblem::Code::Locked == problem.m_Code
+                                   ? RenderTree::Warning::Code::PictureLocked
+                                   : RenderTree::Warning::Code::PictureMissing,
+                               0, problem.m_Path, problem.m_Text});
+    }
 }
 
 void PagePainter::PaintMissing(Kernel::RectT<double> const & rect)

@@ -29,6 +29,12 @@ private:
     void PaintLines(Story::Layout const & layout, Story::LayoutItem::Frame const & frame,
                     Kernel::PointT<double> origin);
     void PaintBox(Story::Layout const & layout, Story::LayoutItem::Box const & box, Kernel::PointT<double> origin);
+    void PaintTextPicture(DocumentNode const * document, PictureReference const & reference,
+                          Kernel::RectT<double> const & rect, String const & altText);
+    void PaintDrawing(Kernel::Counted<Renderer::RenderTree::PlacedDrawing const> const & drawing,
+                      Raster::PictureProblem const & problem, Kernel::RectT<double> const & rect,
+                      String const & altText);
+    void WarnOf(Raster::PictureProblem const & problem);
     void PaintPicture(Kernel::Counted<Raster::Picture const> const & picture, Raster::PictureProblem const & problem,
                       Kernel::RectT<double> const & rect, String const & altText);
     void PaintMissing(Kernel::RectT<double> const & rect);

@@ -13,6 +13,8 @@ char const * PreflightResult::NameOf(Problem problem)
         return "changed-picture";
     case Problem::LockedPicture:
         return "locked-picture";
+    case Problem::PicturePreview:
+        return "picture-preview";
     case Problem::PictureResolution:
         return "picture-resolution";
     case Problem::MissingFont:

@@ -28,6 +28,8 @@ struct PreflightResult
         ChangedPicture,
         /// A placed PDF can't be opened without its password.
         LockedPicture,
+        /// Pixels of placed PDFs, for previews, need a program that is not installed; output is not touched by it.
+        PicturePreview,
         /// Fewer pixels to the inch than `LeastPictureDpi` at the size in which the picture is set.
         PictureResolution,
         /// A font is not installed, or does not have a character.

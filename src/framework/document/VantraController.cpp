@@ -130,6 +130,30 @@ bool VantraController::EnqueueCommandAndWait(Counted<DocumentCommand> command, C
     return true;
 }
 
+namespace
+{
+
+/// Gives protected pictures the passwords that the publication was told in this session.
+void RecallPasswords(Counted<DocumentController> const & document)
+{
+    document->AcquireReaderLock();
+    auto const images = document->GetProtectedImages();
+    document->ReleaseReaderLock();
+    for (Kernel::JailCounted<EmbeddedDocumentNode> const & image : images) {
+        String password;
+        if (BookSinkCollection::Ask([&](BookSink & sink) {
+                password = sink.GetPasswordForGuid(image->GetGUID(), document);
+                return !password.Empty();
+            })) {
+            document->AcquireWriterLock();
+            image->SetPassword(password);
+            document->ReleaseWriterLock();
+        }
+    }
+}
+
+}
+
 Counted<DocumentController> VantraController::OpenDocument(String const & path,
                                                            OpenDocumentFailedNotification & failure)
 {
@@ -157,6 +181,7 @@ Counted<DocumentController> VantraController::OpenDocument(String const & path,
                 path));
         }
     }
+    RecallPasswords(controller);
     IntroduceFront(controller);
     return controller;
 }

@@ -22,13 +22,6 @@ using Code = PictureProblem::Code;
 /// Headers are read from so many bytes of the front; the rare longer ones from the whole file.
 constexpr std::size_t HeaderSize = std::size_t(1) << 16;
 
-void Report(PictureProblem & problem, Code code, String const & path, std::string_view what)
-{
-    problem.m_Code = code;
-    problem.m_Path = path;
-    problem.m_Text = Kernel::ConcatString({"The picture ", path.View(), " ", what, "."});
-}
-
 void ReportErrno(PictureProblem & problem, String const & path, int errorNumber)
 {
     if (errorNumber == ENOENT || errorNumber == ENOTDIR) {
@@ -141,6 +134,13 @@ Kernel::Counted<DynamicBitmap> Upright(Kernel::Counted<DynamicBitmap> const & st
 
 }
 
+void Report(PictureProblem & problem, PictureProblem::Code code, String const & path, std::string_view what)
+{
+    problem.m_Code = code;
+    problem.m_Path = path;
+    problem.m_Text = Kernel::ConcatString({"The picture ", path.View(), " ", what, "."});
+}
+
 void CheckPictureSize(std::uint32_t width, std::uint32_t height)
 {
     if (width == 0 || height == 0) {
@@ -194,9 +194,14 @@ Picture::Bytes Picture::ReadBytes(PictureProblem & problem) const
     if (m_Bytes) {
         return m_Bytes;
     }
+    return ReadPictureFile(m_Path, problem);
+}
+
+Picture::Bytes ReadPictureFile(String const & path, PictureProblem & problem)
+{
     auto bytes = std::make_shared<std::vector<unsigned char>>();
     bool whole = false;
-    if (!ReadFile(m_Path, std::numeric_limits<std::size_t>::max(), *bytes, whole, problem)) {
+    if (!ReadFile(path, std::numeric_limits<std::size_t>::max(), *bytes, whole, problem)) {
         return nullptr;
     }
     return bytes;

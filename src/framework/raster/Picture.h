@@ -26,7 +26,7 @@ struct PictureProblem
         NotFound,
         AccessDenied,
         ReadError,
-        /// Neither PNG nor JPEG.
+        /// None of the kinds that are read.
         UnknownKind,
         Truncated,
         Corrupt,
@@ -34,6 +34,10 @@ struct PictureProblem
         TooLarge,
         /// A form of the format that is not read (12-bit JPEG, for example).
         Unsupported,
+        /// Needs a password that is not known.
+        Locked,
+        /// The file has fewer pages.
+        NoSuchPage,
     };
 
     Code m_Code = Code::None;
@@ -42,6 +46,9 @@ struct PictureProblem
     /// One sentence that names the file and what is wrong with it.
     String m_Text;
 };
+
+/// Fills in a problem: `what` is the rest of a sentence that begins with the picture's name, such as "is damaged".
+void Report(PictureProblem & problem, PictureProblem::Code code, String const & path, std::string_view what);
 
 /// What a picture's header says. Nothing is decoded for it.
 struct PictureInfo
@@ -119,5 +126,8 @@ private:
     Bytes m_Bytes;
     PictureInfo m_Info;
 };
+
+/// A picture's file as it is, of whatever kind. Null with a reason if it is missing, no file, or can't be read.
+[[nodiscard]] Picture::Bytes ReadPictureFile(String const & path, PictureProblem & problem);
 
 }

@@ -24,6 +24,7 @@ void DisplayList::Clear()
     m_Strokes.clear();
     m_Runs.clear();
     m_Pictures.clear();
+    m_Drawings.clear();
     m_Groups.clear();
     m_Marks.clear();
     m_Glyphs.clear();
@@ -84,6 +85,13 @@ void DisplayList::DrawBitmap(Kernel::Counted<Raster::DynamicBitmap const> const 
     placed.m_BitmapProfile = profile;
     placed.m_Placement = placement;
     m_Operations.push_back({Kind::Picture, Append(m_Pictures, std::move(placed))});
+}
+
+void DisplayList::DrawDrawing(Kernel::Counted<PlacedDrawing const> const & drawing,
+                              Raster::AffineTransform::Params const & placement)
+{
+    KORVANE_ASSERT(drawing);
+    m_Operations.push_back({Kind::Drawing, Append(m_Drawings, PlacedVectors{drawing, placement})});
 }
 
 void DisplayList::BeginGroup(Group group)

@@ -11,6 +11,7 @@
 #include "framework/raster/Colour.h"
 #include "framework/raster/Picture.h"
 #include "framework/render/Path.h"
+#include "framework/render/PlacedDrawing.h"
 #include "framework/typeset/LineArena.h"
 
 namespace Renderer::RenderTree
@@ -92,6 +93,13 @@ struct PlacedPicture
     Raster::AffineTransform::Params m_Placement;
 };
 
+/// A drawing that stays vectors where the sink can keep them. The placement is as a picture's.
+struct PlacedVectors
+{
+    Kernel::Counted<PlacedDrawing const> m_Drawing;
+    Raster::AffineTransform::Params m_Placement;
+};
+
 /// Everything that is drawn on one page, in order, once for all sinks: the PDF and the screen are made from the same
 /// list. Coordinates are points, y down, in the spread's coordinates; which part of the plane is the page is said to
 /// the sink. Colours stand in their own space and are converted by the sink. Flat vectors: a page of text costs a few
@@ -105,6 +113,7 @@ public:
         Stroke,
         Glyphs,
         Picture,
+        Drawing,
         BeginGroup,
         EndGroup,
         BeginMark,
@@ -153,6 +162,9 @@ public:
                     Kernel::Consolidated<Raster::ICCProfile> const & profile,
                     Raster::AffineTransform::Params const & placement);
 
+    void DrawDrawing(Kernel::Counted<PlacedDrawing const> const & drawing,
+                     Raster::AffineTransform::Params const & placement);
+
     void BeginGroup(Group group);
     void EndGroup();
     void BeginMark(Mark mark);
@@ -166,6 +178,7 @@ public:
     [[nodiscard]] StrokedPath const & GetStroke(std::uint32_t index) const { return m_Strokes[index]; }
     [[nodiscard]] GlyphRun const & GetRun(std::uint32_t index) const { return m_Runs[index]; }
     [[nodiscard]] PlacedPicture const & GetPicture(std::uint32_t index) const { return m_Pictures[index]; }
+    [[nodiscard]] PlacedVectors const & GetDrawing(std::uint32_t index) const { return m_Drawings[index]; }
     [[nodiscard]] Group const & GetGroup(std::uint32_t index) const { return m_Groups[index]; }
     [[nodiscard]] Mark const & GetMark(std::uint32_t index) const { return m_Marks[index]; }
 
@@ -184,6 +197,7 @@ private:
     std::vector<StrokedPath> m_Strokes;
     std::vector<GlyphRun> m_Runs;
     std::vector<PlacedPicture> m_Pictures;
+    std::vector<PlacedVectors> m_Drawings;
     std::vector<Group> m_Groups;
     std::vector<Mark> m_Marks;
     std::vector<Typeset::PlacedGlyph> m_Glyphs;

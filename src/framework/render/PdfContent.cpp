@@ -38,8 +38,10 @@ Raster::ColourSpace SpaceToWrite(Raster::ColourSpace space, Raster::Format forma
 
 }
 
-PdfContent::PdfContent(Schema const & schema, PdfResources & resources, FormStore storeForm, ImageSource images)
-    : m_Schema(schema), m_Resources(resources), m_StoreForm(std::move(storeForm)), m_Images(std::move(images))
+PdfContent::PdfContent(Schema const & schema, PdfResources & resources, FormStore storeForm, ImageSource images,
+                       DrawingSource drawings)
+    : m_Schema(schema), m_Resources(resources), m_StoreForm(std::move(storeForm)), m_Images(std::move(images)),
+      m_Drawings(std::move(drawings))
 {
 }
 
@@ -95,6 +97,9 @@ void PdfContent::WriteList(DisplayList const & list)
             break;
         case DisplayList::Kind::Picture:
             Picture(list.GetPicture(operation.m_Index));
+            break;
+        case DisplayList::Kind::Drawing:
+            Drawing(list.GetDrawing(operation.m_Index));
             break;
         case DisplayList::Kind::BeginGroup:
             BeginGroup(list.GetGroup(operation.m_Index));
@@ -265,6 +270,26 @@ void PdfContent::Picture(PlacedPicture const & picture)
     AppendMatrix(m_Text, fromBottom.Then(upright[orientation - 1]).Then(placement).Then(m_ToPage));
     m_Text += "cm/I";
     AppendInteger(m_Text, image + 1);
+    m_Text += " Do Q\n";
+}
+
+void PdfContent::Drawing(PlacedVectors const & placed)
+{
+    EndText();
+    std::uint32_t form = 0;
+    if (!m_Drawings(*placed.m_Drawing, form)) {
+        MissingPicture(placed.m_Placement);
+        return;
+    }
+    // The form fills the unit square with (0,0) at its bottom left, and begins with whatever is set where it is drawn:
+    // a page begins with black, one point wide, and solid lines.
+    Raster::AffineTransform::Params const fromBottom{1, 0, 0, -1, 0, 1};
+    m_Uses.m_Drawings.insert(form);
+    SetOpacity(1);
+    m_Text += "q 0 g 0 G 1 w 0 J 0 j 10 M[]0 d ";
+    AppendMatrix(m_Text, fromBottom.Then(placed.m_Placement).Then(m_ToPage));
+    m_Text += "cm/D";
+    AppendInteger(m_Text, form + 1);
     m_Text += " Do Q\n";
 }
 

@@ -26,7 +26,11 @@ public:
     /// none, when a marked box is drawn.
     using ImageSource = std::function<bool(PlacedPicture const & picture, Kernel::Size const & size, std::uint32_t & image)>;
 
-    PdfContent(Schema const & schema, PdfResources & resources, FormStore storeForm, ImageSource images);
+    /// Gives the form for a drawing, its number; false if there is none, when a marked box is drawn.
+    using DrawingSource = std::function<bool(PlacedDrawing const & drawing, std::uint32_t & form)>;
+
+    PdfContent(Schema const & schema, PdfResources & resources, FormStore storeForm, ImageSource images,
+               DrawingSource drawings);
 
     /// From the coordinates of a form's list to those of its content stream.
     static constexpr Raster::AffineTransform::Params ToForm{1, 0, 0, -1, 0, 0};
@@ -78,6 +82,7 @@ private:
     void Fill(DisplayList::FilledPath const & fill);
     void StrokePath(DisplayList::StrokedPath const & stroke);
     void Picture(PlacedPicture const & picture);
+    void Drawing(PlacedVectors const & placed);
     void MissingPicture(Raster::AffineTransform::Params const & placement);
     void Glyphs(DisplayList const & list, GlyphRun const & run);
     void Outlines(DisplayList const & list, GlyphRun const & run);
@@ -97,6 +102,7 @@ private:
     PdfResources & m_Resources;
     FormStore m_StoreForm;
     ImageSource m_Images;
+    DrawingSource m_Drawings;
     Raster::AffineTransform::Params m_ToPage;
     Raster::AffineTransform::Params m_FromPage;
     std::string m_Text;

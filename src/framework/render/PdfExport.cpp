@@ -4,6 +4,7 @@
 #include "framework/kernel/Clock.h"
 #include "framework/kernel/OutStream.h"
 #include "framework/render/PdfContent.h"
+#include "framework/render/PdfDrawings.h"
 #include "framework/render/PdfFile.h"
 #include "framework/render/PdfMarks.h"
 #include "framework/render/PdfPictures.h"
@@ -99,6 +100,9 @@ public:
               *m_Schema, m_File.m_Resources, [this](std::string content) { return StoreForm(content); },
               [this](PlacedPicture const & placed, Kernel::Size const & size, std::uint32_t & image) {
                   return m_Pictures.ImageFor(placed, size, image);
+              },
+              [this](PlacedDrawing const & drawing, std::uint32_t & form) {
+                  return m_Drawings.FormFor(drawing, form);
               })
     {
     }
@@ -149,6 +153,8 @@ public:
     PdfSpill m_Spill;
     PdfCompressor::Deflater m_Deflater;
     PdfPictures m_Pictures;
+    PdfObjects m_Objects{m_Spill};
+    PdfDrawings m_Drawings{m_Objects, m_Spill};
     PdfContent m_Content;
     std::map<PdfAddress, std::uint32_t> m_AddressNumbers;
     /// Last, so that its thread ends before what it works on goes.
@@ -292,6 +298,7 @@ bool PdfExport::WritePage(PdfPage const & page, DisplayList const & content, std
         boxes.m_Art = Mapped(page.m_Boxes.m_Art, toPage);
 
         state.m_Pictures.BeginPage(GetPageCount() + 1, warnings);
+        state.m_Drawings.BeginPage(GetPageCount() + 1, warnings);
         DisplayList marks;
         if (page.m_PrintersMarks) {
             DrawPrintersMarks(*page.m_PrintersMarks, page.m_Boxes.GetTrim(), marks);
@@ -346,7 +353,7 @@ bool PdfExport::Close()
         try {
             StreamPipeline pipeline(*state.m_Stream, *state.m_Schema);
             state.m_Compressor.Finish();
-            WritePdfFile(state.m_File, state.m_Spill, state.m_Compressor, *state.m_Schema, pipeline);
+            WritePdfFile(state.m_File, state.m_Objects, state.m_Drawings, state.m_Compressor, *state.m_Schema, pipeline);
             pipeline.Check();
         } catch (std::exception const & exception) {
             state.Fail(exception.what());

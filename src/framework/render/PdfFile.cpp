@@ -1,6 +1,7 @@
 #include "framework/render/PdfFile.h"
 
 #include "framework/render/PdfCatalogue.h"
+#include "framework/render/PdfDrawings.h"
 #include "framework/render/PdfExport.h"
 #include "framework/render/PdfFontObjects.h"
 #include "framework/render/PdfObjects.h"
@@ -41,18 +42,19 @@ std::string UriText(std::string_view address)
 }
 
 /// Makes libqpdf's objects from the records.
-class Assembler : private PdfObjects
+class Assembler
 {
 public:
-    Assembler(PdfFile & file, PdfSpill & spill, PdfCompressor & compressor, PdfSchema const & schema)
-        : PdfObjects(spill), m_File(file), m_Compressor(compressor), m_Schema(schema)
+    Assembler(PdfFile & file, PdfObjects & objects, PdfDrawings const & drawings, PdfCompressor & compressor,
+              PdfSchema const & schema)
+        : m_File(file), m_Objects(objects), m_Drawings(drawings), m_Compressor(compressor), m_Schema(schema)
     {
     }
 
     void Assemble()
     {
         MakeProfiles();
-        m_Fonts = MakeFonts(*this, m_File.m_Resources.GetFonts(), m_Compressor);
+        m_Fonts = MakeFonts(m_Objects, m_File.m_Resources.GetFonts(), m_Compressor);
         ReservePages();
         MakeImages();
         MakeUses();
@@ -74,17 +76,22 @@ public:
     }
 
 private:
+    [[nodiscard]] QPDF & GetPdf() { return m_Objects.GetPdf(); }
+    Handle Name(char const * name) { return m_Objects.Name(name); }
+    Handle Number(double value) { return m_Objects.Number(value); }
+    Handle Box(Kernel::Rect const & rect) { return m_Objects.Box(rect); }
+
     void MakeProfiles()
     {
         for (Kernel::Consolidated<Raster::ICCProfile> const & profile : m_File.m_Resources.GetProfiles()) {
-            m_Profiles.push_back(MakeProfile(*profile));
+            m_Profiles.push_back(m_Objects.MakeProfile(*profile));
         }
     }
 
     void MakeImages()
     {
         for (PdfImage const & image : m_File.m_Resources.GetImages()) {
-            Handle stream = SpilledStream(image.m_Data, nullptr);
+            Handle stream = m_Objects.SpilledStream(image.m_Data, nullptr);
             Handle dictionary = Handle::parse("<<" + image.m_Entries + ">>");
             dictionary.replaceKey("/Type", Name("/XObject"));
             dictionary.replaceKey("/Subtype", Name("/Image"));
@@ -113,7 +120,7 @@ private:
         std::deque<PdfForm> const & forms = m_File.m_Resources.GetForms();
         m_Uses.assign(uses.size(), Handle());
         for (PdfForm const & form : forms) {
-            Handle stream = SpilledStream(form.m_Data, "/FlateDecode");
+            Handle stream = m_Objects.SpilledStream(form.m_Data, "/FlateDecode");
             Handle dictionary = stream.getDict();
             dictionary.replaceKey("/Type", Name("/XObject"));
             dictionary.replaceKey("/Subtype", Name("/Form"));
@@ -149,6 +156,9 @@ private:
         }
         for (std::uint32_t const form : uses.m_Forms) {
             objects.replaceKey("/X" + std::to_string(form + 1), m_Forms[form]);
+        }
+        for (std::uint32_t const drawing : uses.m_Drawings) {
+            objects.replaceKey("/D" + std::to_string(drawing + 1), m_Drawings.GetForms()[drawing].m_Object);
         }
         Handle states = Handle::newDictionary();
         for (std::uint32_t const opacity : uses.m_Opacities) {
@@ -188,6 +198,9 @@ private:
         for (std::uint32_t const image : uses.m_Images) {
             transparent = transparent || m_File.m_Resources.GetImages()[image].m_SoftMask != 0;
         }
+        for (std::uint32_t const drawing : uses.m_Drawings) {
+            transparent = transparent || m_Drawings.GetForms()[drawing].m_IsGroup;
+        }
         return transparent;
     }
 
@@ -221,7 +234,7 @@ private:
                 page.replaceKey(name, box);
             }
             page.replaceKey("/Resources", m_Uses[record.m_Uses]);
-            page.replaceKey("/Contents", SpilledStream(record.m_Content, "/FlateDecode"));
+            page.replaceKey("/Contents", m_Objects.SpilledStream(record.m_Content, "/FlateDecode"));
             if (HasTransparency(*m_File.m_Resources.GetUses()[record.m_Uses])) {
                 page.replaceKey("/Group", TransparencyGroup());
             }
@@ -265,7 +278,7 @@ private:
                     {{"/S", Name("/GoToR")},
                      {"/F", Handle::newDictionary({{"/Type", Name("/Filespec")},
                                                    {"/F", Handle::newString(address.m_Text.ToStd())},
-                                                   {"/UF", Text(address.m_Text)}})},
+                                                   {"/UF", PdfObjects::Text(address.m_Text)}})},
                      {"/D", Handle::newArray({Handle::newInteger(0), Name("/Fit")})}});
             } else {
                 action = Handle::newDictionary(
@@ -357,12 +370,15 @@ private:
         FileExportOptionsPDF::Settings const & settings = m_Schema.GetOptions().GetSettings();
         Handle catalogue = GetPdf().getRoot();
         catalogue.replaceKey("/Pages", m_Root);
-        MakeInformation(*this, m_File.m_Info, catalogue);
+        MakeInformation(m_Objects, m_File.m_Info, catalogue);
         if (settings.m_PageLabels) {
             MakePageLabels(m_File, catalogue);
         }
         if (settings.m_OutputIntent) {
-            MakeOutputIntent(*this, m_Schema, catalogue);
+            MakeOutputIntent(m_Objects, m_Schema, catalogue);
+        }
+        if (Handle layers = m_Drawings.MakeLayers(); !layers.isNull()) {
+            catalogue.replaceKey("/OCProperties", layers);
         }
         Handle outline =
             MakeOutline(GetPdf(), m_File.m_Bookmarks, settings.m_OpenBookmarkLevels, [this](PdfBookmark const & bookmark) {
@@ -382,6 +398,8 @@ private:
     }
 
     PdfFile & m_File;
+    PdfObjects & m_Objects;
+    PdfDrawings const & m_Drawings;
     PdfCompressor & m_Compressor;
     PdfSchema const & m_Schema;
     Handle m_NoBorder = Handle::parse("[0 0 0]");
@@ -399,10 +417,10 @@ private:
 
 }
 
-void WritePdfFile(PdfFile & file, PdfSpill & spill, PdfCompressor & compressor, PdfSchema const & schema,
-                  Pipeline & target)
+void WritePdfFile(PdfFile & file, PdfObjects & objects, PdfDrawings const & drawings, PdfCompressor & compressor,
+                  PdfSchema const & schema, Pipeline & target)
 {
-    Assembler assembler(file, spill, compressor, schema);
+    Assembler assembler(file, objects, drawings, compressor, schema);
     assembler.Assemble();
     assembler.Write(target);
 }

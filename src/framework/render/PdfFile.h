@@ -16,6 +16,9 @@ class Pipeline;
 namespace Renderer::RenderTree
 {
 
+class PdfDrawings;
+class PdfObjects;
+
 /// A page that waits for the file to be put together.
 struct PdfPageRecord
 {
@@ -76,8 +79,8 @@ struct PdfFile
     PdfInfo m_Info;
 };
 
-/// Puts the file together and writes it. Throws what libqpdf, the compressor or the pipeline throw.
-void WritePdfFile(PdfFile & file, PdfSpill & spill, PdfCompressor & compressor, PdfSchema const & schema,
-                  Pipeline & target);
+/// Puts the file together from what is in `objects` already and the records, and writes it. Throws what libqpdf, the compressor or the pipeline throw.
+void WritePdfFile(PdfFile & file, PdfObjects & objects, PdfDrawings const & drawings, PdfCompressor & compressor,
+                  PdfSchema const & schema, Pipeline & target);
 
 }

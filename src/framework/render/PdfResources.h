@@ -23,6 +23,8 @@ struct PdfUses
     std::set<std::uint32_t> m_Fonts;
     std::set<std::uint32_t> m_Images;
     std::set<std::uint32_t> m_Forms;
+    /// Placed drawings.
+    std::set<std::uint32_t> m_Drawings;
     /// Opacities in thousandths.
     std::set<std::uint32_t> m_Opacities;
     bool m_Lab = false;

@@ -3,27 +3,16 @@
 #include "framework/kernel/Assert.h"
 #include "framework/raster/ColourTransform.h"
 #include "framework/raster/PngEncoder.h"
+#include "framework/render/CairoBitmap.h"
 
-#include <cairo.h>
 #include <cmath>
 #include <cstring>
-#include <memory>
 
 namespace Renderer::RenderTree
 {
 
 namespace
 {
-
-struct CairoDeleter
-{
-    void operator()(cairo_t * context) const { cairo_destroy(context); }
-    void operator()(cairo_surface_t * surface) const { cairo_surface_destroy(surface); }
-    void operator()(cairo_pattern_t * pattern) const { cairo_pattern_destroy(pattern); }
-};
-using ContextPtr = std::unique_ptr<cairo_t, CairoDeleter>;
-using SurfacePtr = std::unique_ptr<cairo_surface_t, CairoDeleter>;
-using PatternPtr = std::unique_ptr<cairo_pattern_t, CairoDeleter>;
 
 cairo_matrix_t MatrixOf(Raster::AffineTransform::Params const & map)
 {
@@ -110,6 +99,9 @@ cairo_filter_t FilterFor(enum Raster::ResamplerType resampler)
     return CAIRO_FILTER_BEST;
 }
 
+/// Most pixels across or down that a placed drawing is made in; beyond that it is scaled.
+constexpr int LargestDrawing = 4096;
+
 /// One drawing of one list.
 class Painter
 {
@@ -144,6 +136,9 @@ public:
                 break;
             case DisplayList::Kind::Picture:
                 Picture(list.GetPicture(operation.m_Index));
+                break;
+            case DisplayList::Kind::Drawing:
+                Drawing(list.GetDrawing(operation.m_Index));
                 break;
             case DisplayList::Kind::BeginGroup:
                 BeginGroup(list.GetGroup(operation.m_Index));
@@ -277,17 +272,70 @@ private:
 
     void Picture(PlacedPicture const & placed)
     {
-        Kernel::Counted<Raster::DynamicBitmap> const pixels = PixelsOf(placed);
-        cairo_save(m_Context);
-        cairo_matrix_t const placement = MatrixOf(placed.m_Placement);
-        cairo_transform(m_Context, &placement);
+        Pixels(PixelsOf(placed).Get(), placed.m_Placement);
+    }
+
+    /// In as many pixels as it covers here.
+    void Drawing(PlacedVectors const & placed)
+    {
+        cairo_matrix_t toPixels;
+        cairo_get_matrix(m_Context, &toPixels);
+        Raster::AffineTransform::Params const map = placed.m_Placement.Then(
+            {toPixels.xx, toPixels.yx, toPixels.xy, toPixels.yy, toPixels.x0, toPixels.y0});
+        auto const count = [](double length) {
+            return std::clamp(static_cast<int>(std::ceil(std::min(length, 1e6))), 1, LargestDrawing);
+        };
+        Raster::PictureProblem problem;
+        Kernel::Counted<Raster::DynamicBitmap const> bitmap = placed.m_Drawing->Draw(
+            count(std::hypot(map.a, map.b)), count(std::hypot(map.c, map.d)), problem);
+        if (!bitmap && m_Warnings) {
+            m_Warnings->push_back({Raster::PictureProblem::Code::Unsupported == problem.m_Code
+                                       ? Warning::Code::PictureNotDrawn
+                                       : Warning::Code::PictureMissing,
+                                   0, placed.m_Drawing->GetPath(), problem.m_Text});
+        }
+        if (bitmap) {
+            Raster::ICCManager::ICCProfileSet const & set = m_Schema.GetProfiles();
+            bitmap = Raster::ConvertToRgba8(*bitmap, set.ForSpace(Raster::SpaceOfFormat(bitmap->GetFormat())),
+                                            set.ForSpace(Raster::ColourSpace::Rgb), set.m_Intent,
+                                            set.m_BlackPointCompensation);
+        }
+        Pixels(bitmap.Get(), placed.m_Placement);
+    }
+
+    /// Draws what stands for a picture that can't be had: a grey box with its diagonals. In the unit square.
+    void Missing()
+    {
         cairo_rectangle(m_Context, 0, 0, 1, 1);
+        cairo_set_source_rgb(m_Context, 0.92, 0.92, 0.92);
+        cairo_fill(m_Context);
+        cairo_move_to(m_Context, 0, 0);
+        cairo_line_to(m_Context, 1, 1);
+        cairo_move_to(m_Context, 1, 0);
+        cairo_line_to(m_Context, 0, 1);
+        cairo_rectangle(m_Context, 0, 0, 1, 1);
+        // The pen is as wide whatever the box's shape is.
+        cairo_matrix_t matrix;
+        cairo_get_matrix(m_Context, &matrix);
+        cairo_identity_matrix(m_Context);
+        cairo_set_source_rgb(m_Context, 0.5, 0.5, 0.5);
+        cairo_set_line_width(m_Context, 1);
+        cairo_set_dash(m_Context, nullptr, 0, 0);
+        cairo_stroke(m_Context);
+        cairo_set_matrix(m_Context, &matrix);
+    }
+
+    void Pixels(Raster::DynamicBitmap const * pixels, Raster::AffineTransform::Params const & where)
+    {
+        cairo_save(m_Context);
+        cairo_matrix_t const placement = MatrixOf(where);
+        cairo_transform(m_Context, &placement);
         if (!pixels || pixels->GetPixels().empty()) {
-            cairo_set_source_rgb(m_Context, 0.92, 0.92, 0.92);
-            cairo_fill(m_Context);
+            Missing();
             cairo_restore(m_Context);
             return;
         }
+        cairo_rectangle(m_Context, 0, 0, 1, 1);
         int const width = pixels->GetWidth();
         int const height = pixels->GetHeight();
         SurfacePtr const surface(cairo_image_surface_create(CAIRO_FORMAT_ARGB32, width, height));
@@ -324,33 +372,6 @@ private:
     std::vector<Warning> * m_Warnings;
     std::vector<double> m_Opacities;
 };
-
-/// cairo's pixels as the raster layer has them.
-Kernel::Counted<Raster::DynamicBitmap> Unpremultiplied(cairo_surface_t * surface)
-{
-    cairo_surface_flush(surface);
-    int const width = cairo_image_surface_get_width(surface);
-    int const height = cairo_image_surface_get_height(surface);
-    unsigned char const * const data = cairo_image_surface_get_data(surface);
-    std::size_t const stride = static_cast<std::size_t>(cairo_image_surface_get_stride(surface));
-    Kernel::Counted<Raster::DynamicBitmap> bitmap = Kernel::MakeCounted<Raster::DynamicBitmap>();
-    bitmap->Create(width, height, Raster::Format::Rgba8, Raster::MipmapMode::OnDemand,
-                   Raster::HardwareCachePolicy::Default);
-    for (int y = 0; y < height; ++y) {
-        std::uint8_t * target = bitmap->GetRow(y);
-        for (int x = 0; x < width; ++x, target += 4) {
-            std::uint32_t value = 0;
-            std::memcpy(&value, data + static_cast<std::size_t>(y) * stride + static_cast<std::size_t>(x) * 4, 4);
-            std::uint32_t const alpha = value >> 24;
-            for (int channel = 0; channel < 3 && alpha > 0; ++channel) {
-                std::uint32_t const colour = value >> (16 - 8 * channel) & 0xFF;
-                target[channel] = static_cast<std::uint8_t>(std::min(255U, (colour * 255 + alpha / 2) / alpha));
-            }
-            target[3] = static_cast<std::uint8_t>(alpha);
-        }
-    }
-    return bitmap;
-}
 
 }
 

@@ -12,6 +12,12 @@ struct Warning
     {
         /// A picture could not be read; a marked box stands in its place.
         PictureMissing,
+        /// A placed PDF can't be opened without its password; a marked box stands in its place.
+        PictureLocked,
+        /// A placed PDF is damaged and was put right as far as it goes.
+        PictureRepaired,
+        /// A placed PDF can't be shown as pixels here; a marked box stands in its place.
+        PictureNotDrawn,
         /// A picture has fewer pixels to the inch than the options ask for.
         PictureResolution,
         /// The file's content is of another kind than its name says.

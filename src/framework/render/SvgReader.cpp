@@ -1,0 +1,147 @@
+#include "framework/render/SvgReader.h"
+
+#include "framework/render/CairoBitmap.h"
+
+#include <algorithm>
+#include <cairo-pdf.h>
+#include <librsvg/rsvg.h>
+#include <memory>
+
+namespace Renderer::RenderTree
+{
+
+namespace
+{
+
+using Code = Raster::PictureProblem::Code;
+
+/// CSS's unit (96 to the inch) in points.
+constexpr double PointsPerPixel = 0.75;
+/// Points of the PDF page to one of the drawing, so that what becomes pixels on the way has enough of them.
+constexpr double PageScale = 4;
+constexpr double LargestPage = 14400;
+
+struct ObjectDeleter
+{
+    void operator()(void * object) const { g_object_unref(object); }
+};
+using HandlePtr = std::unique_ptr<RsvgHandle, ObjectDeleter>;
+
+/// A sentence's end from an error, which is taken.
+std::string TakeText(GError * error)
+{
+    std::string text = error ? error->message : "it says nothing more";
+    g_clear_error(&error);
+    std::replace(text.begin(), text.end(), '\n', ' ');
+    return text;
+}
+
+HandlePtr Open(std::vector<unsigned char> const & bytes, String const & path, Raster::PictureProblem & problem)
+{
+    std::unique_ptr<GInputStream, ObjectDeleter> const stream(
+        g_memory_input_stream_new_from_data(bytes.data(), static_cast<gssize>(bytes.size()), nullptr));
+    std::unique_ptr<GFile, ObjectDeleter> const base(path.Empty() ? nullptr : g_file_new_for_path(path.c_str()));
+    GError * error = nullptr;
+    HandlePtr handle(
+        rsvg_handle_new_from_stream_sync(stream.get(), base.get(), RSVG_HANDLE_FLAGS_NONE, nullptr, &error));
+    if (!handle) {
+        Raster::Report(problem, Code::Corrupt, path, "is damaged (" + TakeText(error) + ")");
+        return nullptr;
+    }
+    rsvg_handle_set_dpi(handle.get(), 96);
+    return handle;
+}
+
+bool Render(RsvgHandle * handle, cairo_t * context, double width, double height, String const & path,
+            Raster::PictureProblem & problem)
+{
+    RsvgRectangle const viewport{0, 0, width, height};
+    GError * error = nullptr;
+    if (!rsvg_handle_render_document(handle, context, &viewport, &error)) {
+        Raster::Report(problem, Code::Corrupt, path, "can't be drawn (" + TakeText(error) + ")");
+        return false;
+    }
+    return true;
+}
+
+cairo_status_t Append(void * target, unsigned char const * data, unsigned int size)
+{
+    static_cast<std::vector<unsigned char> *>(target)->insert(static_cast<std::vector<unsigned char> *>(target)->end(),
+                                                              data, data + size);
+    return CAIRO_STATUS_SUCCESS;
+}
+
+}
+
+std::optional<Kernel::Size> ReadSvgSize(std::vector<unsigned char> const & bytes, String const & path,
+                                        Raster::PictureProblem & problem)
+{
+    HandlePtr const handle = Open(bytes, path, problem);
+    if (!handle) {
+        return std::nullopt;
+    }
+    double width = 0;
+    double height = 0;
+    if (!rsvg_handle_get_intrinsic_size_in_pixels(handle.get(), &width, &height)) {
+        gboolean hasBox = FALSE;
+        RsvgRectangle box{};
+        rsvg_handle_get_intrinsic_dimensions(handle.get(), nullptr, nullptr, nullptr, nullptr, &hasBox, &box);
+        RsvgRectangle ink{};
+        if (!hasBox && rsvg_handle_get_geometry_for_element(handle.get(), nullptr, &ink, nullptr, nullptr)) {
+            box = {0, 0, ink.x + ink.width, ink.y + ink.height};
+        }
+        width = box.width;
+        height = box.height;
+    }
+    if (!(0 < width && 0 < height)) {
+        Raster::Report(problem, Code::Corrupt, path, "has no size and draws nothing");
+        return std::nullopt;
+    }
+    return Kernel::Size{width * PointsPerPixel, height * PointsPerPixel};
+}
+
+Raster::Picture::Bytes SvgToPdf(std::vector<unsigned char> const & bytes, String const & path,
+                                Kernel::Size const & size, Raster::PictureProblem & problem)
+{
+    HandlePtr const handle = Open(bytes, path, problem);
+    if (!handle) {
+        return nullptr;
+    }
+    double const scale = std::clamp(LargestPage / std::max(size.width, size.height), 1.0, PageScale);
+    auto const file = std::make_shared<std::vector<unsigned char>>();
+    SurfacePtr const surface(
+        cairo_pdf_surface_create_for_stream(Append, file.get(), size.width * scale, size.height * scale));
+    {
+        ContextPtr const context(cairo_create(surface.get()));
+        if (!Render(handle.get(), context.get(), size.width * scale, size.height * scale, path, problem)) {
+            return nullptr;
+        }
+    }
+    cairo_surface_finish(surface.get());
+    if (CAIRO_STATUS_SUCCESS != cairo_surface_status(surface.get())) {
+        Raster::Report(problem, Code::Corrupt, path, "can't be drawn");
+        return nullptr;
+    }
+    return file;
+}
+
+Kernel::Counted<Raster::DynamicBitmap const> DrawSvg(std::vector<unsigned char> const & bytes, String const & path,
+                                                     int width, int height, Raster::PictureProblem & problem)
+{
+    HandlePtr const handle = Open(bytes, path, problem);
+    if (!handle) {
+        return nullptr;
+    }
+    SurfacePtr const surface(cairo_image_surface_create(CAIRO_FORMAT_ARGB32, width, height));
+    ContextPtr const context(cairo_create(surface.get()));
+    if (CAIRO_STATUS_SUCCESS != cairo_status(context.get())) {
+        Raster::Report(problem, Code::TooLarge, path, "needs more memory than there is");
+        return nullptr;
+    }
+    if (!Render(handle.get(), context.get(), width, height, path, problem)) {
+        return nullptr;
+    }
+    return Unpremultiplied(surface.get());
+}
+
+}
