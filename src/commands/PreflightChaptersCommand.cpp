@@ -25,13 +25,17 @@ Kernel::LocalisedString PreflightChaptersCommand::GetDescription() const
 void PreflightChaptersCommand::Do()
 {
     Kernel::Counted<BookController> const book = GetBookController();
-    ms_InPreflight = true;
+    // Also where a check ends in an exception: a flag left up would change what others are told for good.
+    struct Flag
+    {
+        Flag() { ms_InPreflight = true; }
+        ~Flag() { ms_InPreflight = false; }
+    } const flag;
     for (std::size_t done = 0; done < m_Chapters.size(); ++done) {
         book->UpdatePreflightStatus(m_Chapters[done], nullptr, m_RunPreflight);
         book->UpdateProgress(Kernel::Counted<DomainCommand const>(this),
                              static_cast<float>(done + 1) / static_cast<float>(m_Chapters.size()));
     }
-    ms_InPreflight = false;
 }
 
 void PreflightChaptersCommand::Notify(std::vector<Kernel::Counted<Kernel::Notification>> & notifications)

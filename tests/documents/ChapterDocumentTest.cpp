@@ -303,6 +303,35 @@ TEST_F(ChapterMarshallTest, BringsChaptersToTheKeyChaptersFormatWhileItHoldsThem
     EXPECT_EQ(m_Builder.GetFolder().ReadFile("b.kvdoc"), before) << "output changes no file";
 }
 
+TEST_F(ChapterMarshallTest, TwoOutputsOfOneChapterTakeBackTheirOwnConversionsAndNoEdit)
+{
+    String const shared = m_Builder.WriteChapter("shared.kvdoc");
+    ChapterSketch cmyk;
+    cmyk.m_Format = Raster::Format::Cmyka8;
+    ChapterSketch grey;
+    grey.m_Format = Raster::Format::GreyAlpha8;
+    auto const one = m_Builder.NewBook({m_Builder.WriteChapter("cmyk.kvdoc", cmyk), shared});
+    auto const two = m_Builder.NewBook({m_Builder.WriteChapter("grey.kvdoc", grey), shared});
+    BookBuilder::Rest();
+    Counted<BookChapter const> const chapter = one->GetChapterAtIndex(1);
+    auto const own = one->LoadChapterDocument(chapter, false, false);
+    ASSERT_TRUE(own);
+    auto const edit = MakeCounted<ModifySectionCommand>(0u);
+    edit->SetStartNumberingAt(21);
+    m_Application.EnqueueCommandAndWait(edit, own, false);
+    {
+        ChapterMarshall first(one);
+        ChapterMarshall second(two);
+        ASSERT_TRUE(first.GetChapter(chapter, true));
+        ASSERT_TRUE(second.GetChapter(two->GetChapterAtIndex(1), true));
+        EXPECT_EQ(own->GetFormat(), Raster::Format::GreyAlpha8);
+    }
+    BookBuilder::Rest();
+    EXPECT_EQ(own->GetFormat(), Raster::Format::Rgba8);
+    EXPECT_EQ(own->GetDocument()->GetSection(0)->GetStartNumberingAt(), 21u) << "the edit is nobody's to undo";
+    one->ReleaseChapterDocument(chapter, false);
+}
+
 TEST_F(ChapterMarshallTest, GivesNothingForAChapterThatCannotBeOpened)
 {
     auto const book = MakeBook(1);
