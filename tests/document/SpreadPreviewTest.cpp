@@ -189,11 +189,11 @@ TEST(DynamicNodeRenderingEngineTest, KeepsTenTilesAndDropsTheOldest)
     auto const document = BlankDocument(200, 100);
     AddShape(*document, {20, 30, 220, 130}, Raster::Colour::Rgb(1, 0, 0));
     DocumentControllerSession const session(document);
-    int const width = 2000;
-    int const height = 1300;
+    int const width = 4000;
+    int const height = 2600;
     auto const engine = DynamicNodeRenderingEngine::Create(
         document->GetDocument()->GetSpreadAtIndex(0), {}, MakeCounted<Inverter>(), width, height,
-        Transform::Translation(-20, -30).Then(Transform::Scale(10, 10)), Raster::ResamplerBilinear,
+        Transform::Translation(-20, -30).Then(Transform::Scale(20, 20)), Raster::ResamplerBilinear,
         Raster::ResamplerBicubic, {}, false);
     Raster::DynamicBitmap bitmap;
     bitmap.Create(width, height, Format::Rgba8, Raster::MipmapMode::OnDemand, Raster::HardwareCachePolicy::Default);
@@ -204,13 +204,13 @@ TEST(DynamicNodeRenderingEngineTest, KeepsTenTilesAndDropsTheOldest)
     EXPECT_EQ(PixelAt(bitmap, 600, 10), (std::vector<int>{0, 255, 255, 0})) << "red, inverted";
     EXPECT_EQ(PixelAt(bitmap, 601, 10), (std::vector<int>{0, 0, 0, 0})) << "beside the rectangle";
 
-    // Four by three tiles; the page ends within the last row of them.
+    // Four by three tiles; the page ends within the second row of them.
     ASSERT_TRUE(engine->Draw(bitmap, {-50, -50, 1e9, 1e9}));
     EXPECT_EQ(engine->GetRenderedTileCount(), 12);
     EXPECT_EQ(engine->GetTileCount(), 10U);
-    EXPECT_EQ(PixelAt(bitmap, 1999, 999), (std::vector<int>{0, 255, 255, 0}));
-    EXPECT_EQ(PixelAt(bitmap, 1999, 1001), (std::vector<int>{255, 255, 255, 255}));
-    ASSERT_TRUE(engine->Draw(bitmap, {1900, 1200, 1950, 1250}));
+    EXPECT_EQ(PixelAt(bitmap, 3999, 1999), (std::vector<int>{0, 255, 255, 0}));
+    EXPECT_EQ(PixelAt(bitmap, 3999, 2001), (std::vector<int>{255, 255, 255, 255}));
+    ASSERT_TRUE(engine->Draw(bitmap, {3900, 2500, 3950, 2550}));
     EXPECT_EQ(engine->GetRenderedTileCount(), 12) << "the last tile is still there";
     ASSERT_TRUE(engine->Draw(bitmap, {600, 10, 601, 11}));
     EXPECT_EQ(engine->GetRenderedTileCount(), 13) << "the one made first has gone";
@@ -229,20 +229,20 @@ TEST(DynamicNodeRenderingEngineTest, TilesJoinWithoutSeamsOnWhitePaper)
                                                Raster::ResamplerBilinear, {}, false);
         auto bitmap = MakeCounted<Raster::DynamicBitmap>();
         bitmap->Create(width, height, Format::Rgba8, Raster::MipmapMode::None, Raster::HardwareCachePolicy::Default);
-        EXPECT_TRUE(engine->Draw(*bitmap, {0, 0, 2000, 2000}));
+        EXPECT_TRUE(engine->Draw(*bitmap, {0, 0, 4000, 4000}));
         return bitmap;
     };
     Kernel::Rect const page = spread->GetPageRect(0);
-    auto const big = draw(Transform::Translation(-page.left, -page.top).Then(Transform::Scale(2, 2)), 830, 1180);
+    auto const big = draw(Transform::Translation(-page.left, -page.top).Then(Transform::Scale(4, 4)), 1660, 2360);
     // The same page around the corner of four tiles, as the middle of one.
-    auto const corner = draw(Transform::Translation(-page.left, -page.top).Then(Transform::Scale(2, 2)).Then(
-                                 Transform::Translation(-362, -362)),
+    auto const corner = draw(Transform::Translation(-page.left, -page.top).Then(Transform::Scale(4, 4)).Then(
+                                 Transform::Translation(-874, -874)),
                              300, 300);
     int ink = 0;
     for (int y = 0; y < 300; ++y) {
         for (int x = 0; x < 300; ++x) {
             // Places are rounded to parts of a pixel, differently in each.
-            ASSERT_NEAR(PixelAt(*corner, x, y)[0], PixelAt(*big, x + 362, y + 362)[0], 2) << x << ", " << y;
+            ASSERT_NEAR(PixelAt(*corner, x, y)[0], PixelAt(*big, x + 874, y + 874)[0], 2) << x << ", " << y;
             ink += PixelAt(*corner, x, y)[0] < 128 ? 1 : 0;
             ASSERT_EQ(PixelAt(*corner, x, y)[3], 255);
         }

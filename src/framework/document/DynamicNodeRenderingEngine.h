@@ -20,8 +20,9 @@ class DynamicNodeRenderingEngine : public virtual Kernel::Countable
 public:
     /// Tiles that are kept; one more drops the oldest.
     static constexpr std::size_t MaximumTiles = 10;
-    /// Pixels across and down; tiles at the right and bottom edges are smaller.
-    static constexpr int TileSide = 512;
+    /// Pixels across and down; tiles at the right and bottom edges are smaller. As large as a preview may be, so that a
+    /// preview is one tile, for which each placed picture is unpacked once.
+    static constexpr int TileSide = 1024;
 
     /// How pixels are made.
     struct Colours
