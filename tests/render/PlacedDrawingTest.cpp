@@ -377,6 +377,24 @@ TEST(PlacedDrawingTest, AHostilePageIsPlacedOrGivesAMarkedBoxAndAWarning)
     }
 }
 
+TEST(PlacedDrawingTest, APageThatIsMadeOnceForManySheetsTellsItsOwnWarnings)
+{
+    Bytes const broken = RawPdf({"<</Type/Catalog/Pages 2 0 R>>", "<</Type/Pages/Count 1/Kids[3 0 R]>>",
+                                 "<</Type/Page/MediaBox[0 0 100 50]/Contents[4 0 R]>>",
+                                 StreamObject("/Filter/NoSuch", "q")});
+    PageWriter writer;
+    DisplayList sound;
+    sound.DrawDrawing(Open(PdfSketch().Make(), 1, ""), At(20, 30, 200, 100));
+    writer.Write(sound);
+    DisplayList list;
+    list.DrawDrawing(Open(broken, 1, ""), At(20, 30, 200, 100));
+    std::vector<Warning> own;
+    EXPECT_LE(0, writer.GetExport().AddForm(list, PageWriter::Page, &own));
+    ASSERT_EQ(own.size(), 1U);
+    EXPECT_EQ(own[0].m_Code, Warning::Code::PictureMissing);
+    EXPECT_TRUE(writer.GetWarnings().empty());
+}
+
 TEST(PlacedDrawingTest, AnSvgSeesOnlyItsOwnFolder)
 {
     TemporaryFolder folder;

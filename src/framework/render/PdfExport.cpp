@@ -263,6 +263,7 @@ int PdfExport::AddForm(DisplayList const & content, Kernel::Rect const & bounds,
     try {
         PdfResources & resources = state.m_File.m_Resources;
         state.m_Pictures.BeginPage(++state.m_FormPages, warnings);
+        state.m_Drawings.BeginPage(state.m_FormPages, warnings);
         PdfUses uses;
         std::string text = state.m_Content.Write({}, {&content}, PdfContent::ToForm, uses);
         state.WarnOfContent(warnings);
