@@ -61,6 +61,18 @@ TEST(OldVersionTest, ADocumentOfTheFirstFormatIsBroughtUpToDateInMemory)
     EXPECT_EQ(folder.ReadFile("old.kvdoc"), bytes);
 }
 
+TEST(OldVersionTest, TheLastProgramsOfTheFirstFormatWroteABleedForEachSide)
+{
+    TemporaryFolder const folder;
+    auto const document = LoadTestDocument(WriteOldDocument(folder, "old.kvdoc", "version-1-four-bleeds.kvdoc"), nullptr);
+    ASSERT_TRUE(document);
+    EXPECT_TRUE(document->IsFromOlderVersion());
+    EXPECT_EQ(document->GetDocument()->GetPageCount(), 2);
+    Kernel::RectT<double> const bleed = document->GetDocument()->GetPageSetup().m_Bleed;
+    EXPECT_NEAR(bleed.top, ThreeMillimetres, 1e-3);
+    EXPECT_EQ(document->GetDocument()->GetSpreadAtIndex(0)->GetPages().front().m_Bleed.top, bleed.top);
+}
+
 TEST(OldVersionTest, TheUpgradeWritesThePresentFormatAndLosesNothing)
 {
     TemporaryFolder const folder;

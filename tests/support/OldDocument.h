@@ -7,10 +7,11 @@
 #include <fstream>
 #include <iterator>
 
-/// Copies a document that was written in format 1 into the folder, and gives its path.
-inline String WriteOldDocument(TemporaryFolder const & folder, std::string_view name)
+/// Copies one of the documents of tests/data, written in format 1, into the folder, and gives its path.
+inline String WriteOldDocument(TemporaryFolder const & folder, std::string_view name,
+                               std::string const & kept = "version-1.kvdoc")
 {
-    std::ifstream source(KORVANE_SOURCE_FOLDER "/tests/data/version-1.kvdoc", std::ios::binary);
+    std::ifstream source(KORVANE_SOURCE_FOLDER "/tests/data/" + kept, std::ios::binary);
     EXPECT_TRUE(source.is_open());
     return folder.WriteFile(name, std::string(std::istreambuf_iterator<char>(source), {}));
 }

@@ -137,12 +137,11 @@ void PageSetupRecord::Save(OutSerialiser & out) const
 bool PageSetupRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short version)
 {
     in.LoadType(IDTag("size"), m_Setup.m_PageSize);
-    if (version < FourBleedsVersion) {
-        double bleed = 0;
-        in.LoadType(IDTag("bled"), bleed);
+    // The last programs of format 1 wrote four bleeds already, the first ones a single number.
+    double bleed = 0;
+    if (!in.LoadType(IDTag("bled"), m_Setup.m_Bleed) && version < FourBleedsVersion &&
+        in.LoadType(IDTag("bled"), bleed)) {
         m_Setup.m_Bleed = {bleed, bleed, bleed, bleed};
-    } else {
-        in.LoadType(IDTag("bled"), m_Setup.m_Bleed);
     }
     in.LoadType(IDTag("facg"), m_Setup.m_FacingPages);
     in.LoadType(IDTag("vert"), m_Setup.m_VerticalStack);
@@ -345,8 +344,6 @@ void SpreadRecord::Save(OutSerialiser & out) const
 
 bool SpreadRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned short version)
 {
-    m_LacksBleed = version < FourBleedsVersion;
-    std::size_t const perPage = m_LacksBleed ? 4 : 8;
     in.LoadType(IDTag("name"), m_Name);
     std::vector<double> numbers;
     std::vector<std::uint8_t> sides;
@@ -358,6 +355,8 @@ bool SpreadRecord::Load(InSerialiser const & in, Kernel::FileStore &, unsigned s
     in.LoadArray(IDTag("text"), textRects);
     in.LoadType(IDTag("trbg"), m_TransparentBackground);
     in.LoadObjects(IDTag("item"), m_Items);
+    m_LacksBleed = version < FourBleedsVersion && numbers.size() == 4 * sides.size();
+    std::size_t const perPage = m_LacksBleed ? 4 : 8;
     if (numbers.size() != perPage * sides.size() || masters.size() != sides.size() || 0 != textRects.size() % 4 ||
         sides.empty()) {
         return false;
