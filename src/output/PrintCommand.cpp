@@ -43,8 +43,6 @@ private:
     std::function<void(DocumentController &)> m_Draw;
 };
 
-CommandRegistration const s_DrawPages(typeid(DrawPagesCommand), "Book::DrawPagesCommand");
-
 }
 
 PrintCommand::PrintCommand(std::vector<PaginatorPage> sheets, PrintSettings const & settings)

@@ -57,6 +57,8 @@ constexpr CommandRow BookCommands[] = {
     {0x534D4943, "Book::SetMasterIndexCommand", "Update Index", "Book Command"},
     {0x52634143, "Book::ReconcileAnchorsCommand", "Reconcile Anchors", "Book Command"},
     {0x45784243, "Book::ExportBookCommand", "Export Book", "Book Commands", DomainCommand::ShowProgress},
+    {0x50724243, "Book::PrintBookCommand", "Print Book", "Book Commands", DomainCommand::ShowProgress},
+    {0x50725066, "Book::PrintProofCommand", "Print Book", "Book Commands", DomainCommand::ShowProgress},
 };
 
 }
