@@ -117,15 +117,20 @@ void MakePackage(BookEdit & edit, PackageOptions const & options)
         String("kvdoc"));
     edit.m_Session.Run(command);
     edit.m_Session.WaitForRest();
+    if (!command->GetResult().IsSuccess()) {
+        // What kept the book from being written, a full disk as a rule, has met the files before it as well.
+        edit.m_Messages.Error("book-unsaved", {target.string()},
+                              Import::DescribeSaveFailure(command->GetResult(), (target / book.filename()).string()));
+        return;
+    }
+    if (Interruption::IsRaised()) {
+        edit.m_Messages.Error("interrupted", {target.string()}, Text("Interrupted; no package was made.", "Program"));
+        return;
+    }
     for (auto const & problem : command->GetProblems()) {
         edit.m_Messages.Warn("package", {problem.m_Path.ToStd()}, problem.m_Text.ToStd());
     }
-    if (!command->GetResult().IsSuccess()) {
-        edit.m_Messages.Error("book-unsaved", {target.string()},
-                              Import::DescribeSaveFailure(command->GetResult(), (target / book.filename()).string()));
-    } else if (Interruption::IsRaised()) {
-        edit.m_Messages.Error("interrupted", {target.string()}, Text("Interrupted; no package was made.", "Program"));
-    } else if (folder.Finish(edit.m_Messages)) {
+    if (folder.Finish(edit.m_Messages)) {
         edit.m_Result["target"] = (target / book.filename()).string();
         edit.Say(Text("Packaged into %1.", "Program", target.string()));
     }
