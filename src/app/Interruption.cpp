@@ -32,8 +32,10 @@ Interruption::Interruption()
     for (int const signal : {SIGINT, SIGTERM, SIGHUP}) {
         sigaction(signal, &action, nullptr);
     }
-    // Writing into a closed pipe is an error to report, not a reason to die half-way.
+    // Writing into a closed pipe, or beyond the user's limit on file sizes, is an error to report, not a reason to die
+    // half-way.
     std::signal(SIGPIPE, SIG_IGN);
+    std::signal(SIGXFSZ, SIG_IGN);
 }
 
 Interruption::~Interruption()

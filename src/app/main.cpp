@@ -2,7 +2,6 @@
 #include "app/PasswordBook.h"
 #include "app/Verbs.h"
 
-#include <csignal>
 #include <cstdlib>
 #include <iostream>
 #include <string_view>
@@ -38,8 +37,6 @@ App::TerminalFacts LookAtTerminal()
 int main(int argc, char ** argv)
 {
     App::ChooseLanguage();
-    // A file beyond the user's size limit is an error of that file, to be told like any other.
-    std::signal(SIGXFSZ, SIG_IGN);
     bool const canAsk = isatty(STDIN_FILENO) && isatty(STDERR_FILENO);
     std::vector<std::string> const arguments(argv + 1, argv + argc);
     App::HidePasswords(argc, argv);
