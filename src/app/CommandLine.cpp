@@ -109,8 +109,11 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     Interruption const interruption;
     Console console(out, err, verbs.Settings(), terminal);
     if (ask) {
-        verbs.Answers().m_Passwords->SetAsk([&console, ask](std::string const & question, std::string & answer) {
-            console.EndProgress();
+        ask = [&console, ask = std::move(ask)](std::string const & question, std::string & answer) {
+            Console::Pause const pause(console);
+            return ask(question, answer);
+        };
+        verbs.Answers().m_Passwords->SetAsk([ask](std::string const & question, std::string & answer) {
             EchoOff const noEcho;
             return ask(question, answer);
         });

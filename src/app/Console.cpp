@@ -30,6 +30,19 @@ Console::~Console()
     EndProgress();
 }
 
+Console::Pause::Pause(Console & console) : m_Console(console)
+{
+    std::lock_guard const lock(m_Console.m_Lock);
+    m_Console.EraseBar();
+    ++m_Console.m_Pauses;
+}
+
+Console::Pause::~Pause()
+{
+    std::lock_guard const lock(m_Console.m_Lock);
+    --m_Console.m_Pauses;
+}
+
 void Console::EraseBar()
 {
     if (m_HasBar) {
@@ -104,7 +117,7 @@ void Console::Error(std::string const & text)
 void Console::Progress(std::string const & step, double fraction)
 {
     std::lock_guard const lock(m_Lock);
-    if (m_Settings.m_IsQuiet || m_Settings.m_IsJson) {
+    if (m_Settings.m_IsQuiet || m_Settings.m_IsJson || 0 < m_Pauses) {
         return;
     }
     int const percent = static_cast<int>(std::clamp(fraction, 0.0, 1.0) * 100);

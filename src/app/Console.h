@@ -34,6 +34,19 @@ struct TerminalFacts
 class Console
 {
 public:
+    /// While one exists, the progress bar is away and stays away: a question stands on the terminal in its place.
+    class Pause
+    {
+    public:
+        explicit Pause(Console & console);
+        ~Pause();
+        Pause(Pause const &) = delete;
+        Pause & operator=(Pause const &) = delete;
+
+    private:
+        Console & m_Console;
+    };
+
     Console(std::ostream & out, std::ostream & err, ConsoleSettings settings, TerminalFacts terminal);
     ~Console();
 
@@ -66,6 +79,7 @@ private:
     std::string m_Step;
     int m_Percent = -1;
     bool m_HasBar = false;
+    int m_Pauses = 0;
 };
 
 }

@@ -129,7 +129,6 @@ void Listener::Notify(Kernel::Counted<Kernel::Notification> notification)
 
 bool Listener::Ask(std::string const & question, char const * option, std::string & answer)
 {
-    m_Console.EndProgress();
     if (m_Ask && m_Ask(question, answer)) {
         return true;
     }
@@ -163,7 +162,6 @@ void Listener::AnswerPrompt(DocumentPromptNotification const & prompt)
 
 void Listener::AnswerFile(Book::ChooseChapterFileNotification const & prompt)
 {
-    m_Console.EndProgress();
     std::string const question =
         Text("%1: where is %2 now? (nothing ends the search)", "Program", prompt.GetTitle(), prompt.GetCurrentPath());
     std::string answer;
@@ -216,7 +214,6 @@ void Listener::AnswerPermission(Book::PromptFixBookPermissionsNotification const
     if (std::size_t const place = question.find("%@"); std::string::npos != place) {
         question.replace(place, 2, path);
     }
-    m_Console.EndProgress();
     std::string answer;
     if (!m_Ask || !m_Ask(question + " " + Text("[r]etry, [i]gnore this file, ignore [a]ll:", "Program"), answer)) {
         Add(Import::Severity::Error, "chapter-denied", path,
