@@ -447,12 +447,13 @@ TEST_F(SaveFailureTest, AProcessThatIsKilledWhileItSavesLeavesOneVersionOrTheOth
         ASSERT_TRUE(chapters == Few || chapters == Many) << chapters;
         changes += chapters != last;
         last = chapters;
-        // One more than the last one's only after a kill between making the new file and clearing up.
-        ASSERT_LE(NamesIn(m_Folder).size(), 5u) << "what is left does not pile up";
+        if (kill % 25 == 24) {
+            ASSERT_EQ(SaveCode(*books[0], m_Path), 0);
+            ASSERT_EQ(NamesIn(m_Folder), std::vector<String>{"book.kvbook"}) << "a save that ends clears up for the others";
+            last = Few;
+        }
     }
     EXPECT_GT(changes, 0) << "some came through";
-    EXPECT_EQ(SaveCode(*m_Book, m_Path), 0);
-    EXPECT_EQ(NamesIn(m_Folder), std::vector<String>{"book.kvbook"});
 }
 
 TEST_F(SaveFailureTest, ASaveRemovesNothingButItsOwnLeftovers)
