@@ -19,6 +19,8 @@ public:
     void Save(Kernel::OutSerialiser &) const override {}
     /// False: nobody keeps such a command for later.
     bool Load(Kernel::InSerialiser const &, Kernel::FileStore &, unsigned short) override { return false; }
+    /// Those of no class: what a stream was given of such a command reads back as null.
+    [[nodiscard]] Kernel::ClassProperties const & GetObjectClassProperties() const override;
 };
 
 }

@@ -37,8 +37,9 @@ void BookCollection::AddBookController(Kernel::Counted<BookController> book)
         return;
     }
     books.push_back(book);
-    m_Books.Set(Snapshot(std::move(books)));
+    // In both lists at once: who finds it among the open books may put it in front.
     Kernel::ScopedLock const recentLock(m_RecentBooksLock);
+    m_Books.Set(Snapshot(std::move(books)));
     m_RecentBooks.push_back(std::move(book));
 }
 
@@ -82,7 +83,11 @@ BookCollection::GetMutableBookController(Kernel::Counted<BookController const> b
 
 void BookCollection::SetUIActiveBookController(Kernel::Counted<BookController const> book)
 {
-    m_UIActiveBook.Set(std::move(book));
+    // Against a removal at the same moment: it would clear what is put in front here, or leave the book that goes.
+    Kernel::ScopedLock const lock(m_RecentBooksLock);
+    if (!book || std::find(m_RecentBooks.begin(), m_RecentBooks.end(), book) != m_RecentBooks.end()) {
+        m_UIActiveBook.Set(std::move(book));
+    }
 }
 
 void BookCollection::SetActiveBookController(String path)

@@ -126,6 +126,14 @@ TEST(CommandTableTest, TheCommandsOfApplicationAndDocumentsStandApart)
     EXPECT_STREQ(CommandCoverage::Instance().FindName(typeid(ExportToPDFCommand)), "Book::ExportToPDFCommand");
 }
 
+TEST(CommandTableTest, ACommandOfABackgroundTaskHasNoClassInStreams)
+{
+    auto const command = MakeCounted<UpdateChaptersCommand>(true);
+    EXPECT_EQ(command->GetObjectClassProperties().GetClassUID(), Kernel::ClassUID());
+    EXPECT_EQ(Kernel::ClassProperties::Find(Kernel::ClassUID()), nullptr);
+    EXPECT_FALSE(command->GetObjectClassProperties().IsKindOf(BookCommand::GetTypeClassProperties()));
+}
+
 TEST(CommandTableTest, ACommandLearnsItsBookFromTheQueueAndRefusesOtherDomains)
 {
     auto const book = MakeCounted<BookController>();

@@ -120,6 +120,34 @@ TEST(ReaderWriterLockTest, WhoHoldsItInAnyFormReadsAtOnceAlsoWithAWriterWaiting)
     writer.join();
 }
 
+TEST(ReaderWriterLockTest, AWriterThatGoesOnReadingKeepsOtherWritersOut)
+{
+    struct Counting : TestDomain
+    {
+        void OnAcquireReaderLock() const override { ++m_Reading; }
+        void OnReleaseReaderLock() const override { --m_Reading; }
+        mutable int m_Reading = 0;
+    };
+    auto const domain = MakeCounted<Counting>();
+    domain->AcquireWriterLock();
+    domain->AcquireReaderLock();
+    EXPECT_EQ(domain->m_Reading, 0) << "covered by the writing";
+    domain->ReleaseWriterLock();
+    EXPECT_EQ(domain->m_Reading, 1);
+    std::atomic<bool> written{false};
+    std::thread writer([&] {
+        domain->AcquireWriterLock();
+        written = true;
+        domain->ReleaseWriterLock();
+    });
+    Await([&] { return written || domain->IsWriterWaiting(); });
+    EXPECT_FALSE(written);
+    domain->ReleaseReaderLock();
+    writer.join();
+    EXPECT_TRUE(written);
+    EXPECT_EQ(domain->m_Reading, 0);
+}
+
 TEST(ReaderWriterLockTest, TheHooksAreCalledForTheOutermostReadOnly)
 {
     struct Counting : TestDomain

@@ -198,7 +198,9 @@ void DomainController::AcquireWriterLock()
 
 void DomainController::ReleaseWriterLock()
 {
-    m_Lock->ReleaseWriter();
+    if (m_Lock->ReleaseWriter()) {
+        OnAcquireReaderLock();
+    }
 }
 
 bool DomainController::IsWriterLockHeld() const

@@ -214,15 +214,22 @@ void ReaderWriterLock::AwaitReturn()
     WaitGraph::EndWait(*thread);
 }
 
-void ReaderWriterLock::ReleaseWriter()
+bool ReaderWriterLock::ReleaseWriter()
 {
+    ThreadNode const & thread = *ThreadNode::CurrentPointer();
     std::lock_guard const lock(m_Lock);
-    KORVANE_ASSERT_MESSAGE(IsWriter(*ThreadNode::CurrentPointer()),
-                           "a writer lock is released by a thread that does not hold it");
+    KORVANE_ASSERT_MESSAGE(IsWriter(thread), "a writer lock is released by a thread that does not hold it");
     if (--m_Levels.back().m_Depth > 0) {
-        return;
+        return false;
+    }
+    // With a lender below it the lender's lock still covers the reading.
+    Reader * const reading = m_Levels.size() == 1 ? FindReader(thread, true) : nullptr;
+    if (reading) {
+        reading->m_UnderWriter = false;
+        ++m_PlainReaders;
     }
     PopLevel();
+    return reading != nullptr;
 }
 
 int ReaderWriterLock::SetAside()

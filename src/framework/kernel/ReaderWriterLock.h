@@ -34,7 +34,8 @@ public:
     /// behind it, the second ends the asking.
     using Periodic = std::function<void(bool & letReadersIn, bool & quiet)>;
     void AcquireWriter(Periodic const & periodic);
-    void ReleaseWriter();
+    /// True if the thread goes on reading: what it read under its own writing keeps writers out from now on.
+    bool ReleaseWriter();
 
     /// Gives the thread's hold up, however deep it is; a lock that it has borrowed goes back to the lender. The result
     /// is for `TakeBack`; 0 if the thread does not hold it for writing.
