@@ -144,13 +144,18 @@ void ExportPdfWalk::AddMerged(Kernel::JailCounted<SpreadNode> const & spread, Ex
     Kernel::JailCounted<SpreadNode> const second =
         document ? document->GetDocument()->GetSpreadAtIndex(last.m_Spread) : nullptr;
     if (second) {
-        // The flag of the chapter before the current one decides here; imposed files rely on it.
-        Transform const beside = second->GetPageCount() == 1
-                                     ? Beside(second->GetPageExtents(last.m_Page, false), m_PreviousVertical)
-                                     : Transform();
-        pages->AddPage(second, last.m_Page, beside);
+        Kernel::Rect const extents = second->GetPageExtents(last.m_Page, false);
+        // The flag of the chapter before the current one decides here; imposed files rely on it. A page of a spread of
+        // two keeps its place on the spread.
+        pages->AddPage(second, last.m_Page,
+                       second->GetPageCount() == 1 ? Beside(extents, m_PreviousVertical)
+                                                   : Transform::Translation(extents.left, extents.top));
     }
     Add(pages);
+    if (document) {
+        // The second page's links are looked up in its own document.
+        m_PreviousDocument = document;
+    }
     RunBatch();
     if (document) {
         if (m_Options->GetBookmarks() && chapter != m_Current) {

@@ -142,7 +142,7 @@ void ExportToPDFCommand::CollatePageHyperlinks(ExportableInterface::ExportParams
         HyperlinkVisitor::CollateForExport(document, spread, found);
         for (Kernel::Counted<HyperlinkData> const & link : found) {
             if (link->m_IsActive) {
-                CollateLink(links, *link, spread, document, page.m_Rect, page.TransformOf(index));
+                CollateLink(links, *link, spread, document, page, index);
             }
         }
     }
@@ -151,11 +151,15 @@ void ExportToPDFCommand::CollatePageHyperlinks(ExportableInterface::ExportParams
 void ExportToPDFCommand::CollateLink(std::vector<Renderer::PdfHyperlink> & links, HyperlinkData const & link,
                                      Kernel::JailCounted<SpreadNode> const & spread,
                                      Kernel::Counted<DocumentController const> const & document,
-                                     Kernel::Rect const & page, Raster::AffineTransform::Params const & transform)
+                                     ExportableInterface::ExportParams const & page, std::size_t node)
 {
+    Raster::AffineTransform::Params const transform = page.TransformOf(node);
     std::vector<Kernel::Rect> areas;
     for (Kernel::Rect const & box : BoxesOf(link, spread)) {
-        Kernel::Rect const area = transform.MapBounds(box).Intersected(page);
+        // What of the spread is not shown, such as a page that stays out beside one that shares this output page, has no
+        // links either.
+        Kernel::Rect const shown = node < page.m_Clips.size() ? box.Intersected(page.m_Clips[node]) : box;
+        Kernel::Rect const area = transform.MapBounds(shown).Intersected(page.m_Rect);
         if (!area.IsEmpty() && area.Width() > 0 && area.Height() > 0) {
             areas.push_back(area);
         }

@@ -19,7 +19,8 @@ class ExportBookCommand;
 class ExportToPDFCommand : public ExportItemCommandBase
 {
 public:
-    /// Everything is borrowed from the export command and outlives this one. `previousDocument` may be null.
+    /// Everything is borrowed from the export command and outlives this one. `previousDocument` may be null;
+    /// nodes that are not in the command's own document, as on a page that two chapters share, are its nodes.
     ExportToPDFCommand(Renderer::RenderTree::PdfExport * pdf,
                        std::vector<Kernel::JailCounted<ExportableInterface>> exportables,
                        Kernel::Counted<Renderer::FileExportOptionsPDF const> options,
@@ -43,8 +44,8 @@ protected:
 private:
     void CollateLink(std::vector<Renderer::PdfHyperlink> & links, HyperlinkData const & link,
                      Kernel::JailCounted<SpreadNode> const & spread,
-                     Kernel::Counted<DocumentController const> const & document, Kernel::Rect const & page,
-                     Raster::AffineTransform::Params const & transform);
+                     Kernel::Counted<DocumentController const> const & document,
+                     ExportableInterface::ExportParams const & page, std::size_t node);
     /// Fills in where the link leads. False if it leads nowhere.
     bool Resolve(Renderer::PdfHyperlink & target, HyperlinkData const & link,
                  Kernel::Counted<DocumentController const> const & document);

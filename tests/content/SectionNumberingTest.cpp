@@ -70,7 +70,24 @@ INSTANTIATE_TEST_SUITE_P(
                      10, false, 0, 21, {{0, 21}}, 31},
         RenumberCase{"with nothing included the count is one more than the pages that are left",
                      {{0, 1, Restarts, Excluded}}, 10, false, 0, 21, {}, 22},
-        RenumberCase{"no section at all", {}, 3, false, 0, 21, {}, 25}));
+        RenumberCase{"no section at all", {}, 3, false, 0, 21, {}, 25},
+        RenumberCase{"in a first chapter that starts as its section says, a restart in step follows",
+                     {{0, 1, Restarts, Included}, {4, 5, Restarts, Included}}, 10, true, 1, 1, {}, 11},
+        RenumberCase{"a first chapter's start counts, not what its section said before: a restart in step with that is meant",
+                     {{0, 1, Restarts, Included}, {4, 5, Restarts, Included}}, 10, true, 7, 7, {{0, 7}}, 11},
+        RenumberCase{"and one in step with the start is not",
+                     {{0, 1, Restarts, Included}, {4, 11, Restarts, Included}}, 10, true, 7, 7, {{0, 7}}, 17},
+        RenumberCase{"a first chapter that continues goes on from nothing: what looks like page 5 behind page 1 was meant",
+                     {{0, 1, Restarts, Included}, {4, 5, Restarts, Included}}, 10, true, 0, 1, {{0, 1}}, 11},
+        RenumberCase{"while page 4 is in step with page 0",
+                     {{0, 1, Restarts, Included}, {4, 4, Restarts, Included}}, 10, true, 0, 1, {{0, 1}, {4, 5}}, 11},
+        RenumberCase{"a first chapter behind pages that stay out",
+                     {{0, 1, Restarts, Excluded}, {2, 3, RunsOn, Included}}, 10, true, 1, 1, {{2, 1}}, 9},
+        RenumberCase{"behind a number that was meant the next restart in step follows that one",
+                     {{0, 1, Restarts, Included}, {4, 100, Restarts, Included}, {6, 102, Restarts, Included}},
+                     10, false, 0, 21, {{0, 21}}, 106},
+        RenumberCase{"a tail that begins out of step counts from its first page",
+                     {{0, 1, Restarts, Included}, {4, 50, Restarts, Excluded}}, 10, false, 0, 21, {{0, 21}}, 25}));
 
 struct FollowCase
 {
@@ -103,7 +120,11 @@ INSTANTIATE_TEST_SUITE_P(
                                12, 1, 39},
                     FollowCase{"leading excluded pages are taken off",
                                {{0, 31, Restarts, Excluded}, {2, 33, RunsOn, Included}}, 12, 1, 41},
-                    FollowCase{"nothing included", {{0, 31, Restarts, Excluded}}, 12, 1, 43}));
+                    FollowCase{"nothing included", {{0, 31, Restarts, Excluded}}, 12, 1, 43},
+                    FollowCase{"no restart: one more than the pages", {{0, 1, RunsOn, Included}}, 12, 5, 18},
+                    FollowCase{"an included section ends the tail",
+                               {{0, 31, Restarts, Included}, {6, 37, RunsOn, Excluded}, {8, 39, RunsOn, Included}},
+                               12, 1, 43}));
 
 }
 

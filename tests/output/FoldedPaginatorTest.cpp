@@ -55,6 +55,10 @@ TEST(FoldedPaginatorTest, PagesAreImposedSoThatTheFoldedSheetsReadInOrder)
              OrderRow{"one page: the sheet's back is two blanks and is dropped", 1, false, {". 0"}, {". 0"}},
              OrderRow{"a blank in front", 3, true, {"2 .", "0 1"}, {"2 .", "0 1"}},
              OrderRow{"a blank in front begins a further sheet", 4, true, {"2 .", "0 1", ". 3"}, {"0 .", ". 1", "2 3"}},
+             OrderRow{"two pages on both sides of one leaf", 2, false, {". 0", "1 ."}, {". 0", "1 ."}},
+             OrderRow{"a blank in front and blanks behind", 5, true, {"2 .", "0 1", ". 3", "4 ."}, {"0 .", "4 1", "2 3"}},
+             OrderRow{"three sheets", 12, false, {"3 0", "1 2", "7 4", "5 6", "11 8", "9 10"},
+                      {"11 0", "1 10", "9 2", "3 8", "7 4", "5 6"}},
              OrderRow{"no page", 0, false, {}, {}},
              OrderRow{"nothing but the blank", 0, true, {}, {}},
          }) {
@@ -99,6 +103,21 @@ TEST(FoldedPaginatorTest, StackedPagesAreBothCutAtTheFold)
     EXPECT_EQ(Describe(Lay(PaginatorBook(true, true), pages, {0}), Targets | Bleeds | Frame),
               (Lines{"0:(0 0 100 40)>(0 0 100 40) bleed(-3 -3 103 40) 1:(0 0 100 40)>(0 40 100 80) bleed(-3 0 103 43) "
                      "(0 0 100 80) o2 p0 x1"}));
+}
+
+TEST(FoldedPaginatorTest, TheBleedOfASmallPageReachesThroughItsCellToTheFold)
+{
+    // 60 by 120 in a cell of 100 by 200, away from the origin of its spread: 20 and 40 lie between page and cell.
+    Kernel::Rect const small{200, 10, 260, 130};
+    std::vector<PaginatorSource> const pages = Sources({small, {0, 0, 100, 200}, small}, {50, 50, 50, 50});
+    EXPECT_EQ(Describe(Lay(PaginatorBook(false, false), pages, {0, 2}), Targets | Bleeds),
+              (Lines{"0:(200 10 260 130)>(120 40 180 160) bleed(180 -40 310 180)",
+                     "1:(0 0 100 200)>(0 0 100 200) bleed(-50 -50 150 250) 2:(200 10 260 130)>(120 40 180 160) "
+                     "bleed(180 -40 310 180)"}));
+    EXPECT_EQ(Describe(Lay(PaginatorBook(true, true), pages, {0, 2}), Targets | Bleeds),
+              (Lines{"2:(200 10 260 130)>(20 40 80 160) bleed(150 -40 310 170)",
+                     "0:(200 10 260 130)>(20 40 80 160) bleed(150 -40 310 170) 1:(0 0 100 200)>(0 200 100 400) "
+                     "bleed(-50 0 150 250)"}));
 }
 
 TEST(FoldedPaginatorTest, PagesWithoutSizeDoNoHarm)

@@ -118,6 +118,8 @@ TEST(PaginatorSingleTest, EachPageHasASheetInItsOwnCoordinates)
     EXPECT_EQ(Describe(Lay(PaginatorSingle(), NoPaper, pages, {1, 1, 0}, FitTypeShrink, OrientationPortrait, 0.5), Frame),
               (Lines{"(100 0 400 200) o1 p768 x1", "(100 0 400 200) o1 p768 x1", "(0 0 100 200) o1 p768 x1"}))
         << "in the order of the choice, repeats included";
+    EXPECT_EQ(Describe(Lay(PaginatorSingle(), NoPaper, pages, {0}, FitTypeFill, OrientationLandscape, 0.5), Frame),
+              (Lines{"(0 0 100 200) o2 p512 x1"}));
     EXPECT_TRUE(Lay(PaginatorSingle(), NoPaper, pages, {-1, 3, 2000000000}).empty()) << "no such pages";
     EXPECT_TRUE(Lay(PaginatorSingle(), NoPaper, {}).empty());
 }
@@ -181,6 +183,27 @@ TEST(PaginatorTiledTest, PaperScaleAndOrientationDecideTheTiles)
                      {0, 0, 90, 100}, {0, 0, 100, 200}, 0, OrientationPortrait, 2,
                      {"0:(0 0 90 100)>(10 0 55 50) (10 0 55 50) o1 p16 x2 17@10,0 20@10,50",
                       "0:(90 0 90 100)>(0 0 0 50) (0 0 0 0) o1 p8 x2 65@0,0 68@0,50"}},
+             TileRow{"a tie with a wide page: the paper is turned", {0, 0, 120, 60}, {0, 0, 130, 140}, 10, OrientationAuto, 1,
+                     {"0:(0 0 120 60)>(10 35 130 95) (10 35 130 95) o2 p0 x1 17@10,35 65@130,35 20@10,95 68@130,95"}},
+             TileRow{"turned paper loses its fractions of a point", {0, 0, 100, 200}, {0, 0, 100.75, 200.875}, 0,
+                     OrientationLandscape, 1,
+                     {"0:(0 0 100 100)>(50 0 150 100) (50 0 150 100) o2 p64 x1 17@50,0 65@150,0",
+                      "0:(0 100 100 200)>(50 0 150 100) (50 0 150 100) o2 p2 x1 20@50,100 68@150,100"}},
+             TileRow{"an overlap of half a point: tiles are counted in whole ones", {0, 0, 199, 50}, {0, 0, 100, 100}, 0.5,
+                     OrientationAuto, 1,
+                     {"0:(0 0 99.75 50)>(0.25 25 100 75) (0.25 25 100 75) o2 p16 x1 17@0.25,25 20@0.25,75",
+                      "0:(99.25 0 199 50)>(0 25 99.75 75) (0 25 99.75 75) o2 p8 x1 65@99.75,25 68@99.75,75"}},
+             TileRow{"paper away from the origin: tiles end at its right and lower edges and begin at nothing",
+                     {0, 0, 150, 150}, {10, 20, 110, 220}, 0, OrientationAuto, 1,
+                     {"0:(0 0 85 150)>(25 25 110 175) (25 25 110 175) o1 p16 x1 17@25,25 20@25,175",
+                      "0:(85 0 150 150)>(0 25 65 175) (0 25 65 175) o1 p8 x1 65@65,25 68@65,175"}},
+             TileRow{"scale 0.5: counted for the halved page, and each tile covers half the paper; the overlap is doubled",
+                     {0, 0, 400, 300}, {0, 0, 100, 120}, 20, OrientationAuto, 0.5,
+                     {"0:(0 0 55 42.5)>(10 15 120 100) (10 15 120 100) o2 p128 x0.5 17@10,15",
+                      "0:(0 2.5 55 52.5)>(10 0 120 100) (10 0 120 100) o2 p4 x0.5 20@10,100",
+                      "0:(15 0 75 42.5)>(0 15 120 100) (0 15 120 100) o2 p32 x0.5 65@120,15",
+                      "0:(15 2.5 75 52.5)>(0 0 120 100) (0 0 120 100) o2 p1 x0.5 68@120,100"}},
+             TileRow{"a page that is nothing", Kernel::Rect::Empty(), {0, 0, 50, 50}, 0, OrientationAuto, 1, {}},
              TileRow{"no paper: as single pages", {0, 0, 100, 200}, {0, 0, 0, 50}, 10, OrientationAuto, 0.5,
                      {"0:(0 0 100 200)>(0 0 100 200) (0 0 100 200) o1 p0 x0.5 17@0,0 65@100,0 20@0,200 68@100,200"}},
              TileRow{"the overlap is wider than the paper: no tile gets anywhere", {0, 0, 100, 200}, {0, 0, 50, 50}, 60,
@@ -226,6 +249,8 @@ TEST(PaginatorNUpTest, PagesFillTheCellsRowByRow)
              NUpRow{"skipped cells", PaginatorNUp(2, 2, 1, 3, 0, 0, 0, 0, false), 2, {"0", "1"}},
              NUpRow{"more skipped than a sheet has", PaginatorNUp(2, 1, 1, 5, 0, 0, 0, 0, false), 1, {"-", "-", "0"}},
              NUpRow{"no columns and rows: one cell", PaginatorNUp(0, -3, 0, -1, 0, 0, 0, 0, false), 2, {"0", "1"}},
+             NUpRow{"skipped, repeated and filled up", PaginatorNUp(2, 2, 3, 1, 0, 0, 0, 0, true), 2, {"0 0 0", "1 1 1 0"}},
+             NUpRow{"skipped cells that end with a sheet", PaginatorNUp(2, 1, 1, 2, 0, 0, 0, 0, false), 1, {"-", "0"}},
              NUpRow{"pages that end with the sheet", PaginatorNUp(2, 1, 1, 0, 0, 0, 0, 0, true), 2, {"0 1"}},
              NUpRow{"no pages", PaginatorNUp(2, 2, 1, 1, 0, 0, 0, 0, true), 0, {}},
          }) {
@@ -248,6 +273,20 @@ TEST(PaginatorNUpTest, CellsHaveTheSizeOfTheLargestPageWithMarginsAndGapsBetween
               (Lines{"33@125,30 65@225,30 40@125,230 72@225,230 18@20,287 130@80,287 20@20,537 132@80,537 34@125,287 "
                      "66@135,287 36@125,297 68@135,297"}))
         << "four for each page, on its own corners";
+}
+
+TEST(PaginatorNUpTest, BleedWidensTheCellsByTheLargestMarginsAndLeavesThePagesTheirSize)
+{
+    std::vector<PaginatorSource> pages = Sources({{0, 0, 100, 200}, {-20, -10, 70, 210}}, {1, 2, 3, 4});
+    pages[1].m_PageBox = {10, 0, 20, -30};
+    // 100 + 4 by 200 + 6, and 90 + 30 by 220 - 30.
+    EXPECT_EQ(Describe(Lay(PaginatorNUp(1, 2, 1, 0, 5, 6, 50, 8, false), NoPaper, pages, {1, 0, 1}, FitTypeScale,
+                           OrientationLandscape, 2, true),
+                       Targets | Bleeds | Frame),
+              (Lines{"1:(-20 -10 70 210)>(5 6 95 226) bleed(-30 -10 90 180) 0:(0 0 100 200)>(5 220 105 420) "
+                     "bleed(-1 -2 103 204) (5 6 125 426) o2 p1025 x2",
+                     "1:(-20 -10 70 210)>(5 6 95 226) bleed(-30 -10 90 180) (5 6 125 426) o2 p1025 x2"}));
+    EXPECT_EQ(Lay(PaginatorNUp(2, 1, 1, 0, 0, 0, 0, 0, false), NoPaper, pages)[0].m_Bleed, (Kernel::Rect{10, 2, 20, 4}));
 }
 
 TEST(PaginatorNUpTest, FittingAndShapeDecideTheFrame)

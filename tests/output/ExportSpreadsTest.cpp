@@ -1,0 +1,225 @@
+// Books that go out spread by spread: what shares an output page, where it stands on it, and where links lead then.
+
+#include "commands/SetStrayHandlingCommand.h"
+#include "core/BookCollection.h"
+#include "framework/render/FileExportOptions.h"
+#include "framework/story/HyperlinkData.h"
+#include "output/ExportBookCommand.h"
+#include "support/BookBuilder.h"
+#include "support/DocumentBuilder.h"
+#include "support/PdfProbe.h"
+
+#include <gtest/gtest.h>
+
+namespace Book
+{
+namespace
+{
+
+using Lines = std::vector<std::string>;
+
+constexpr double Width = 400;
+constexpr double Height = 500;
+
+/// A chapter with the word "NAMEn" on its page n, which is a bookmark.
+struct Sketch
+{
+    char const * name;
+    int pages;
+    /// Leading pages that stay out of the output.
+    int hidden = 0;
+    /// Odd numbers stand on right-hand pages.
+    unsigned int firstNumber = 1;
+    bool vertical = false;
+    /// A link on each page.
+    Kernel::Counted<Story::HyperlinkData const> link = nullptr;
+};
+
+class ExportSpreadsTest : public testing::Test
+{
+protected:
+    void SetUp() override { BookCollection::GetInstance().SetUpdatePageNumbersAutomatically(false); }
+    void TearDown() override { BookCollection::GetInstance().SetUpdatePageNumbersAutomatically(true); }
+
+    String Write(Sketch const & sketch)
+    {
+        DocumentBuilder builder;
+        DocumentSettings & settings = builder.Settings();
+        settings.m_PageSetup.m_PageSize = {Width, Height};
+        settings.m_PageSetup.m_VerticalStack = sketch.vertical;
+        settings.m_PageSetup.m_Bleed = {9, 9, 9, 9};
+        for (MasterSettings & master : settings.m_Masters) {
+            for (MasterPageSettings * const page : {&master.m_Left, &master.m_Right}) {
+                page->m_TextRect = {40, 40, Width - 40, Height - 40};
+                page->m_RunningTexts.clear();
+            }
+        }
+        DocumentSection::Values section;
+        section.m_StartNumberingAt = sketch.firstNumber;
+        section.m_IncludeOnExport = sketch.hidden == 0;
+        settings.m_Sections = {section};
+        if (sketch.hidden != 0) {
+            section.m_StartPageIndex = static_cast<unsigned int>(sketch.hidden);
+            section.m_RestartPageNumbering = false;
+            section.m_IncludeOnExport = true;
+            settings.m_Sections.push_back(section);
+        }
+        for (int page = 1; page <= sketch.pages; ++page) {
+            if (page > 1) {
+                builder.PageBreak();
+            }
+            std::string const word = sketch.name + std::to_string(page);
+            builder.Heading(word, page == 1 ? 1 : 2, "uid-" + word);
+            if (sketch.link) {
+                builder.Link("there", sketch.link);
+            }
+        }
+        String const path = m_Builder.GetFolder() / (std::string(sketch.name) + ".kvdoc");
+        builder.BuildFile(path);
+        return path;
+    }
+
+    /// The book of these chapters, exported spread by spread.
+    String const & Export(std::vector<Sketch> const & sketches, bool pad, bool merge)
+    {
+        std::vector<String> paths;
+        for (Sketch const & sketch : sketches) {
+            paths.push_back(Write(sketch));
+        }
+        auto const book = m_Builder.NewBook(paths);
+        BookBuilder::Run(book, Kernel::MakeCounted<SetStrayHandlingCommand>(pad, merge));
+        BookBuilder::Rest();
+        std::vector<Kernel::Counted<BookChapter const>> chapters;
+        book->GetChapters(chapters);
+        m_Target = m_Builder.GetFolder() / "spreads.pdf";
+        BookBuilder::Run(book,
+                         Kernel::MakeCounted<ExportBookCommand>(
+                             chapters, m_Target,
+                             Kernel::Consolidated<Renderer::FileExportOptions>(
+                                 Kernel::Counted<Renderer::FileExportOptions const>(
+                                     Kernel::MakeCounted<Renderer::FileExportOptionsPDF>())),
+                             Kernel::Size{}, false, false, false, false, nullptr));
+        m_Builder.CloseBook(book);
+        return m_Target;
+    }
+
+    /// The words in a part of a page, in points from its top left corner.
+    std::string WordsIn(int page, Kernel::Rect const & part) const
+    {
+        std::ostringstream command;
+        command << "pdftotext -f " << page << " -l " << page << " -x " << part.left << " -y " << part.top << " -W "
+                << part.Width() << " -H " << part.Height() << " '" << m_Target.ToStd() << "' - | tr -s '[:space:]' ' '";
+        std::istringstream words(RunCommand(command.str()));
+        std::string text;
+        for (std::string word; words >> word;) {
+            if (word != "\f" && word != "See" && word != "there" && word != "there.") {
+                text += (text.empty() ? "" : " ") + word;
+            }
+        }
+        return text;
+    }
+
+    /// One line an output page: what stands in its first and its second half, "a1|b1"; a lone page has one half.
+    Lines Halves(PdfProbe const & pdf, bool vertical) const
+    {
+        Lines lines;
+        for (int page = 1; page <= pdf.PageCount(); ++page) {
+            Kernel::Rect const first{0, 0, Width, Height};
+            Kernel::Rect const second = vertical ? first.Moved(0, Height) : first.Moved(Width, 0);
+            std::ostringstream alone;
+            alone << "[ 0 0 " << Width << ' ' << Height << " ]";
+            bool const isAlone = pdf.Value(std::to_string(page) + "/MediaBox") == alone.str();
+            lines.push_back(WordsIn(page, first) + (isAlone ? "" : "|" + WordsIn(page, second)));
+        }
+        return lines;
+    }
+
+    BookBuilder m_Builder;
+    String m_Target;
+};
+
+TEST_F(ExportSpreadsTest, EachPageStandsOnItsOwnSideOfTheOutputPage)
+{
+    struct Row
+    {
+        char const * why;
+        std::vector<Sketch> chapters;
+        bool pad;
+        bool merge;
+        Lines pages;
+    };
+    for (Row const & row : {
+             Row{"alone", {{"a", 2}, {"b", 1}}, false, false, {"a1", "a2", "b1"}},
+             Row{"two chapters share a spread", {{"a", 2}, {"b", 3}}, false, true, {"a1", "a2|b1", "b2|b3"}},
+             Row{"the second begins on the right of a spread whose left-hand page stays out",
+                 {{"a", 2}, {"b", 2, 1, 2}}, false, true, {"a1", "a2|b2"}},
+             Row{"blanks behind and in front", {{"a", 2}, {"b", 3}}, true, false, {"a1", "a2|", "|b1", "b2|b3"}},
+             Row{"a blank in the place of a page that stays out", {{"a", 3}, {"b", 2, 1, 2}}, true, false,
+                 {"a1", "a2|a3", "|b2"}},
+             Row{"a lone right-hand page of a spread stands alone", {{"a", 3}, {"b", 2, 1, 2}}, false, false,
+                 {"a1", "a2|a3", "b2"}},
+         }) {
+        SCOPED_TRACE(row.why);
+        PdfProbe const pdf(Export(row.chapters, row.pad, row.merge));
+        EXPECT_EQ(pdf.Check(), "");
+        EXPECT_EQ(Halves(pdf, false), row.pages);
+    }
+}
+
+TEST_F(ExportSpreadsTest, StackedPagesStandOneBelowTheOther)
+{
+    PdfProbe const pdf(Export({{"a", 2, 0, 1, true}, {"b", 3, 0, 1, true}}, true, false));
+    EXPECT_EQ(Halves(pdf, true), (Lines{"a1", "a2|", "|b1", "b2|b3"}));
+}
+
+TEST_F(ExportSpreadsTest, LinksAndBookmarksLeadToTheirHalfOfASharedPage)
+{
+    Story::HyperlinkData::Fields fields;
+    fields.m_Type = Story::HyperlinkData::Type::Page;
+    fields.m_PageIndex = 2;
+    auto const toThirdPage = Kernel::MakeCounted<Story::HyperlinkData const>(fields);
+    PdfProbe const pdf(Export({{"a", 2, 0, 1, false, Story::HyperlinkData::ToAnchor("uid-b1", "#b1")},
+                                 {"b", 3, 0, 1, false, toThirdPage}},
+                                false, true));
+    ASSERT_EQ(Halves(pdf, false), (Lines{"a1", "a2|b1", "b2|b3"}));
+    auto const targets = [&](int page) {
+        Lines found;
+        std::istringstream lines(pdf.Links(page));
+        for (std::string line; std::getline(lines, line);) {
+            found.push_back(line.substr(line.find("-> ")));
+        }
+        return found;
+    };
+    EXPECT_EQ(targets(1), (Lines{"-> page 2 (440, 458)"})) << "to the right-hand half, where b begins";
+    ASSERT_EQ(targets(2).size(), 2u);
+    EXPECT_EQ(targets(2)[0], "-> page 2 (440, 458)");
+    EXPECT_EQ(targets(2)[1], "-> page 3 (0, 500)") << "the third page of its own chapter";
+    EXPECT_EQ(pdf.Outline(), "a -> page 1 (0, 500)\n"
+                             "  a1 -> page 1 (40, 458)\n"
+                             "    a2 -> page 2 (40, 460)\n"
+                             "b -> page 2 (400, 500)\n"
+                             "  b1 -> page 2 (440, 458)\n"
+                             "    b2 -> page 3 (40, 460)\n"
+                             "    b3 -> page 3 (440, 460)\n");
+}
+
+TEST_F(ExportSpreadsTest, BookmarksBelowOneThatStaysOutStandBesideTheChapters)
+{
+    PdfProbe const pdf(Export({{"a", 3, 1}}, false, false));
+    EXPECT_EQ(pdf.Outline(), "a -> page 1 (0, 500)\n"
+                             "a2 -> page 1 (40, 460)\n"
+                             "a3 -> page 1 (440, 460)\n");
+}
+
+TEST_F(ExportSpreadsTest, PagesThatStayOutLeaveNoLinksBehind)
+{
+    auto const away = Story::HyperlinkData::ToWeb("example.org");
+    PdfProbe const pdf(Export({{"a", 2}, {"b", 2, 1, 2, false, away}}, false, true));
+    ASSERT_EQ(Halves(pdf, false), (Lines{"a1", "a2|b2"}));
+    std::string const links = pdf.Links(2);
+    EXPECT_EQ(std::count(links.begin(), links.end(), '\n'), 1) << links;
+    EXPECT_GT(std::stod(links), Width) << "on b's own half: " << links;
+}
+
+}
+}
