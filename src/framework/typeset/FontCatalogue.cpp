@@ -1,5 +1,8 @@
 #include "framework/typeset/FontCatalogue.h"
 
+#include "framework/kernel/FileSystem.h"
+#include "framework/kernel/PathTraitsDos.h"
+
 #include <fontconfig/fontconfig.h>
 
 #include <algorithm>
@@ -114,7 +117,15 @@ FontCatalogue::FontCatalogue()
 FontCatalogue::FontCatalogue(String const & folder)
 {
     FcConfig * const config = FcConfigCreate();
-    FcConfigAppFontAddDir(config, reinterpret_cast<FcChar8 const *>(folder.c_str()));
+    std::vector<String> names;
+    Kernel::FileSystem::ListFolder(folder, names);
+    for (String const & name : names) {
+        // One by one: for a folder as a whole fontconfig wants a place for its cache, and complains of having none.
+        String const path = Kernel::PathTraitsDos::Append(folder, name);
+        if (!Kernel::FileSystem::IsFolder(path)) {
+            FcConfigAppFontAddFile(config, reinterpret_cast<FcChar8 const *>(path.c_str()));
+        }
+    }
     FcPattern * const all = FcPatternCreate();
     m_Entries = List(config, all);
     FcPatternDestroy(all);
