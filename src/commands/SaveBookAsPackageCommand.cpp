@@ -20,21 +20,25 @@ KORVANE_DEFINE_BOOK_COMMAND(SaveBookAsPackageCommand, "SBaP");
 namespace
 {
 
-/// Some systems that a package goes to see no difference between upper and lower case.
-String FoldCase(String const & path)
-{
-    std::string folded = path.ToStd();
-    std::transform(folded.begin(), folded.end(), folded.begin(),
-                   [](char c) { return 'A' <= c && c <= 'Z' ? static_cast<char>(c + 'a' - 'A') : c; });
-    return String(folded);
-}
-
 /// The text before the last separator; empty if there is none, or if that is the first character.
 String FolderOf(String const & path)
 {
     std::size_t const separator = path.View().find_last_of("/\\");
     return separator == std::string_view::npos ? String() : String(path.View().substr(0, separator));
 }
+
+/// Holds a document's lock, for work that may throw.
+class WriterLock
+{
+public:
+    explicit WriterLock(DocumentController & document) : m_Document(document) { m_Document.AcquireWriterLock(); }
+    ~WriterLock() { m_Document.ReleaseWriterLock(); }
+    WriterLock(WriterLock const &) = delete;
+    WriterLock & operator=(WriterLock const &) = delete;
+
+private:
+    DocumentController & m_Document;
+};
 
 }
 
@@ -58,7 +62,9 @@ Kernel::LocalisedString SaveBookAsPackageCommand::GetDescription() const
 
 bool SaveBookAsPackageCommand::IsTaken(String const & path, std::vector<String> const & used) const
 {
-    auto const isSame = [folded = FoldCase(path)](String const & other) { return FoldCase(other) == folded; };
+    auto const isSame = [folded = PackageFolder::Fold(path)](String const & other) {
+        return PackageFolder::Fold(other) == folded;
+    };
     if (std::any_of(used.begin(), used.end(), isSame) || Kernel::FileSystem::IsFolder(path)) {
         return true;
     }
@@ -78,7 +84,11 @@ bool SaveBookAsPackageCommand::IsTaken(String const & path, std::vector<String> 
 String SaveBookAsPackageCommand::ChooseTarget(String const & folder, String const & chapterPath,
                                               std::vector<String> const & used) const
 {
-    String const name = Kernel::Path::GetFileNameWithoutExtension(chapterPath);
+    String name = Kernel::Path::GetFileNameWithoutExtension(chapterPath);
+    if (name.Empty()) {
+        // Nothing but an extension: in the package the copy would have the folder's own name.
+        name = "chapter";
+    }
     for (int number = 1;; ++number) {
         String target = Kernel::PathTraitsDos::Append(folder, number == 1 ? name : Kernel::Format("%1-%2", name, number));
         if (!m_Extension.Empty() && Kernel::Path::GetExtension(target).Empty()) {
@@ -115,11 +125,16 @@ void SaveBookAsPackageCommand::Do()
         String const target = ChooseTarget(folder, path, used);
         Kernel::Counted<SaveDocumentAsPackageCommand> const save =
             Kernel::MakeCounted<SaveDocumentAsPackageCommand>(target, m_FirstFlag, m_SecondFlag, false);
-        // Here and not on the document's queue: the lock keeps others out for as long as it is read.
-        document->AcquireWriterLock();
-        save->PostDequeueWithMutableController(document);
-        save->Do();
-        document->ReleaseWriterLock();
+        String failure;
+        try {
+            // Here and not on the document's queue: the lock keeps others out for as long as it is read.
+            WriterLock const lock(*document);
+            save->PostDequeueWithMutableController(document);
+            save->Do();
+            failure = save->GetResult().GetText();
+        } catch (std::exception const & exception) {
+            failure = exception.what();
+        }
         book->ReleaseChapterDocument(chapter, true);
         for (String const & problem : save->GetProblems()) {
             m_Problems.push_back({path, problem});
@@ -128,7 +143,7 @@ void SaveBookAsPackageCommand::Do()
             used.push_back(target);
             packaged[chapter] = target;
         } else {
-            m_Problems.push_back({path, save->GetResult().GetText()});
+            m_Problems.push_back({path, failure});
         }
     }
     // Nothing changes the book meanwhile: its queue is busy with this command.

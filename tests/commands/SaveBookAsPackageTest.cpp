@@ -2,7 +2,9 @@
 
 #include "commands/SaveBookCommand.h"
 #include "core/BookCollection.h"
+#include "framework/commands/ModifySectionCommand.h"
 #include "framework/commands/PackageResourcesCommand.h"
+#include "framework/document/CloseDocumentCommand.h"
 #include "framework/document/DocumentControllerSession.h"
 #include "framework/document/DocumentPictures.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
@@ -235,6 +237,124 @@ TEST_F(SaveBookAsPackageTest, AChapterThatFailsKeepsItsPathAndIsToldOf)
     EXPECT_EQ(packaged->GetChapterAtIndex(1)->GetPath(), gone);
     EXPECT_EQ(packaged->GetChapterAtIndex(2)->GetPath(), last);
     EXPECT_EQ(ChapterPaths(*book), (good + "\n" + gone + "\n" + last + "\n").ToStd());
+}
+
+TEST_F(SaveBookAsPackageTest, AnyNameOfAChapterIsOneThere)
+{
+    // As chapters in folders of their own, one of them below the package's folder, and one that is a picture's folder's name.
+    std::vector<String> const sources{Write("a/ein kapitel \u00FC", {}), Write("b/two\nlines", {}), Write("c/v1.2", {}),
+                                      Write("d/", {}), Write("e/Pictures", {}), Write("f/whole.kvbook", {})};
+    FileSystem::CreateFolders(m_Target / "package/chapters");
+    String const below = m_Target / "package/chapters/below.kvdoc";
+    ASSERT_TRUE(FileSystem::CopyFile(Write("below", {}), below));
+    std::vector<String> chapters = sources;
+    chapters.push_back(below);
+    auto const book = m_Books.NewBook(chapters);
+    BookBuilder::Rest();
+    auto const command = Package(book, "kvdoc");
+    ASSERT_TRUE(command->GetResult().IsSuccess()) << command->GetResult().GetText();
+    EXPECT_TRUE(command->GetProblems().empty()) << command->GetProblems()[0].m_Text;
+    for (String const & source : chapters) {
+        ASSERT_TRUE(FileSystem::Delete(source, 0)) << source << " is where it was";
+    }
+    String const moved = Move() + "/";
+    auto const loaded = Load(moved + "whole.kvbook");
+    ASSERT_EQ(loaded->ChapterCount(), static_cast<int>(chapters.size()));
+    std::vector<std::string> names;
+    for (int i = 0; i < loaded->ChapterCount(); ++i) {
+        String const path = loaded->GetChapterAtIndex(i)->GetPath();
+        EXPECT_EQ(Kernel::Path::GetFolderWithSeparator(path), moved);
+        names.push_back(Kernel::Path::GetFileName(path).ToStd());
+        EXPECT_TRUE(LoadTestDocument(path, nullptr)) << path;
+    }
+    EXPECT_EQ(names, (std::vector<std::string>{"ein kapitel \u00FC.kvdoc", "two\nlines.kvdoc", "v1.2", "chapter.kvdoc",
+                                               "Pictures.kvdoc", "whole.kvbook-2", "below.kvdoc"}));
+}
+
+TEST_F(SaveBookAsPackageTest, AnOpenChapterGoesAsItIsOnTheScreenAndStaysOpenAndUnsaved)
+{
+    Book::BookCollection::GetInstance().SetUpdatePageNumbersAutomatically(false);
+    String const path = Write("open", {});
+    auto const book = m_Books.NewBook({path});
+    BookBuilder::Rest();
+    VantraController & application = VantraController::GetInstance();
+    OpenDocumentFailedNotification failure(path, true);
+    Counted<DocumentController const> const document = application.OpenDocument(path, failure);
+    ASSERT_TRUE(document) << failure.GetReason();
+    auto const edit = MakeCounted<ModifySectionCommand>(0U);
+    edit->SetStartNumberingAt(31);
+    ASSERT_TRUE(application.EnqueueCommandAndWait(edit, document, true));
+    BookBuilder::Rest();
+    ASSERT_TRUE(document->IsDirty());
+    ASSERT_TRUE(Package(book, "kvdoc")->GetResult().IsSuccess());
+    EXPECT_TRUE(document->IsDirty());
+    EXPECT_EQ(document->GetPath(), path);
+    EXPECT_TRUE(application.IsActiveDocumentController(document));
+    auto const copy = LoadTestDocument(m_Target / "package/open.kvdoc", nullptr);
+    ASSERT_TRUE(copy);
+    EXPECT_EQ(copy->GetDocument()->GetSection(0)->GetStartNumberingAt(), 31U);
+    auto const original = MakeCounted<DocumentController>();
+    EXPECT_TRUE(original->LoadDocument(path, false, true, LoadWhole, nullptr, failure, false));
+    EXPECT_NE(original->GetDocument()->GetSection(0)->GetStartNumberingAt(), 31U);
+    application.EnqueueCommandAndWait(MakeCounted<CloseDocumentCommand>(document, nullptr, false, false));
+    Book::BookCollection::GetInstance().SetUpdatePageNumbersAutomatically(true);
+}
+
+TEST_F(SaveBookAsPackageTest, EveryStepOfTheDiskMayFailWithoutHarmToTheBook)
+{
+    PictureSettings picture;
+    picture.m_Bytes = std::make_shared<std::vector<unsigned char> const>(Png, Png + sizeof(Png));
+    picture.m_Entry.m_SourcePath = "/nowhere/dot.png";
+    DocumentBuilder builder;
+    builder.Settings().m_Pictures.push_back(picture);
+    String const first = m_Books.GetFolder() / "first.kvdoc";
+    builder.Paragraph("Text.").Picture(DocumentPictures::IdOf(*picture.m_Bytes), 10, 10).BuildFile(first);
+    String const second = Write("second", {});
+    auto const book = m_Books.NewBook({first, second});
+    BookBuilder::Rest();
+    auto const contents = [&] {
+        return m_Books.GetFolder().ReadFile("first.kvdoc") + m_Books.GetFolder().ReadFile("second.kvdoc");
+    };
+    std::string const contentsBefore = contents();
+    std::string const before = ChapterPaths(*book);
+    using Kernel::DiskOperation;
+    for (DiskOperation const operation : {DiskOperation::Open, DiskOperation::Read, DiskOperation::Write,
+                                          DiskOperation::Flush, DiskOperation::Rename, DiskOperation::CreateFolder}) {
+        int seen = 1;
+        int harmed = 0;
+        for (int nth = 1; nth <= seen; ++nth) {
+            std::filesystem::remove_all((m_Target / "package").ToStd());
+            ASSERT_TRUE(FileSystem::CreateFolders(m_Target / "package"));
+            book->SetPath("/where/it/was.kvbook");
+            book->SetIsDirty(true);
+            Counted<SaveBookAsPackageCommand> command;
+            {
+                Kernel::DiskFaultFromNth const fault(operation, nth, EIO);
+                command = Package(book, "kvdoc");
+                BookBuilder::Rest();
+                seen = fault.Seen();
+            }
+            std::string const where = "operation " + std::to_string(static_cast<int>(operation)) + ", the " +
+                                      std::to_string(nth) + ". time of " + std::to_string(seen);
+            bool const isWritten = command->GetResult().IsSuccess();
+            EXPECT_EQ(book->IsDirty(), !isWritten) << where;
+            EXPECT_EQ(book->GetPath(), isWritten ? m_Target / "package/whole.kvbook" : "/where/it/was.kvbook") << where;
+            EXPECT_EQ(ChapterPaths(*book), before) << where;
+            harmed += !isWritten || !command->GetProblems().empty();
+            for (auto const & problem : command->GetProblems()) {
+                EXPECT_FALSE(problem.m_Text.Empty()) << where;
+            }
+            if (isWritten) {
+                // What the package's book names is there: a whole copy, or the chapter itself.
+                auto const packaged = Load(m_Target / "package/whole.kvbook");
+                for (int i = 0; i < 2; ++i) {
+                    EXPECT_TRUE(LoadTestDocument(packaged->GetChapterAtIndex(i)->GetPath(), nullptr)) << where;
+                }
+            }
+        }
+        EXPECT_GT(harmed, 0) << static_cast<int>(operation);
+    }
+    EXPECT_TRUE(contents() == contentsBefore) << "the chapters themselves are left alone";
 }
 
 TEST_F(SaveBookAsPackageTest, WithoutItsFolderNothingIsMade)

@@ -5,18 +5,16 @@
 #include "framework/document/PictureNode.h"
 #include "framework/document/RunningTextNode.h"
 #include "framework/document/TextFlow.h"
-#include "framework/kernel/FileInStream.h"
-#include "framework/kernel/FileOutStream.h"
 #include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Format.h"
-#include "framework/kernel/MemoryStreams.h"
 #include "framework/kernel/Path.h"
 #include "framework/kernel/PathTraitsDos.h"
+#include "framework/render/SvgReader.h"
 #include "framework/story/StyleSheet.h"
 #include "framework/typeset/FontLibrary.h"
 
 #include <algorithm>
-#include <optional>
+#include <set>
 
 namespace
 {
@@ -39,7 +37,7 @@ bool MayGoAlong(Typeset::FontFace const & face)
 class PlacedThings : public DOMVisitorT<PlacedThings>
 {
 public:
-    PlacedThings()
+    explicit PlacedThings(DocumentPictures const & pictures) : m_Pictures(pictures)
     {
         AddTerminatingTranslator<PictureNode>(&PlacedThings::OnPicture);
         AddTerminatingTranslator<RunningTextNode>(&PlacedThings::OnRunningText);
@@ -48,8 +46,16 @@ public:
     std::vector<String> m_Styles;
 
 private:
-    void OnPicture(PictureNode & node) { m_Files.push_back(node.GetPath()); }
+    void OnPicture(PictureNode & node)
+    {
+        // One that carries the password for a picture of the text has that one's id: the document holds the file itself.
+        if (!m_Pictures.FindEntry(node.GetGUID())) {
+            m_Files.push_back(node.GetPath());
+        }
+    }
     void OnRunningText(RunningTextNode & node) { m_Styles.push_back(node.GetStyle()); }
+
+    DocumentPictures const & m_Pictures;
 };
 
 class FontGatherer
@@ -75,6 +81,11 @@ public:
     void AddFlow(TextFlow const & flow)
     {
         Kernel::Counted<Story::Layout const> const layout = flow.GetLayout();
+        for (auto const & problem : layout ? layout->GetProblems() : std::span<Story::LayoutItem::Problem const>()) {
+            if (problem.m_Kind == Story::LayoutItem::Problem::Kind::MissingFamily) {
+                m_Info.AddFont({layout->GetString(problem.m_Text), String(), 0, false, true});
+            }
+        }
         if (layout && flow.EnsureGlyphData()) {
             for (Story::LayoutFont const & font : layout->GetFonts()) {
                 if (font.m_Face) {
@@ -107,66 +118,6 @@ private:
     PackageManagerInfo & m_Info;
 };
 
-/// A file's bytes; none if it can't be read.
-Kernel::Counted<Kernel::RawData const> ReadFile(String const & path)
-{
-    auto const stream = Kernel::FileInStream::Open(path.c_str(), false);
-    if (!stream) {
-        return nullptr;
-    }
-    try {
-        return stream->ReadAll();
-    } catch (Kernel::Exception const &) {
-        return nullptr;
-    }
-}
-
-/// Puts the bytes in the folder, under the name or, where that is another file's, under a numbered one; gives the file's
-/// name, or none, with the reason in `problem`.
-String PutInFolder(String const & folder, String const & name, std::span<std::uint8_t const> bytes, String & problem)
-{
-    if (!Kernel::FileSystem::CreateFolders(folder)) {
-        problem = Kernel::Format(Kernel::LocalisedString("The folder \"%1\" can't be made: %2.", "Package"), folder,
-                                 Kernel::GetSystemErrorText(errno));
-        return {};
-    }
-    String const stem = Kernel::Path::GetFileNameWithoutExtension(name);
-    String const extension = Kernel::Path::GetExtension(name);
-    String const suffix = extension.Empty() ? String() : "." + extension;
-    for (int number = 1;; ++number) {
-        String const candidate = (number == 1 ? stem : Kernel::Format("%1-%2", stem, number)) + suffix;
-        String const path = Kernel::PathTraitsDos::Append(folder, candidate);
-        if (Kernel::FileSystem::Exists(path)) {
-            Kernel::Counted<Kernel::RawData const> const present = ReadFile(path);
-            if (present && std::ranges::equal(present->GetSpan(), bytes)) {
-                return candidate;
-            }
-            continue;
-        }
-        Kernel::File::OpenUnmanagedResult made{};
-        auto const stream =
-            Kernel::FileOutStream::Create(path.c_str(), Kernel::File::ShareMode::Shared, made, &problem);
-        if (!stream) {
-            return {};
-        }
-        try {
-            stream->Write(bytes.data(), bytes.size());
-            if (stream->Close()) {
-                return candidate;
-            }
-            problem = Kernel::Format(Kernel::LocalisedString("\"%1\" can't be written.", "Package"), path);
-        } catch (Kernel::Exception const & exception) {
-            problem = exception.GetMessage();
-        }
-        return {};
-    }
-}
-
-String NameIn(char const * folder, String const & file)
-{
-    return Kernel::Format("./%1/%2", folder, file);
-}
-
 /// The file's name in its folder, with one for what has none.
 String NameOf(String const & path, String const & otherwise)
 {
@@ -184,7 +135,7 @@ void PackageResourcesCommand::GetDocumentInfo(Kernel::Counted<DocumentController
     for (auto const & [id, entry] : document->GetPictures().GetEntries()) {
         info.AddPicture({entry.m_SourcePath, id, entry.m_Size, static_cast<bool>(document->GetPictures().GetBytes(id))});
     }
-    PlacedThings placed;
+    PlacedThings placed(document->GetPictures());
     placed.Visit(document->GetDocument());
     for (String const & path : placed.m_Files) {
         std::uint64_t size = 0;
@@ -232,35 +183,70 @@ void PackageResourcesCommand::Do()
 
 void PackageResourcesCommand::CollectPicture(PackageManagerInfo::Picture const & picture)
 {
-    String const folder = Kernel::PathTraitsDos::Append(m_Folder, PictureFolder);
+    DocumentPictures const & pictures = GetDocument()->GetPictures();
+    Raster::PictureProblem unread;
+    Raster::Picture::Bytes const bytes =
+        picture.m_Id.Empty() ? Raster::ReadPictureFile(picture.m_Path, unread) : pictures.GetBytes(picture.m_Id);
+    if (!bytes) {
+        TellUnreadPicture(picture.m_Path);
+        return;
+    }
+    std::vector<PackageFolder::File> const files = GatherDrawing({NameOf(picture.m_Path, "picture"), bytes}, picture.m_Path);
     String problem;
-    String name;
+    String const name = files.size() == 1 ? m_Pictures.Put(files.front().m_Name, *bytes, problem)
+                                          : m_Pictures.PutTogether(files, problem);
+    if (name.Empty()) {
+        m_Problems.push_back(problem);
+        return;
+    }
+    String const link = Kernel::Format("./%1/%2", PictureFolder, name);
+    if (!picture.m_Path.Empty()) {
+        m_Links.m_PlacedFiles[picture.m_Path] = link;
+    }
     if (!picture.m_Id.Empty()) {
-        DocumentPictures const & pictures = GetDocument()->GetPictures();
-        if (Raster::Picture::Bytes const bytes = pictures.GetBytes(picture.m_Id)) {
-            name = PutInFolder(folder, NameOf(picture.m_Path, "picture"), {bytes->data(), bytes->size()}, problem);
+        m_Links.m_Pictures[picture.m_Id] = link;
+        // As old as the file that it was taken from, so that it does not pass for a changed one.
+        Kernel::FileSystem::SetModifiedTime(
+            Kernel::PathTraitsDos::Append(Kernel::PathTraitsDos::Append(m_Folder, PictureFolder), name),
+            pictures.GetEntries().at(picture.m_Id).m_SourceTime);
+    }
+}
+
+std::vector<PackageFolder::File> PackageResourcesCommand::GatherDrawing(PackageFolder::File const & first,
+                                                                        String const & path)
+{
+    using Renderer::RenderTree::PlacedDrawing;
+    String const folder = Kernel::Path::GetFolderWithSeparator(path);
+    std::string const within = Kernel::FileSystem::GetCanonicalPath(folder).ToStd() + "/";
+    std::vector<PackageFolder::File> files{first};
+    std::set<String> names{first.m_Name, Kernel::Path::GetFileName(path)};
+    for (std::size_t i = 0; i < files.size(); ++i) {
+        if (PlacedDrawing::KindOf(*files[i].m_Bytes) != PlacedDrawing::Kind::Svg) {
+            continue;
         }
-        if (!name.Empty()) {
-            auto const entries = pictures.GetEntries();
-            m_Links.m_Pictures[picture.m_Id] = NameIn(PictureFolder, name);
-            // As old as the file that it was taken from, so that it does not pass for a changed one.
-            Kernel::FileSystem::SetModifiedTime(Kernel::PathTraitsDos::Append(folder, name),
-                                                entries.at(picture.m_Id).m_SourceTime);
-            return;
-        }
-    } else if (Kernel::Counted<Kernel::RawData const> const bytes = ReadFile(picture.m_Path)) {
-        name = PutInFolder(folder, NameOf(picture.m_Path, "picture"), bytes->GetSpan(), problem);
-        if (!name.Empty()) {
-            m_Links.m_PlacedFiles[picture.m_Path] = NameIn(PictureFolder, name);
-            return;
+        String const below = Kernel::Path::GetFolderWithSeparator(files[i].m_Name);
+        for (String const & link : Renderer::RenderTree::FindSvgLinks(*files[i].m_Bytes)) {
+            String const name = below + link;
+            String const file = folder + name;
+            if (!names.insert(name).second || !Kernel::FileSystem::Exists(file) || Kernel::FileSystem::IsFolder(file) ||
+                !Kernel::FileSystem::GetCanonicalPath(file).View().starts_with(within)) {
+                continue;
+            }
+            Raster::PictureProblem unread;
+            if (Raster::Picture::Bytes const bytes = Raster::ReadPictureFile(file, unread)) {
+                files.push_back({name, bytes});
+            } else {
+                TellUnreadPicture(file);
+            }
         }
     }
-    m_Problems.push_back(
-        problem.Empty()
-            ? Kernel::Format(Kernel::LocalisedString("The picture \"%1\" can't be read, so it was not collected.",
-                                                     "Package"),
-                             picture.m_Path)
-            : problem);
+    return files;
+}
+
+void PackageResourcesCommand::TellUnreadPicture(String const & path)
+{
+    m_Problems.push_back(Kernel::Format(
+        Kernel::LocalisedString("The picture \"%1\" can't be read, so it was not collected.", "Package"), path));
 }
 
 void PackageResourcesCommand::CollectFont(PackageManagerInfo::Font const & font)
@@ -279,16 +265,11 @@ void PackageResourcesCommand::CollectFont(PackageManagerInfo::Font const & font)
             font.m_Family));
         return;
     }
-    String problem;
-    Kernel::Counted<Kernel::RawData const> const bytes = ReadFile(font.m_Path);
-    if (!bytes) {
-        problem = Kernel::Format(
-            Kernel::LocalisedString("The font file \"%1\" can't be read, so it was not collected.", "Package"),
-            font.m_Path);
-    } else if (!PutInFolder(Kernel::PathTraitsDos::Append(m_Folder, FontFolder), NameOf(font.m_Path, "font"),
-                            bytes->GetSpan(), problem)
-                    .Empty()) {
-        return;
+    Raster::PictureProblem unread;
+    Raster::Picture::Bytes const bytes = Raster::ReadPictureFile(font.m_Path, unread);
+    String problem = Kernel::Format(
+        Kernel::LocalisedString("The font file \"%1\" can't be read, so it was not collected.", "Package"), font.m_Path);
+    if (!bytes || m_Fonts.Put(NameOf(font.m_Path, "font"), *bytes, problem).Empty()) {
+        m_Problems.push_back(problem);
     }
-    m_Problems.push_back(problem);
 }

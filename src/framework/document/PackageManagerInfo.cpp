@@ -26,5 +26,7 @@ void PackageManagerInfo::AddFont(Font font)
         m_Fonts.push_back(std::move(font));
     } else {
         known->m_IsUsed |= font.m_IsUsed;
+        // A file may hold several faces: it goes only as a whole.
+        known->m_MayCollect &= font.m_MayCollect;
     }
 }

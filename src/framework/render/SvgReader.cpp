@@ -1,11 +1,14 @@
 #include "framework/render/SvgReader.h"
 
+#include "framework/kernel/Uri.h"
 #include "framework/render/CairoBitmap.h"
 
 #include <algorithm>
+#include <array>
 #include <cairo-pdf.h>
 #include <librsvg/rsvg.h>
 #include <memory>
+#include <string_view>
 
 namespace Renderer::RenderTree
 {
@@ -69,6 +72,27 @@ cairo_status_t Append(void * target, unsigned char const * data, unsigned int si
     static_cast<std::vector<unsigned char> *>(target)->insert(static_cast<std::vector<unsigned char> *>(target)->end(),
                                                               data, data + size);
     return CAIRO_STATUS_SUCCESS;
+}
+
+/// The way to a file that an address names; empty if it names something else, or a file that is out of reach.
+String FileOfAddress(std::string_view address)
+{
+    static constexpr std::array<std::pair<std::string_view, char>, 5> Entities{
+        {{"&amp;", '&'}, {"&lt;", '<'}, {"&gt;", '>'}, {"&quot;", '"'}, {"&apos;", '\''}}};
+    std::string plain;
+    for (address = address.substr(0, address.find('#')); !address.empty();) {
+        auto const entity = std::find_if(Entities.begin(), Entities.end(),
+                                         [address](auto const & entry) { return address.starts_with(entry.first); });
+        plain += Entities.end() == entity ? address.front() : entity->second;
+        address.remove_prefix(Entities.end() == entity ? 1 : entity->first.size());
+    }
+    if (Kernel::HasUriProtocol(String(plain)) || plain.starts_with("data:")) {
+        return {};
+    }
+    std::unique_ptr<char, decltype(&g_free)> const name(g_uri_unescape_string(plain.c_str(), nullptr), &g_free);
+    std::string_view const way(name ? name.get() : "");
+    bool const isBeside = !way.starts_with('/') && !way.starts_with("../") && way.find("/../") == std::string_view::npos;
+    return isBeside ? String(way) : String();
 }
 
 }
@@ -142,6 +166,45 @@ Kernel::Counted<Raster::DynamicBitmap const> DrawSvg(std::vector<unsigned char> 
         return nullptr;
     }
     return Unpremultiplied(surface.get());
+}
+
+std::vector<String> FindSvgLinks(std::vector<unsigned char> const & bytes)
+{
+    constexpr std::string_view Blanks = " \t\r\n";
+    std::string_view const text(reinterpret_cast<char const *>(bytes.data()), bytes.size());
+    std::vector<String> links;
+    auto const add = [&links](std::string_view address) {
+        String link = FileOfAddress(address);
+        if (!link.Empty() && std::find(links.begin(), links.end(), link) == links.end()) {
+            links.push_back(std::move(link));
+        }
+    };
+    auto const skipBlanks = [&](std::size_t at) { return std::min(text.find_first_not_of(Blanks, at), text.size()); };
+    // `href="address"`, with any prefix, of pictures, other drawings and style sheets.
+    constexpr std::string_view Name = "href";
+    for (std::size_t at = text.find(Name); at != std::string_view::npos; at = text.find(Name, at)) {
+        at = skipBlanks(at + Name.size());
+        if (at == text.size() || text[at] != '=') {
+            continue;
+        }
+        at = skipBlanks(at + 1);
+        std::size_t const end =
+            at < text.size() && ('"' == text[at] || '\'' == text[at]) ? text.find(text[at], at + 1) : text.npos;
+        if (end != text.npos) {
+            add(text.substr(at + 1, end - at - 1));
+            at = end;
+        }
+    }
+    // `url(address)` in styles.
+    constexpr std::string_view Function = "url(";
+    for (std::size_t at = text.find(Function); at != std::string_view::npos; at = text.find(Function, at)) {
+        at += Function.size();
+        std::string_view address = text.substr(at, text.find(')', at) - at);
+        constexpr std::string_view Around = " \t\r\n\"'";
+        address.remove_prefix(std::min(address.find_first_not_of(Around), address.size()));
+        add(address.substr(0, address.find_last_not_of(Around) + 1));
+    }
+    return links;
 }
 
 }

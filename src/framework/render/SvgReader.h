@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "framework/kernel/Geometry.h"
+#include "framework/kernel/StringT.h"
 #include "framework/raster/Picture.h"
 
 namespace Renderer::RenderTree
@@ -26,5 +27,9 @@ namespace Renderer::RenderTree
 [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap const> DrawSvg(std::vector<unsigned char> const & bytes,
                                                                    String const & path, int width, int height,
                                                                    Raster::PictureProblem & problem);
+
+/// The files that an SVG may show beside what it holds itself: their ways from its own folder, each once. Only what may be
+/// read, which is in that folder or below; whether there is such a file is not asked.
+[[nodiscard]] std::vector<String> FindSvgLinks(std::vector<unsigned char> const & bytes);
 
 }
