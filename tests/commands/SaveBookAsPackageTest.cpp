@@ -320,9 +320,10 @@ TEST_F(SaveBookAsPackageTest, EveryStepOfTheDiskMayFailWithoutHarmToTheBook)
     using Kernel::DiskOperation;
     for (DiskOperation const operation : {DiskOperation::Open, DiskOperation::Read, DiskOperation::Write,
                                           DiskOperation::Flush, DiskOperation::Rename, DiskOperation::CreateFolder}) {
-        int seen = 1;
         int harmed = 0;
-        for (int nth = 1; nth <= seen; ++nth) {
+        bool hasFailed = true;
+        // Reads are many, and alike.
+        for (int nth = 1; hasFailed; nth += operation == DiskOperation::Read ? 4 : 1) {
             std::filesystem::remove_all((m_Target / "package").ToStd());
             ASSERT_TRUE(FileSystem::CreateFolders(m_Target / "package"));
             book->SetPath("/where/it/was.kvbook");
@@ -332,10 +333,10 @@ TEST_F(SaveBookAsPackageTest, EveryStepOfTheDiskMayFailWithoutHarmToTheBook)
                 Kernel::DiskFaultFromNth const fault(operation, nth, EIO);
                 command = Package(book, "kvdoc");
                 BookBuilder::Rest();
-                seen = fault.Seen();
+                hasFailed = nth <= fault.Seen();
             }
-            std::string const where = "operation " + std::to_string(static_cast<int>(operation)) + ", the " +
-                                      std::to_string(nth) + ". time of " + std::to_string(seen);
+            std::string const where =
+                "operation " + std::to_string(static_cast<int>(operation)) + ", the " + std::to_string(nth) + ". time";
             bool const isWritten = command->GetResult().IsSuccess();
             EXPECT_EQ(book->IsDirty(), !isWritten) << where;
             EXPECT_EQ(book->GetPath(), isWritten ? m_Target / "package/whole.kvbook" : "/where/it/was.kvbook") << where;

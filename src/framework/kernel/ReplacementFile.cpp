@@ -83,6 +83,10 @@ OpenResult CheckTarget(String const & target, File::ShareMode share, FileLock * 
 {
     struct stat facts;
     if (::stat(target.c_str(), &facts) != 0) {
+        if (errno == ELOOP) {
+            // Nothing is missing that could be made first.
+            return OpenResult::Unknown;
+        }
         return errno == ENOENT ? OpenResult::Success : File::ResultFromErrno(errno);
     }
     if (S_ISDIR(facts.st_mode)) {
