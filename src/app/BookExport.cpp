@@ -3,10 +3,15 @@
 #include "app/BookSettings.h"
 #include "app/Interruption.h"
 #include "framework/document/VantraController.h"
+#include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Progress.h"
 #include "import/Text.h"
 #include "output/ExportBookCommand.h"
 #include "output/ExportBookCompleteNotification.h"
+
+#include <algorithm>
+#include <map>
+#include <set>
 
 namespace App
 {
@@ -34,11 +39,14 @@ Kernel::Consolidated<Renderer::FileExportOptions> MakeOptions(Book::BookControll
     return settings.MakeExportOptions();
 }
 
-/// One sentence for results that have no text of their own; empty for those that have.
-std::string DescribeQuietResult(ExportResult result)
+/// What to say of a result that has no text of its own.
+std::string DescribeQuietResult(ExportResult result, std::string const & cause)
 {
     if (Interruption::IsRaised()) {
         return Text("Interrupted; the PDF was not written.", "Program");
+    }
+    if (!cause.empty()) {
+        return Text("The PDF was not written: %1", "Program", WithRemedy(cause));
     }
     if (ExportResultAborted == result) {
         return Text(
@@ -64,31 +72,69 @@ bool ExportBook(BookSession & session, Listener & listener, std::filesystem::pat
 
     auto const complete = listener.GetExport();
     if (!complete) {
-        messages.Error("export-failed", {target.string()}, DescribeQuietResult(ExportResultAborted));
+        messages.Error("export-failed", {target.string()}, DescribeQuietResult(ExportResultAborted, {}));
         return false;
     }
-    bool isGood = true;
-    for (auto const & record : complete->GetRecs()) {
-        for (Renderer::RenderTree::Warning const & warning : record.m_Warnings) {
-            messages.Warn("output", {warning.m_Path.ToStd()}, warning.m_Text.ToStd());
-        }
-        isGood = isGood && IsSuccess(record.m_Result);
-    }
-    if (isGood) {
+    auto const & records = complete->GetRecs();
+    if (std::all_of(records.begin(), records.end(), [](auto const & record) { return IsSuccess(record.m_Result); })) {
+        TellWarnings(command->GetWarnings(), messages);
         return true;
     }
+    std::string const cause = command->GetError().ToStd();
     String text;
     String title;
     if (complete->GetErrorStrings(text, title)) {
-        std::string sentence = title.ToStd() + ": " + text.ToStd();
+        std::string sentence = title.ToStd() + ": " + (cause.empty() ? text.ToStd() : cause);
         for (std::size_t at = sentence.find('\n'); std::string::npos != at; at = sentence.find('\n')) {
             sentence.replace(at, 1, at + 1 < sentence.size() ? " " : "");
         }
         messages.Error("export-failed", {}, sentence);
     } else {
-        messages.Error("export-failed", {target.string()}, DescribeQuietResult(complete->GetRecs().front().m_Result));
+        messages.Error("export-failed", {target.string()}, DescribeQuietResult(records.front().m_Result, cause));
     }
     return false;
+}
+
+std::string WithRemedy(std::string const & cause)
+{
+    std::string const folder = Kernel::FileSystem::GetTemporaryFolder().ToStd();
+    // The folder itself, or a file that lies there only for a while: the target may lie in it too.
+    bool const isTemporary = cause.find(folder + ":") != std::string::npos ||
+                             cause.find(folder + ".") != std::string::npos ||
+                             cause.find(folder + "/korvane-") != std::string::npos;
+    return !isTemporary ? cause
+                        : cause + " " +
+                              Text("Make room in %1, or set TMPDIR to another folder for temporary files.", "Program",
+                                   folder);
+}
+
+void TellWarnings(std::vector<Renderer::RenderTree::Warning> const & warnings, Import::MessageList & messages)
+{
+    struct Told
+    {
+        Renderer::RenderTree::Warning const * m_Warning;
+        std::set<int> m_Pages;
+    };
+    std::vector<Told> all;
+    std::map<std::pair<String, String>, std::size_t> places;
+    for (Renderer::RenderTree::Warning const & warning : warnings) {
+        auto const [place, isNew] = places.try_emplace({warning.m_Path, warning.m_Text}, all.size());
+        if (isNew) {
+            all.push_back({&warning, {}});
+        }
+        if (0 < warning.m_Page) {
+            all[place->second].m_Pages.insert(warning.m_Page);
+        }
+    }
+    for (Told const & told : all) {
+        std::string text = told.m_Warning->m_Text.ToStd();
+        if (!told.m_Pages.empty()) {
+            text += " " + Import::CountText("This is on page %2, counted from the first.",
+                                            "This is on %1 pages, the first of them page %2, counted from the first.",
+                                            "Program", told.m_Pages.size(), *told.m_Pages.begin());
+        }
+        messages.Warn("output", {told.m_Warning->m_Path.ToStd()}, text);
+    }
 }
 
 }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "app/BookSession.h"
+#include "framework/render/Warning.h"
 
 #include <filesystem>
 #include <optional>
@@ -25,5 +26,11 @@ struct PdfWishes
 /// interrupted; the target is then as it was before.
 bool ExportBook(BookSession & session, Listener & listener, std::filesystem::path const & target,
                 PdfWishes const & wishes, Import::MessageList & messages);
+
+/// The cause of a failure, with what to do about it where it lies in the folder for temporary files.
+[[nodiscard]] std::string WithRemedy(std::string const & cause);
+
+/// Tells each thing that came out other than asked once, with the first page that it is on and the number of pages.
+void TellWarnings(std::vector<Renderer::RenderTree::Warning> const & warnings, Import::MessageList & messages);
 
 }

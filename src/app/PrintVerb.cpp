@@ -1,3 +1,4 @@
+#include "app/BookExport.h"
 #include "app/BookFileLock.h"
 #include "app/BookSettings.h"
 #include "app/Interruption.h"
@@ -67,16 +68,14 @@ bool RunCommand(BookSession & session, Kernel::Counted<Book::PrintCommand> const
         messages.Error("chapter-unreadable", {chapter->GetPath().ToStd()},
                        Text("This chapter could not be opened, so its pages are blank.", "Program"));
     }
-    for (Renderer::RenderTree::Warning const & warning : command->GetWarnings()) {
-        messages.Warn("output", {warning.m_Path.ToStd()}, warning.m_Text.ToStd());
-    }
+    TellWarnings(command->GetWarnings(), messages);
     if (IsSuccess(command->GetResult())) {
         return true;
     }
     if (!Interruption::IsRaised()) {
         std::string const reason = command->GetError().ToStd();
         messages.Error("print-failed", {target.string()},
-                       reason.empty() ? Text("The file could not be made.", "Program") : reason);
+                       reason.empty() ? Text("The file could not be made.", "Program") : WithRemedy(reason));
     }
     return false;
 }

@@ -13,6 +13,7 @@
 #include "framework/kernel/FileInStream.h"
 #include "framework/kernel/FileOutStream.h"
 #include "framework/kernel/FileSystem.h"
+#include "framework/kernel/Format.h"
 #include "framework/kernel/SequenceProgressReporter.h"
 #include "framework/kernel/TempFile.h"
 #include "framework/raster/DynamicBitmap.h"
@@ -200,6 +201,8 @@ ExportResult ExportBookCommand::ExportPDF(Kernel::Counted<Kernel::SequenceProgre
     String temporaryPath;
     Kernel::Counted<Kernel::FileOutStream> stream = Kernel::TempFile::GenerateTempOutFile(temporaryPath, "", false);
     if (!stream) {
+        m_Error = Kernel::Format(Kernel::LocalisedString("No temporary file can be made in the folder %1.", "File"),
+                                 Kernel::FileSystem::GetTemporaryFolder());
         return ExportResultFailed;
     }
     TemporaryFileSession const temporary(temporaryPath);
@@ -210,6 +213,7 @@ ExportResult ExportBookCommand::ExportPDF(Kernel::Counted<Kernel::SequenceProgre
     Kernel::Counted<DocumentMetadata const> const metadata = known ? known : Kernel::MakeCounted<DocumentMetadata const>();
     if (!pdf.Create(m_Filename.c_str(), stream, metadata->GetSubject(), metadata->GetTitle(), metadata->GetAuthor(),
                     metadata->GetTags())) {
+        m_Error = pdf.GetError();
         return ExportResultFileNotCreated;
     }
     walk.WriteTo(pdf);
@@ -219,10 +223,14 @@ ExportResult ExportBookCommand::ExportPDF(Kernel::Counted<Kernel::SequenceProgre
     bool const written = pdf.Close();
     bool const closed = stream->Close();
     stream->SetErrorHandler(nullptr);
+    if (stream->GetError()) {
+        m_Error = stream->GetError()->what();
+    }
     if (IsAborted()) {
         return ExportResultAborted;
     }
     if (!written || !closed) {
+        m_Error = pdf.GetError();
         return ExportResultFailed;
     }
     stream.Reset();
@@ -239,7 +247,7 @@ ExportResult ExportBookCommand::DeliverToTarget(String const & temporaryPath)
     try {
         Kernel::File::OpenUnmanagedResult openResult{};
         Kernel::Counted<Kernel::FileOutStream> const target = Kernel::FileOutStream::Create(
-            m_Filename.c_str(), Kernel::File::ShareMode::RespectLocks, openResult, nullptr);
+            m_Filename.c_str(), Kernel::File::ShareMode::RespectLocks, openResult, &m_Error);
         if (!target) {
             return ResultOf(openResult);
         }
@@ -248,10 +256,13 @@ ExportResult ExportBookCommand::DeliverToTarget(String const & temporaryPath)
             return ExportResultWriteFailed;
         }
     } catch (Kernel::File::OpenUnmanagedException const & exception) {
+        m_Error = exception.what();
         return ResultOf(exception.GetResult());
     } catch (Kernel::FileIOException const & exception) {
+        m_Error = exception.what();
         return ExportItemCommandBase::ReasonToError(exception.GetReason());
-    } catch (std::exception const &) {
+    } catch (std::exception const & exception) {
+        m_Error = exception.what();
         return ExportResultFailed;
     }
     return ExportResultOk;

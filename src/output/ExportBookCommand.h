@@ -93,6 +93,12 @@ public:
 
     [[nodiscard]] std::vector<ExportPageEntry> const & GetExportMap() const { return m_ExportMap; }
 
+    // What the notification does not say, for who waited for the command's end.
+    /// Why it failed, in one sentence with the file that it is about; empty where nothing more is known than the result.
+    [[nodiscard]] String const & GetError() const { return m_Error; }
+    /// What came out other than asked, page by page in the order of output.
+    [[nodiscard]] std::vector<Renderer::RenderTree::Warning> const & GetWarnings() const { return m_Warnings; }
+
     // Look-ups on the complete plan.
     /// Index in the exported chapters, -1 if it isn't one of them.
     [[nodiscard]] int IndexFromChapter(Kernel::Counted<BookChapter const> chapter) const;
@@ -155,6 +161,7 @@ private:
     std::vector<Kernel::Counted<Renderer::PdfBookmark const>> m_Bookmarks;
     std::vector<String> m_OutputPaths;
     std::vector<ExportResult> m_Results;
+    String m_Error;
     Kernel::Counted<Raster::DynamicBitmap> m_PreviewBitmap;
     Kernel::Consolidated<Raster::ICCProfile> m_PreviewProfile;
     bool m_PadStrays = false;

@@ -1,5 +1,6 @@
 #include "output/PrintBookCommand.h"
 
+#include "framework/commands/ExportItemCommandBase.h"
 #include "framework/document/DocumentMetadata.h"
 #include "framework/render/Schema.h"
 
@@ -87,9 +88,11 @@ ExportResult PrintBookCommand::Finish()
         SetError(m_Pdf->GetError());
         return ExportResultFailed;
     }
-    if (!m_Stream->Close()) {
-        SetError(m_Stream->GetError() ? String(m_Stream->GetError()->what()) : String());
-        return ExportResultWriteFailed;
+    try {
+        m_Stream->Close();
+    } catch (Kernel::FileIOException const & exception) {
+        SetError(exception.what());
+        return ExportItemCommandBase::ReasonToError(exception.GetReason());
     }
     return ExportResultOk;
 }

@@ -137,6 +137,7 @@ bool PrintCommand::DrawPages(std::map<int, PrintedPage> const & pages, Kernel::S
 
 bool PrintCommand::DrawPage(DocumentController & document, PagePainter & painter, int index, PrintedPage const & page)
 {
+    std::size_t const before = m_Warnings.size();
     ExportableInterface::ExportParams params;
     params.m_Rect = page.m_Bounds;
     params.m_BleedRect = page.m_Bounds;
@@ -150,7 +151,11 @@ bool PrintCommand::DrawPage(DocumentController & document, PagePainter & painter
         params.m_Nodes = {spread};
         painter.Paint(params, {true, true, true, false, false, false}, m_List, &m_Warnings);
     }
-    return TakePage(index, page, m_List);
+    bool const taken = TakePage(index, page, m_List);
+    // Pages are told by their running number, as they are chosen, wherever sheets show them.
+    std::for_each(m_Warnings.begin() + static_cast<std::ptrdiff_t>(before), m_Warnings.end(),
+                  [index](auto & warning) { warning.m_Page = index + 1; });
+    return taken;
 }
 
 }

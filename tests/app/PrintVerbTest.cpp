@@ -125,6 +125,36 @@ struct WrongUse
     char const * message;
 };
 
+TEST_F(PrintVerbTest, InterruptingLeavesTheOldFilesOrWholeNewOnes)
+{
+    for (int const patience : {1, 2, 3, 4, 6, 8, 12, 16, 24}) {
+        SCOPED_TRACE(patience);
+        Write("out.pdf", "old");
+        Write("out.png", "old");
+        auto const outcome = [&] {
+            ImpatientUser const user(patience);
+            return Run({"print", m_Book, "-o", "@out.pdf", "--preview", "@out.png", "--layout", "booklet"});
+        }();
+        bool const isOldPdf = Read("out.pdf") == "old";
+        bool const isOldPicture = Read("out.png") == "old";
+        EXPECT_TRUE(isOldPdf || IsWholePdf(m_Folder / "out.pdf"));
+        EXPECT_TRUE(isOldPicture || (Read("out.png").starts_with("\x89PNG") && Read("out.png").ends_with("\xAE\x42\x60\x82")));
+        if (outcome.m_Code != 0) {
+            EXPECT_EQ(outcome.m_Code, 1);
+            EXPECT_NE(outcome.m_Err.find("nterrupted"), std::string::npos) << outcome.m_Err;
+            EXPECT_TRUE(isOldPicture) << "the picture comes last";
+        } else {
+            EXPECT_FALSE(isOldPdf || isOldPicture);
+        }
+        for (auto const & entry : std::filesystem::recursive_directory_iterator(m_Folder)) {
+            EXPECT_NE(entry.path().extension(), ".kvtmp") << entry.path();
+        }
+        EXPECT_FALSE(Exists("book/.korvane/book.kvbook.lock"));
+    }
+    EXPECT_EQ(Run({"print", m_Book, "-o", "@out.pdf"}).m_Code, 0);
+    EXPECT_TRUE(IsWholePdf(m_Folder / "out.pdf"));
+}
+
 TEST_F(PrintVerbTest, WrongWishesGetTheirSentenceAndWriteNothing)
 {
     for (WrongUse const & row : std::vector<WrongUse>{

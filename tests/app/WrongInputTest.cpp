@@ -1,8 +1,10 @@
 #include "ProgramTest.h"
 
 #include "app/BookFileLock.h"
+#include "framework/kernel/DiskFault.h"
 #include "support/OrdinaryUser.h"
 
+#include <cerrno>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -168,6 +170,68 @@ TEST_F(WrongInputTest, AFolderThatMayNotBeWrittenLeavesTheTargetAlone)
     EXPECT_EQ(outcome.m_Code, 1);
     EXPECT_NE(outcome.m_Err.find("out.pdf"), std::string::npos) << outcome.m_Err;
     EXPECT_EQ(Read("shut/out.pdf"), "old");
+}
+
+TEST_F(WrongInputTest, APdfThatCannotBeWrittenIsToldWithItsCauseAndRemedy)
+{
+    WriteBook(1);
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    std::string const book = (m_Folder / "book/.korvane/book.kvbook").string();
+    Write("folder/file", "");
+    Write("out.pdf", "old");
+    struct FailureCase
+    {
+        char const * m_Target;
+        /// Part of the path of files that find no room; null for none.
+        char const * m_Full;
+        std::vector<char const *> m_Said;
+    };
+    for (FailureCase const & row : std::vector<FailureCase>{
+             {"@folder", nullptr, {"is a folder, not a file"}},
+             {"/dev/full", nullptr, {"No space left"}},
+             {"@out.pdf", ".out.pdf-", {"out.pdf", "No space left"}},
+             {"@out.pdf", "/korvane-", {"out.pdf", "No space left", "TMPDIR"}},
+             {"@out.pdf", "", {"out.pdf", "No space left", "TMPDIR"}},
+         }) {
+        for (char const * const verb : {"export", "print"}) {
+            if (row.m_Full && std::string("/korvane-") == row.m_Full && std::string("print") == verb) {
+                continue; // It writes beside its target.
+            }
+            SCOPED_TRACE(std::string(verb) + " " + row.m_Target + " " + (row.m_Full ? row.m_Full : ""));
+            if (row.m_Full) {
+                Kernel::DiskFault::SetHandler([&](Kernel::DiskOperation operation, String const & path) {
+                    std::string const where = row.m_Full;
+                    std::string const own = m_Folder.string();
+                    std::string const place = path.ToStd();
+                    bool const isMeant = where.empty() ? place.empty() : place.rfind(where) != std::string::npos;
+                    // The test's own folder begins like the program's temporary files.
+                    bool const isFolder = where == "/korvane-" && place.starts_with(own);
+                    return Kernel::DiskOperation::Write == operation && isMeant && !isFolder ? ENOSPC : 0;
+                });
+            }
+            auto const outcome = Run({verb, book, "-o", row.m_Target, "--no-update"});
+            Kernel::DiskFault::SetHandler({});
+            EXPECT_EQ(outcome.m_Code, 1);
+            for (char const * const said : row.m_Said) {
+                EXPECT_NE(outcome.m_Err.find(said), std::string::npos) << outcome.m_Err;
+            }
+            EXPECT_EQ(outcome.m_Err.find("error:"), outcome.m_Err.rfind("error:")) << "told once: " << outcome.m_Err;
+            EXPECT_EQ(Read("out.pdf"), "old");
+        }
+    }
+}
+
+TEST_F(WrongInputTest, WhatNoFontHasIsToldWithItsPageWhereverItIsWritten)
+{
+    Write("book/one.md", "# One\n\nPlain.\n\n# Two\n\nA \xF4\x8F\xBF\xBD that no font has.\n");
+    std::string const book = (m_Folder / "book/.korvane/book.kvbook").string();
+    for (auto const & arguments : std::vector<std::vector<std::string>>{
+             {"build", "@book"}, {"export", book, "-o", "@out.pdf"}, {"print", book, "-o", "@out.pdf", "--layout", "booklet"}}) {
+        auto const outcome = Run(arguments);
+        EXPECT_EQ(outcome.m_Code, 0) << outcome.m_Err;
+        std::size_t const at = outcome.m_Err.find("a character that no installed font contains. This is on page ");
+        EXPECT_NE(at, std::string::npos) << arguments[0] << ": " << outcome.m_Err;
+    }
 }
 
 TEST_F(WrongInputTest, ASecondProgramIsToldWhoHasTheBook)

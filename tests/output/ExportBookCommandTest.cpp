@@ -2,6 +2,7 @@
 
 #include "core/BookCollection.h"
 #include "framework/document/DocumentController.h"
+#include "framework/kernel/DiskFault.h"
 #include "framework/kernel/FileSystem.h"
 #include "framework/render/FileExportOptions.h"
 #include "output/ExportBookCompleteNotification.h"
@@ -11,6 +12,8 @@
 
 #include <gtest/gtest.h>
 
+#include <atomic>
+#include <cerrno>
 #include <cstdio>
 
 namespace Book
@@ -116,6 +119,113 @@ TEST_F(ExportBookCommandTest, AnAbortLeavesTheTargetAlone)
     BookBuilder::Run(book, command);
     EXPECT_TRUE(recorder.All<ExportBookCompleteNotification>().empty()) << "it stopped before the writer";
     EXPECT_EQ(m_Builder.GetFolder().ReadFile("book.pdf"), "the one before");
+}
+
+/// Files of the folder, and the temporary files that were made, are told apart by a part of their path; "" stands for data
+/// that have no file of a name.
+struct FaultRow
+{
+    char const * why;
+    Kernel::DiskOperation operation;
+    char const * where;
+    int error;
+    ExportResult result;
+    char const * cause;
+};
+
+TEST_F(ExportBookCommandTest, AFailingDiskIsNamedAndLeavesTheTargetAlone)
+{
+    using Operation = Kernel::DiskOperation;
+    auto const book = TwoChapters();
+    String const target = m_Builder.GetFolder().WriteFile("book.pdf", "the one before");
+    for (FaultRow const & row : {
+             FaultRow{"no temporary file", Operation::Open, "/korvane-", EACCES, ExportResultFailed, "No temporary file"},
+             FaultRow{"no place for the pages", Operation::Open, "*temporary", ENOSPC, ExportResultFileNotCreated, "No space"},
+             FaultRow{"pages that find no room", Operation::Write, "", ENOSPC, ExportResultFailed, "Temporary data can't be written"},
+             FaultRow{"a temporary file that finds none: a silent stop", Operation::Write, "/korvane-", ENOSPC,
+                      ExportResultAborted, "No space left"},
+             FaultRow{"or is too long", Operation::Write, "/korvane-", EFBIG, ExportResultAborted, "File too large"},
+             FaultRow{"cannot be read back", Operation::Read, "/korvane-", EIO, ExportResultWriteFailed, "Cannot read"},
+             FaultRow{"a folder that may not be written", Operation::Open, "/.book.pdf-", EACCES, ExportResultPermissionDenied,
+                      "You have no permission"},
+             FaultRow{"denied by the system", Operation::Open, "/.book.pdf-", EPERM, ExportResultAccessDenied, "denied by the system"},
+             FaultRow{"a disk to read only", Operation::Open, "/.book.pdf-", EROFS, ExportResultPermissionDenied, "cannot be written to"},
+             FaultRow{"a full disk", Operation::Open, "/.book.pdf-", ENOSPC, ExportResultOutOfSpace, "is full"},
+             FaultRow{"a quota", Operation::Open, "/.book.pdf-", EDQUOT, ExportResultOutOfSpace, "quota"},
+             FaultRow{"a name too long", Operation::Open, "/.book.pdf-", ENAMETOOLONG, ExportResultFileNotCreated, "too long"},
+             FaultRow{"full half-way", Operation::Write, "/.book.pdf-", ENOSPC, ExportResultOutOfSpace, "No space left"},
+             FaultRow{"a broken disk", Operation::Write, "/.book.pdf-", EIO, ExportResultWriteFailed, "Cannot write to"},
+             FaultRow{"that shows at the end", Operation::Flush, "/.book.pdf-", EIO, ExportResultWriteFailed, "Cannot write to"},
+             FaultRow{"a target that may not be replaced", Operation::Rename, "/book.pdf", EACCES, ExportResultPermissionDenied,
+                      "Permission denied"},
+         }) {
+        SCOPED_TRACE(row.why);
+        BookBuilder::Rest();
+        auto const command = Command(book, target, false);
+        std::vector<String> temporary;
+        NotificationRecorder recorder;
+        Kernel::DiskFault::SetHandler([&](Kernel::DiskOperation operation, String const & path) {
+            bool const isTemporary = path.View().find("/korvane-") != std::string_view::npos &&
+                                     !path.View().starts_with(m_Builder.GetFolder().GetPath().View());
+            if (operation == Operation::Open && isTemporary) {
+                temporary.push_back(path);
+            }
+            std::string_view const where(row.where);
+            bool const isMeant = where == "*temporary" ? path == Kernel::FileSystem::GetTemporaryFolder()
+                                 : where.empty()       ? path.Empty()
+                                 : where == "/korvane-" ? isTemporary
+                                                        : path.View().find(where) != std::string_view::npos;
+            return operation == row.operation && isMeant ? row.error : 0;
+        });
+        BookBuilder::Run(book, command);
+        BookBuilder::Rest();
+        Kernel::DiskFault::SetHandler({});
+
+        auto const told = recorder.All<ExportBookCompleteNotification>();
+        ASSERT_EQ(told.size(), 1u);
+        EXPECT_EQ(told[0]->GetRecs()[0].m_Result, row.result);
+        EXPECT_NE(command->GetError().View().find(row.cause), std::string_view::npos) << command->GetError();
+        EXPECT_EQ(m_Builder.GetFolder().ReadFile("book.pdf"), "the one before");
+        EXPECT_EQ(RunCommand("ls -A '" + m_Builder.GetFolder().GetPath().ToStd() + "' | grep kvtmp"), "");
+        for (String const & path : temporary) {
+            EXPECT_FALSE(Kernel::FileSystem::Exists(path)) << path;
+        }
+    }
+    EXPECT_EQ(Export(book, target)[0].m_Result, ExportResultOk);
+    EXPECT_EQ(PdfProbe(target).Check(), "");
+}
+
+TEST_F(ExportBookCommandTest, StoppedAnywhereItLeavesTheOldFileOrAWholeNewOne)
+{
+    auto const book = TwoChapters();
+    int whole = 0;
+    for (int patience = 1; whole < 2; ++patience) {
+        SCOPED_TRACE(patience);
+        String const target = m_Builder.GetFolder().WriteFile("book.pdf", "the one before");
+        BookBuilder::Rest();
+        auto const command = Command(book, target, false);
+        std::atomic<int> seen = 0;
+        NotificationRecorder recorder;
+        Kernel::DiskFault::SetHandler([&](Kernel::DiskOperation, String const &) {
+            if (++seen == patience) {
+                command->Abort();
+            }
+            return 0;
+        });
+        BookBuilder::Run(book, command);
+        BookBuilder::Rest();
+        Kernel::DiskFault::SetHandler({});
+        auto const told = recorder.All<ExportBookCompleteNotification>();
+        if (told.empty() || !IsSuccess(told[0]->GetRecs()[0].m_Result)) {
+            EXPECT_TRUE(told.empty() || told[0]->GetRecs()[0].m_Result == ExportResultAborted);
+            EXPECT_EQ(m_Builder.GetFolder().ReadFile("book.pdf"), "the one before");
+            EXPECT_EQ(command->GetError(), "") << "nothing has failed";
+        } else {
+            EXPECT_EQ(PdfProbe(target).PageCount(), 5);
+            ++whole;
+        }
+        ASSERT_LT(patience, 500);
+    }
 }
 
 TEST(ExportBookCompleteNotificationTest, TextsStandInTheOrderOfTheFilesWithABlankLineBetween)

@@ -1,3 +1,4 @@
+#include "framework/kernel/DiskFault.h"
 #include "framework/raster/PngEncoder.h"
 #include "output/PaginatorBooklet.h"
 #include "output/PaginatorNUp.h"
@@ -12,6 +13,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cerrno>
 #include <cstdlib>
 #include <fstream>
 
@@ -245,6 +247,26 @@ TEST_F(PrintCommandTest, AnUnfinishedPrintLeavesTheTargetAlone)
               ExportResultFileNotCreated);
     EXPECT_EQ(Run<PrintProofCommand>(std::vector<PaginatorPage>(), PrintSettings{}, m_Builder.GetFolder() / "out.png"),
               ExportResultFailed);
+
+    for (Kernel::DiskOperation const operation :
+         {Kernel::DiskOperation::Write, Kernel::DiskOperation::Flush, Kernel::DiskOperation::Rename}) {
+        for (int nth = 1;; ++nth) {
+            SCOPED_TRACE(testing::Message() << static_cast<int>(operation) << ", number " << nth);
+            BookBuilder::Rest();
+            Kernel::DiskFaultFromNth const fault(operation, nth, ENOSPC);
+            if (Run<PrintBookCommand>(sheets, PrintSettings{}, target, Options()) == ExportResultOk) {
+                // The last flush is the folder's, when the file is in its place.
+                EXPECT_EQ(PdfProbe(target).PageCount(), 4);
+                m_Builder.GetFolder().WriteFile("out.pdf", "the one before");
+                if (fault.Seen() < nth) {
+                    break;
+                }
+                continue;
+            }
+            EXPECT_NE(m_Error.View().find("No space left"), std::string_view::npos) << m_Error;
+            EXPECT_EQ(m_Builder.GetFolder().ReadFile("out.pdf"), "the one before");
+        }
+    }
 
     std::remove(m_Chapters[1]->GetPath().c_str());
     EXPECT_EQ(Run<PrintBookCommand>(sheets, PrintSettings{}, target, Options()), ExportResultOk) << m_Error;

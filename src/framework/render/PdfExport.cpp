@@ -2,6 +2,7 @@
 
 #include "framework/kernel/Assert.h"
 #include "framework/kernel/Clock.h"
+#include "framework/kernel/Format.h"
 #include "framework/kernel/OutStream.h"
 #include "framework/render/PdfContent.h"
 #include "framework/render/PdfDrawings.h"
@@ -136,9 +137,8 @@ public:
     }
 
     void AddLink(PdfHyperlink const & link, Raster::AffineTransform::Params const & toPage);
-    void Warn(std::vector<Warning> * warnings, Warning::Code code, String const & path, String const & text);
     /// Tells of fonts and characters of the content that was written last.
-    void WarnOfContent(std::vector<Warning> * warnings);
+    void WarnOfContent(std::vector<Warning> * warnings, int page);
     /// Packs a content stream on the thread beside; `range` says where it has gone to, and stays where it is.
     void Pack(std::string text, SpillRange & range);
 
@@ -183,24 +183,22 @@ void PdfExport::State::AddLink(PdfHyperlink const & link, Raster::AffineTransfor
     m_File.m_Links.push_back(record);
 }
 
-void PdfExport::State::WarnOfContent(std::vector<Warning> * warnings)
+void PdfExport::State::WarnOfContent(std::vector<Warning> * warnings, int page)
 {
+    if (!warnings) {
+        return;
+    }
     for (Typeset::FontFace const * face : m_Content.GetForbiddenFonts()) {
-        Warn(warnings, Warning::Code::FontNotEmbeddable, face->GetPath(),
-                   Kernel::ConcatString({"The licence of the font ", face->GetPostScriptName().View(),
-                                         " forbids embedding it; its text is drawn as outlines."}));
+        warnings->push_back({Warning::Code::FontNotEmbeddable, page, face->GetPath(),
+                             Kernel::Format(Kernel::LocalisedString("The licence of the font %1 forbids embedding it; "
+                                                                    "its text is drawn as outlines.",
+                                                                    "Output"),
+                                            face->GetPostScriptName())});
     }
     if (m_Content.HadMissingGlyph()) {
-        Warn(warnings, Warning::Code::GlyphMissing, String(),
-                   "The page has a character that no installed font contains.");
-    }
-}
-
-void PdfExport::State::Warn(std::vector<Warning> * warnings, Warning::Code code, String const & path,
-                            String const & text)
-{
-    if (warnings) {
-        warnings->push_back({code, static_cast<int>(m_File.m_Pages.size()) + 1, path, text});
+        warnings->push_back(
+            {Warning::Code::GlyphMissing, page, String(),
+             Kernel::LocalisedString("The page has a character that no installed font contains.", "Output")});
     }
 }
 
@@ -266,7 +264,7 @@ int PdfExport::AddForm(DisplayList const & content, Kernel::Rect const & bounds,
         state.m_Drawings.BeginPage(state.m_FormPages, warnings);
         PdfUses uses;
         std::string text = state.m_Content.Write({}, {&content}, PdfContent::ToForm, uses);
-        state.WarnOfContent(warnings);
+        state.WarnOfContent(warnings, state.m_FormPages);
         PdfForm form;
         form.m_Bounds = Mapped(bounds, PdfContent::ToForm);
         form.m_IsGroup = false;
@@ -306,7 +304,7 @@ bool PdfExport::WritePage(PdfPage const & page, DisplayList const & content, std
         }
         PdfUses uses;
         std::string text = state.m_Content.Write(page.m_Forms, {&marks, &content}, toPage, uses);
-        state.WarnOfContent(warnings);
+        state.WarnOfContent(warnings, GetPageCount() + 1);
 
         PdfPageRecord record;
         record.m_Uses = state.m_File.m_Resources.AddUses(uses);
@@ -357,7 +355,9 @@ bool PdfExport::Close()
             WritePdfFile(state.m_File, state.m_Objects, state.m_Drawings, state.m_Compressor, *state.m_Schema, pipeline);
             pipeline.Check();
         } catch (std::exception const & exception) {
-            state.Fail(exception.what());
+            // Data that could not be kept are the cause of what libqpdf then misses.
+            std::string const error = state.m_Spill.GetError();
+            state.Fail(error.empty() ? exception.what() : error);
         }
         if (std::string const error = state.m_Spill.GetError(); !error.empty()) {
             state.Fail(error);

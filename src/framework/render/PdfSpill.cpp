@@ -2,10 +2,10 @@
 
 #include "framework/kernel/DiskFault.h"
 #include "framework/kernel/FileSystem.h"
+#include "framework/kernel/Format.h"
 
 #include <cerrno>
 #include <cstdlib>
-#include <cstring>
 #include <fcntl.h>
 #include <unistd.h>
 
@@ -17,10 +17,10 @@ namespace
 
 constexpr std::size_t BufferSize = std::size_t(1) << 18;
 
-std::string Sentence(char const * what, int errorNumber)
+std::string Sentence(Kernel::LocalisedString const & text, int errorNumber)
 {
-    return std::string(what) + " in " + Kernel::FileSystem::GetTemporaryFolder().ToStd() + ": " +
-           std::strerror(errorNumber) + ".";
+    return Kernel::Format(text, Kernel::FileSystem::GetTemporaryFolder(), Kernel::GetSystemErrorText(errorNumber))
+        .ToStd();
 }
 
 }
@@ -47,7 +47,7 @@ bool PdfSpill::Open(std::string & error)
         }
     }
     if (m_File < 0) {
-        error = Sentence("A temporary file can't be made", errno);
+        error = Sentence(Kernel::LocalisedString("A temporary file can't be made in %1: %2.", "File"), errno);
         return false;
     }
     m_Buffer.reserve(BufferSize);
@@ -65,7 +65,8 @@ bool PdfSpill::Flush()
         if (count > 0) {
             done += static_cast<std::size_t>(count);
         } else if (count == 0 || errno != EINTR) {
-            m_Error = Sentence("Temporary data can't be written", count == 0 ? ENOSPC : errno);
+            m_Error = Sentence(Kernel::LocalisedString("Temporary data can't be written in %1: %2.", "File"),
+                               count == 0 ? ENOSPC : errno);
         }
     }
     m_Written += m_Buffer.size();
@@ -102,7 +103,8 @@ bool PdfSpill::Read(SpillRange const & range, std::uint64_t offset, void * targe
         ssize_t const count = pread(m_File, static_cast<char *>(target) + done, size - done,
                                     static_cast<off_t>(range.m_Offset + offset + done));
         if (count == 0 || (count < 0 && errno != EINTR)) {
-            m_Error = Sentence("Temporary data can't be read back", count == 0 ? EIO : errno);
+            m_Error = Sentence(Kernel::LocalisedString("Temporary data can't be read back in %1: %2.", "File"),
+                               count == 0 ? EIO : errno);
             return false;
         }
         done += count > 0 ? static_cast<std::size_t>(count) : 0;
