@@ -7,6 +7,8 @@
 #include "import/SaveFailure.h"
 #include "import/Text.h"
 
+#include <algorithm>
+
 namespace App
 {
 
@@ -31,17 +33,29 @@ struct PackageOptions
     bool m_LeavesFonts = false;
 };
 
+/// Two names of one file, however they are written.
+bool IsSameFile(fs::path const & one, fs::path const & other)
+{
+    std::error_code error;
+    return one == other || fs::equivalent(one, other, error);
+}
+
 void SaveAs(BookEdit & edit, SaveAsOptions const & options)
 {
-    std::filesystem::path const target = CheckTarget(
+    fs::path const target = CheckTarget(
         options.m_Target, options.m_IsForced ? Existing::Replace : Existing::RefuseUnlessForced, edit.m_Messages);
     if (target.empty()) {
         return;
     }
     BookFileLock lock;
     std::string problem;
-    if (target == edit.m_File) {
+    auto const chapters = edit.m_Session.GetChapters();
+    auto const isTarget = [&target](auto const & chapter) { return IsSameFile(target, chapter->GetPath().ToStd()); };
+    if (IsSameFile(target, edit.m_File)) {
         edit.Error("target-same", Text("This is the book itself; choose another name.", "Program"));
+    } else if (std::any_of(chapters.begin(), chapters.end(), isTarget)) {
+        edit.m_Messages.Error("target-document", {target.string()},
+                              Text("This is one of the book's documents; choose another name.", "Program"));
     } else if (!lock.Take(target, problem)) {
         edit.m_Messages.Error("book-locked", {target.string()}, problem);
     } else if (edit.m_Session.SaveAnyway(target.string(), edit.m_Messages)) {

@@ -135,6 +135,7 @@ TEST_F(BookVerbsTest, WhatCannotBeDoneLeavesEverythingAsItWasAndNamesTheRemedy)
              {{"set", "@book.kvbook", "--marks-offset", "-1"}, 2, {"0-72"}},
              {{"set", "@book.kvbook", "--language", "d e"}, 2, {"TAG"}},
              {{"save-as", "@book.kvbook", "@book.kvbook", "--force"}, 1, {"the book itself"}},
+             {{"save-as", "@book.kvbook", "@docs/b.kvdoc", "--force"}, 1, {"one of the book's documents"}},
              {{"save-as", "@book.kvbook", "@text.kvdoc"}, 1, {"--force"}},
              {{"save-as", "@book.kvbook", "@nowhere/x"}, 1, {"nowhere does not exist"}},
          }) {
