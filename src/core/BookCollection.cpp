@@ -40,18 +40,17 @@ void BookCollection::AddBookController(Kernel::Counted<BookController> book)
     // In both lists at once: who finds it among the open books may put it in front.
     Kernel::ScopedLock const recentLock(m_RecentBooksLock);
     m_Books.Set(Snapshot(std::move(books)));
-    m_RecentBooks.push_back(std::move(book));
+    m_RecentBooks.Append(std::move(book));
 }
 
 void BookCollection::RemoveBookController(Kernel::Counted<BookController const> book)
 {
-    const auto isBook = [&](const Kernel::Counted<BookController> & entry) { return entry == book; };
     Kernel::ScopedLock const lock(m_BooksLock);
     Kernel::ScopedLock const recentLock(m_RecentBooksLock);
     BookList books = *m_Books.Get();
-    std::erase_if(books, isBook);
+    std::erase_if(books, [&](const auto & entry) { return entry == book; });
     m_Books.Set(Snapshot(std::move(books)));
-    std::erase_if(m_RecentBooks, isBook);
+    m_RecentBooks.Remove(book);
     if (m_UIActiveBook.Get() == book) {
         m_UIActiveBook.Set(nullptr);
     }
@@ -85,7 +84,7 @@ void BookCollection::SetUIActiveBookController(Kernel::Counted<BookController co
 {
     // Against a removal at the same moment: it would clear what is put in front here, or leave the book that goes.
     Kernel::ScopedLock const lock(m_RecentBooksLock);
-    if (!book || std::find(m_RecentBooks.begin(), m_RecentBooks.end(), book) != m_RecentBooks.end()) {
+    if (!book || m_RecentBooks.Holds(book)) {
         m_UIActiveBook.Set(std::move(book));
     }
 }
@@ -118,9 +117,7 @@ Kernel::Counted<BookController const> BookCollection::GetBookFromChapterPath(Str
         return inFront;
     }
     Kernel::ScopedLock const lock(m_RecentBooksLock);
-    const auto found = std::find_if(m_RecentBooks.rbegin(), m_RecentBooks.rend(),
-                                    [&](const auto & book) { return book->ContainsChapter(path); });
-    return found == m_RecentBooks.rend() ? nullptr : *found;
+    return m_RecentBooks.FindLatest([&](const auto & book) { return book->ContainsChapter(path); });
 }
 
 bool BookCollection::IsInBook(String const & path) const
@@ -143,14 +140,7 @@ void BookCollection::DisableCommandEnqueueAndEmpty(Kernel::Counted<BookControlle
 void BookCollection::MarkRecent(const Kernel::Counted<BookController const> & book)
 {
     Kernel::ScopedLock const lock(m_RecentBooksLock);
-    if (!m_RecentBooks.empty() && m_RecentBooks.back() == book) {
-        return;
-    }
-    const auto found =
-        std::find_if(m_RecentBooks.begin(), m_RecentBooks.end(), [&](const auto & entry) { return entry == book; });
-    if (found != m_RecentBooks.end()) {
-        std::rotate(found, found + 1, m_RecentBooks.end());
-    }
+    m_RecentBooks.MarkUsed(book);
 }
 
 void BookCollection::UpdateChapters(Kernel::Counted<BookController const> book)

@@ -2,6 +2,7 @@
 
 #include "core/BookController.h"
 #include "core/Published.h"
+#include "core/RecentBooks.h"
 #include "framework/document/BookSink.h"
 #include "framework/kernel/BroadcastNotification.h"
 
@@ -159,7 +160,7 @@ private:
 
     Published<Snapshot<BookList>> m_Books;
     /// The same books, the one that last received a command at the back. Under its lock only.
-    BookList m_RecentBooks;
+    RecentBooks m_RecentBooks;
     /// Always one of these, or null. Changed under their lock, read without it.
     Published<Kernel::Counted<BookController const>> m_UIActiveBook;
     Kernel::CriticalSection m_BooksLock;
