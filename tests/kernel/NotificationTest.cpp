@@ -52,8 +52,12 @@ TEST(NotificationTest, AllSinksGetTheSameOrderFromManyPostingThreads)
 
 TEST(NotificationTest, ASinkThatIsStuckDelaysNobodyElseAndNobodyDeliversOnThePostersThread)
 {
+    Semaphore reached(0);
     Semaphore open(0);
-    RecordingSink stuck([&](TestNotification const &) { open.Wait(0); });
+    RecordingSink stuck([&](TestNotification const &) {
+        reached.Signal();
+        open.Wait(0);
+    });
     Semaphore delivered(0);
     std::thread::id const poster = std::this_thread::get_id();
     RecordingSink quick([&](TestNotification const &) {
@@ -64,6 +68,7 @@ TEST(NotificationTest, ASinkThatIsStuckDelaysNobodyElseAndNobodyDeliversOnThePos
         Post("n");
         delivered.Wait(0);
     }
+    reached.Wait(0);
     EXPECT_EQ(stuck.Names().size(), 1U);
     for (int number = 0; number < 3; ++number) {
         open.Signal();

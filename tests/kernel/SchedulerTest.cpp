@@ -10,8 +10,13 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <atomic>
+#include <chrono>
+#include <future>
+#include <latch>
 #include <optional>
+#include <thread>
 
 namespace
 {
@@ -21,6 +26,25 @@ using Kernel::Counted;
 using Kernel::MakeCounted;
 using Kernel::Semaphore;
 using testing::ElementsAre;
+
+TEST(SchedulerTest, TurnsThatTakeLongDrawInFewThreads)
+{
+    constexpr int Turns = 400;
+    std::size_t const before = Kernel::Scheduler::GetNumberOfThreads();
+    std::latch ended(Turns);
+    for (int number = 0; number < Turns; ++number) {
+        Kernel::Scheduler::Run([&] {
+            // Busy, not asleep: no further thread would be of help.
+            auto const until = std::chrono::steady_clock::now() + std::chrono::milliseconds(1);
+            while (std::chrono::steady_clock::now() < until) {
+            }
+            ended.count_down();
+        });
+    }
+    ended.wait();
+    std::size_t const processors = std::thread::hardware_concurrency();
+    EXPECT_LE(Kernel::Scheduler::GetNumberOfThreads(), std::max(before, processors) + 16);
+}
 
 TEST(SchedulerTest, ThePoolGrowsWhileAllItsThreadsAreBlocked)
 {
@@ -48,6 +72,25 @@ TEST(SchedulerTest, ThePoolGrowsWhileAllItsThreadsAreBlocked)
     for (int number = 0; number < Blocked; ++number) {
         ended.Wait(0);
     }
+}
+
+TEST(SchedulerTest, ThePoolGrowsAlsoWhereItCannotSeeThatItsThreadsAreBlocked)
+{
+    constexpr int Blocked = 8;
+    std::promise<void> release;
+    std::shared_future<void> const released = release.get_future().share();
+    std::latch reached(Blocked);
+    std::latch ended(Blocked);
+    for (int number = 0; number < Blocked; ++number) {
+        Kernel::Scheduler::Run([&] {
+            reached.count_down();
+            released.wait();
+            ended.count_down();
+        });
+    }
+    reached.wait();
+    release.set_value();
+    ended.wait();
 }
 
 TEST(SchedulerTest, AnIdleQueueIsWorkedByWhoWaitsForIt)

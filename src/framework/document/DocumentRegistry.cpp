@@ -2,6 +2,7 @@
 
 #include "framework/document/DocumentController.h"
 #include "framework/kernel/Assert.h"
+#include "framework/kernel/Scheduler.h"
 
 #include <algorithm>
 #include <utility>
@@ -88,6 +89,7 @@ bool DocumentRegistry::ClaimForLoading(String const & path, Document & controlle
         }
         // Closing is over when the record has gone; the last turn's arrival is worth another look.
         bool const disabled = closing && closing->IsCommandEnqueueDisabled();
+        Kernel::Scheduler::Wait const wait;
         m_Changed.wait(lock, [&] {
             return Find(key) != record || record->m_State == State::Open ||
                    (closing && !disabled && closing->IsCommandEnqueueDisabled());

@@ -21,15 +21,19 @@ namespace
 {
 
 constexpr int TurnBudget = 64;
-constexpr auto PatienceForAThread = std::chrono::milliseconds(1);
 /// A turn that was left to a thread which then took its time goes to another one after this.
-constexpr auto PatienceForASleeper = std::chrono::microseconds(200);
+constexpr auto PatienceForAThread = std::chrono::microseconds(200);
+/// When for so long nobody took a turn although one is ready, the threads may all be blocked in ways that the pool
+/// cannot see, and one more is called.
+constexpr auto PatienceWithAllThreads = std::chrono::milliseconds(1);
 /// Turns that follow each other more closely than this are a burst of short ones.
-constexpr auto GapInABurst = std::chrono::microseconds(20);
+constexpr auto GapInABurst = std::chrono::microseconds(50);
 /// How long a thread that has run out of turns looks out for the next one before it sleeps. To wake it costs more than
 /// most turns do, and turns come in bursts.
 constexpr auto LookOutTime = std::chrono::microseconds(20);
 constexpr auto IdleTimeOfAThread = std::chrono::seconds(2);
+
+thread_local bool IsThreadOfPool = false;
 
 class FunctionTurn final : public Schedulable
 {
@@ -59,24 +63,38 @@ public:
         auto const now = std::chrono::steady_clock::now();
         m_Ready.push_back({std::move(schedulable), now});
         m_ReadyCount.store(m_Ready.size(), std::memory_order_relaxed);
-        if (m_LookingOut >= m_Ready.size()) {
+        std::size_t const lookingOut = m_LooksOut ? 1 : 0;
+        if (lookingOut >= m_Ready.size()) {
             return;
         }
         // In a burst, whoever has just begun a turn is back sooner than another thread would be awake; and more threads
         // than the machine has processors only get in each other's way, unless they are blocked.
-        std::size_t const busy = m_Threads - m_Sleeping - m_LookingOut;
-        bool const isLeft = busy >= m_FirstThreads || (busy > 0 && now - m_LastTaken < GapInABurst);
-        if (!isLeft && m_Sleeping + m_LookingOut >= m_Ready.size()) {
-            lock.unlock();
-            m_TurnReady.notify_one();
-        } else if (!isLeft && m_Threads < m_FirstThreads) {
-            AddThread();
+        std::size_t const busy = CountAwake() - lookingOut;
+        bool const isLeft = busy > 0 && now - m_LastTaken < GapInABurst;
+        if (CountAwake() < m_FirstThreads && !isLeft) {
+            CallThread();
         } else if (!m_WatchesReady) {
             EnsureWatcher();
             ++m_Changes;
             lock.unlock();
             m_Watch.notify_one();
         }
+    }
+
+    /// A thread of the pool is about to sleep for another one.
+    void BeginWait()
+    {
+        std::lock_guard const lock(m_Lock);
+        ++m_Blocked;
+        if (!m_Ready.empty() && CountAwake() < m_FirstThreads) {
+            CallThread();
+        }
+    }
+
+    void EndWait()
+    {
+        std::lock_guard const lock(m_Lock);
+        --m_Blocked;
     }
 
     void GiveTurnAt(std::chrono::nanoseconds due, Counted<Schedulable> schedulable)
@@ -130,11 +148,19 @@ private:
         std::chrono::steady_clock::time_point m_Since;
     };
 
-    /// With the lock held.
-    void AddThread()
+    /// Threads that have a turn, are on their way to one, or look out for one. With the lock held.
+    [[nodiscard]] std::size_t CountAwake() const { return m_Threads - m_Blocked - (m_Sleeping - m_Called); }
+
+    /// One that sleeps, or a new one. With the lock held.
+    void CallThread()
     {
-        ++m_Threads;
-        std::thread([this] { Work(); }).detach();
+        if (m_Called < m_Sleeping) {
+            ++m_Called;
+            m_TurnReady.notify_one();
+        } else {
+            ++m_Threads;
+            std::thread([this] { Work(); }).detach();
+        }
     }
 
     /// With the lock held.
@@ -147,19 +173,22 @@ private:
 
     void Work()
     {
+        IsThreadOfPool = true;
         std::unique_lock lock(m_Lock);
         for (;;) {
-            if (m_Ready.empty() && m_LookingOut < m_FirstThreads) {
+            if (m_Ready.empty() && !m_LooksOut) {
                 LookOut(lock);
             }
             if (m_Ready.empty()) {
                 ++m_Sleeping;
-                bool const woken = m_TurnReady.wait_for(lock, IdleTimeOfAThread, [this] { return !m_Ready.empty(); });
+                bool const called = m_TurnReady.wait_for(lock, IdleTimeOfAThread, [this] { return 0 < m_Called; });
                 --m_Sleeping;
-                if (!woken) {
+                m_Called -= called ? 1 : 0;
+                if (!called && m_Ready.empty()) {
                     --m_Threads;
                     return;
                 }
+                continue;
             }
             Counted<Schedulable> schedulable = std::move(m_Ready.front().m_Schedulable);
             m_Ready.pop_front();
@@ -172,19 +201,43 @@ private:
         }
     }
 
-    /// With the lock held, which it gives up meanwhile.
+    /// Until a turn is ready or the time is over. With the lock held, which it gives up meanwhile.
     void LookOut(std::unique_lock<std::mutex> & lock)
     {
-        ++m_LookingOut;
-        lock.unlock();
+        m_LooksOut = true;
         auto const until = std::chrono::steady_clock::now() + LookOutTime;
-        while (m_ReadyCount.load(std::memory_order_relaxed) == 0 && std::chrono::steady_clock::now() < until) {
+        for (bool isOver = false; m_Ready.empty() && !isOver;) {
+            lock.unlock();
+            do {
+                isOver = std::chrono::steady_clock::now() >= until;
+            } while (m_ReadyCount.load(std::memory_order_relaxed) == 0 && !isOver);
+            lock.lock();
         }
-        lock.lock();
-        --m_LookingOut;
+        m_LooksOut = false;
     }
 
-    /// Wakes or adds threads for turns that found none, and gives turns whose time has come.
+    /// Calls one thread more if the turn at the front waits for too long. With the lock held.
+    void HelpReady(std::chrono::steady_clock::time_point now)
+    {
+        std::size_t const awake = CountAwake();
+        auto const waiting = now - m_Ready.front().m_Since;
+        if (awake < m_FirstThreads) {
+            if (waiting >= PatienceForAThread) {
+                CallThread();
+            }
+            return;
+        }
+        // The more there are already, the likelier it is that they are only slow, or the machine is: turns that take
+        // long must not draw in thread after thread. Yet it never ends, since all may be blocked.
+        auto const more = static_cast<std::int64_t>(awake - m_FirstThreads + 1);
+        auto const patience = more * more * PatienceWithAllThreads;
+        if (waiting >= patience && now - std::max(m_LastTaken, m_LastHelp) >= patience) {
+            m_LastHelp = now;
+            CallThread();
+        }
+    }
+
+    /// Calls threads for turns that found none, and gives turns whose time has come.
     void Watch()
     {
         std::unique_lock lock(m_Lock);
@@ -193,15 +246,8 @@ private:
             auto wake = std::chrono::steady_clock::time_point::max();
             if (!m_Ready.empty()) {
                 auto const now = std::chrono::steady_clock::now();
-                // One thread a round: if the others are blocked, more rounds follow; if the machine is busy, one helps
-                // more than many.
-                auto const waiting = now - m_Ready.front().m_Since;
-                if (m_Sleeping > 0 && waiting >= PatienceForASleeper) {
-                    m_TurnReady.notify_one();
-                } else if (m_Sleeping == 0 && waiting >= PatienceForAThread) {
-                    AddThread();
-                }
-                wake = std::max(m_Ready.front().m_Since, now) + PatienceForASleeper;
+                HelpReady(now);
+                wake = now + PatienceForAThread;
             }
             if (!m_Timers.empty()) {
                 std::chrono::nanoseconds const now = Clock::Get().Steady();
@@ -234,10 +280,15 @@ private:
     std::deque<Turn> m_Ready;
     std::multimap<std::chrono::nanoseconds, Counted<Schedulable>> m_Timers;
     std::chrono::steady_clock::time_point m_LastTaken;
+    std::chrono::steady_clock::time_point m_LastHelp;
     std::size_t m_Threads = 0;
     std::size_t m_Sleeping = 0;
-    /// Threads that are awake without a turn, and will see one that comes.
-    std::size_t m_LookingOut = 0;
+    /// How many of those that sleep were called, and have not come yet.
+    std::size_t m_Called = 0;
+    /// Threads whose turn waits for another thread.
+    std::size_t m_Blocked = 0;
+    /// A thread is awake without a turn, and will see one that comes. One at a time does so.
+    bool m_LooksOut = false;
     /// How many turns are ready, for who looks without the lock.
     std::atomic<std::size_t> m_ReadyCount{0};
     bool m_HasWatcher = false;
@@ -245,7 +296,7 @@ private:
     bool m_WatchesReady = false;
     /// What the watcher has to look at again.
     std::uint64_t m_Changes = 0;
-    /// Up to here threads are added without waiting.
+    /// So many work at once, not counting those that are blocked.
     std::size_t const m_FirstThreads = std::max(2U, std::thread::hardware_concurrency());
 };
 
@@ -257,6 +308,20 @@ void Scheduler::GiveTurn(Counted<Schedulable> schedulable)
 void Scheduler::Run(std::function<void()> function)
 {
     GiveTurn(MakeCounted<FunctionTurn>(std::move(function)));
+}
+
+Scheduler::Wait::Wait() : m_IsOfPool(IsThreadOfPool)
+{
+    if (m_IsOfPool) {
+        Pool::Get().BeginWait();
+    }
+}
+
+Scheduler::Wait::~Wait()
+{
+    if (m_IsOfPool) {
+        Pool::Get().EndWait();
+    }
 }
 
 void Scheduler::GiveTurnAt(std::chrono::nanoseconds due, Counted<Schedulable> schedulable)

@@ -12,9 +12,11 @@ namespace Kernel
 
 /// The pool of threads that all queues and delivery lines of the process share.
 ///
-/// Turns begin in the order in which they were asked for. The pool grows when a turn is ready and finds no thread within
-/// a millisecond, without an upper limit: threads block on one another's turns, so that a limit would be a deadlock.
-/// Threads that find nothing to do for a while end. Safe on any thread.
+/// Turns begin in the order in which they were asked for. As many threads work as the machine has processors, not
+/// counting those that are blocked; one that blocks is replaced at once where the pool knows of it (`Wait`). When all
+/// have been at their turns for long while others are ready, more threads come, at growing intervals, but without an
+/// upper limit: threads may block on one another's turns, so that a limit would be a deadlock. Threads that find nothing
+/// to do for a while end. Safe on any thread.
 class Scheduler
 {
 public:
@@ -23,6 +25,20 @@ public:
 
     /// Runs a function once on a thread of the pool.
     static void Run(std::function<void()> function);
+
+    /// Around a sleep that another thread ends: while it lives, the pool runs another thread in the place of the calling
+    /// one. Not nested. On a thread that is not the pool's it does nothing.
+    class Wait
+    {
+    public:
+        Wait();
+        ~Wait();
+        Wait(Wait const &) = delete;
+        Wait & operator=(Wait const &) = delete;
+
+    private:
+        bool const m_IsOfPool;
+    };
 
     /// Gives the object one turn when the steady time of `Clock` has come to `due`. With a clock that stands still
     /// until it is moved, `PollTimers` tells the scheduler that it was. At once while somebody waits for rest

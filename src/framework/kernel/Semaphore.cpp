@@ -1,6 +1,9 @@
 #include "framework/kernel/Semaphore.h"
 
+#include "framework/kernel/Scheduler.h"
+
 #include <chrono>
+#include <optional>
 
 namespace Kernel
 {
@@ -13,6 +16,10 @@ Semaphore::Semaphore(int count) : m_State(std::make_shared<State>())
 bool Semaphore::Wait(int milliseconds)
 {
     std::unique_lock lock(m_State->m_Lock);
+    std::optional<Scheduler::Wait> wait;
+    if (m_State->m_Count <= 0) {
+        wait.emplace();
+    }
     auto const available = [this] { return 0 < m_State->m_Count; };
     if (milliseconds <= 0) {
         m_State->m_Changed.wait(lock, available);

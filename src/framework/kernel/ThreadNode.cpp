@@ -1,6 +1,7 @@
 #include "framework/kernel/ThreadNode.h"
 
 #include "framework/kernel/ReaderWriterLock.h"
+#include "framework/kernel/Scheduler.h"
 
 #include <algorithm>
 #include <chrono>
@@ -44,14 +45,28 @@ std::shared_ptr<ThreadNode> const & ThreadNode::Current()
     return *node;
 }
 
+bool ThreadNode::IsGiven(Signal const & signal)
+{
+    std::lock_guard const lock(m_Lock);
+    return signal.m_Given;
+}
+
 void ThreadNode::Sleep(Signal const & signal)
 {
+    if (IsGiven(signal)) {
+        return;
+    }
+    Scheduler::Wait const wait;
     std::unique_lock lock(m_Lock);
     m_Given.wait(lock, [&signal] { return signal.m_Given; });
 }
 
 bool ThreadNode::SleepFor(Signal const & signal, int milliseconds)
 {
+    if (IsGiven(signal)) {
+        return true;
+    }
+    Scheduler::Wait const wait;
     std::unique_lock lock(m_Lock);
     return m_Given.wait_for(lock, std::chrono::milliseconds(milliseconds), [&signal] { return signal.m_Given; });
 }

@@ -39,6 +39,8 @@ public:
 private:
     friend class WaitGraph;
 
+    [[nodiscard]] bool IsGiven(Signal const & signal);
+
     std::mutex m_Lock;
     std::condition_variable m_Given;
     /// What it waits for; guarded by the wait graph. At most one of them.
