@@ -72,7 +72,9 @@ public:
     ~NewFolder()
     {
         std::error_code error;
-        fs::remove_all(m_Work, error);
+        if (m_IsMade) {
+            fs::remove_all(m_Work, error);
+        }
     }
     NewFolder(NewFolder const &) = delete;
     NewFolder & operator=(NewFolder const &) = delete;
@@ -87,8 +89,14 @@ public:
                            Text("This is there already; name a new folder, or an empty one.", "Program"));
             return false;
         }
-        fs::remove_all(m_Work, error);
-        if (!fs::create_directory(m_Work, error)) {
+        if (fs::exists(fs::symlink_status(m_Work, error))) {
+            messages.Error("target-exists", {m_Work.string()},
+                           Text("This is in the way. If it is what an earlier run has left that was broken off, remove it.",
+                                "Program"));
+            return false;
+        }
+        m_IsMade = fs::create_directory(m_Work, error);
+        if (!m_IsMade) {
             messages.Error("folder-missing", {m_Target.string()},
                            Text("The folder cannot be made: %1.", "Program", error.message()));
             return false;
@@ -112,6 +120,7 @@ public:
 private:
     fs::path m_Target;
     fs::path m_Work;
+    bool m_IsMade = false;
 };
 
 void MakePackage(BookEdit & edit, PackageOptions const & options)

@@ -242,6 +242,17 @@ TEST_F(BookVerbsTest, APackageIsWholeOrNotThere)
     EXPECT_EQ(full.m_Code, 1);
     auto const missing = Run({"package", "@book.kvbook", "@incomplete", "--no-locate"});
     EXPECT_EQ(missing.m_Code, 1) << "chapters are missing";
+    // Where it would work, somebody else's things lie.
+    fs::create_directories(m_Folder / "theirs.partial");
+    Write("theirs.partial/letter", "dear");
+    for (std::string const target : {"@theirs", "@moved"}) {
+        fs::create_directories(m_Folder / "moved.partial");
+        EXPECT_EQ(Run({"package", "@moved/package/book.kvbook", target}).m_Code, 1);
+        EXPECT_TRUE(Exists("moved.partial"));
+    }
+    EXPECT_EQ(Read("theirs.partial/letter"), "dear");
+    fs::remove_all(m_Folder / "theirs.partial");
+    fs::remove_all(m_Folder / "moved.partial");
     auto const nowhere = Run({"package", "@moved/package/book.kvbook", "@nowhere/package"});
     EXPECT_EQ(nowhere.m_Code, 1);
     EXPECT_NE(nowhere.m_Err.find("cannot be made"), std::string::npos) << nowhere.m_Err;

@@ -203,6 +203,17 @@ TEST_F(DispatchTest, ACloseIsHeardAlsoByABookThatGotTheDocumentMeanwhile)
     CloseInFront(document);
 }
 
+TEST_F(DispatchTest, AnchorsAreLookedAtOnceMoreBeforeADocumentCloses)
+{
+    Counted<DocumentController const> const document = OpenInFront(PathOf(0));
+    Counted<BookChapter> const chapter = m_Book->GetChapterAtIndex(0);
+    chapter->SetAnchorsDirty();
+    Post<CloseDocumentNotification>(document);
+    BookBuilder::Rest();
+    EXPECT_FALSE(chapter->AreAnchorsDirty());
+    CloseInFront(document);
+}
+
 TEST_F(DispatchTest, ThePreviewFollowsTheFirstSpreadOfTheKeyChapter)
 {
     ChapterSketch longer;

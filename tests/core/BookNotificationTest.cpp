@@ -5,9 +5,24 @@
 
 #include <gtest/gtest.h>
 
+#include <type_traits>
+
 using namespace Book;
 using Kernel::Counted;
 using Kernel::MakeCounted;
+
+namespace
+{
+
+/// A front end keeps what it is to answer later.
+template <typename... TNotification>
+constexpr bool AreCopied = (std::is_copy_constructible_v<TNotification> && ...);
+static_assert(AreCopied<NewBookNotification, BookClosedNotification, CurrentBookChangedNotification,
+                        BookChangedNotification, BookStructureChangedNotification, ChapterChangedNotification,
+                        BookChapterInclusionChangedNotification, BookSavedNotification, ChooseChapterFileNotification,
+                        LocateMissingChapterFileNotification, PromptFixBookPermissionsNotification>);
+
+}
 
 TEST(BookNotificationTest, WhatABatchSaysTwiceIsHeardTwice)
 {
@@ -24,7 +39,10 @@ TEST(BookNotificationTest, WhatABatchSaysTwiceIsHeardTwice)
         MakeCounted<ChapterChangedNotification>(read, Counted<BookChapter const>(chapter)),
         MakeCounted<BookChapterInclusionChangedNotification>(read,
                                                              std::vector<Counted<DocumentController const>>()),
-        MakeCounted<BookSavedNotification>(read, DocumentSaveResult(), true)};
+        MakeCounted<BookSavedNotification>(read, DocumentSaveResult(), true),
+        MakeCounted<ChooseChapterFileNotification>(String("Title"), String("/x/a.kvdoc"), read),
+        MakeCounted<LocateMissingChapterFileNotification>(String("/x/a.kvdoc"), book),
+        MakeCounted<PromptFixBookPermissionsNotification>(book, Counted<BookChapter const>(chapter))};
     for (auto const & notification : family) {
         // Receivers count on each: every change of a chapter list may start at another chapter.
         std::vector<Counted<Kernel::Notification>> batch{notification, notification};
