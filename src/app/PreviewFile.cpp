@@ -1,6 +1,5 @@
 #include "app/PreviewFile.h"
 
-#include "framework/document/DocumentControllerSession.h"
 #include "framework/document/SpreadPreview.h"
 #include "framework/kernel/Archive.h"
 #include "framework/kernel/ArchiveThumbnails.h"
@@ -62,19 +61,7 @@ void WriteDocumentPreview(std::string const & file, Kernel::Counted<DocumentCont
                           std::filesystem::path const & target, Import::MessageList & messages)
 {
     Kernel::Counted<Raster::DynamicBitmap const> const bitmap = SpreadPreview::Render(document, 0);
-    Kernel::Rect bounds = Kernel::Rect::Empty();
-    bool transparent = false;
-    {
-        DocumentControllerSession const session(document);
-        if (Kernel::JailCounted<SpreadNode> const spread = document->GetDocument()->GetSpreadAtIndex(0)) {
-            bounds = spread->GetSpreadBounds();
-            transparent = spread->HasTransparentBackground();
-        }
-    }
-    Kernel::Counted<Kernel::RawData> const png =
-        bitmap ? SpreadPreview::Encode(*bitmap, bounds.Width(), bounds.Height(), transparent, document->GetProfile(),
-                                       document->GetProfiles())
-               : nullptr;
+    Kernel::Counted<Kernel::RawData> const png = bitmap ? SpreadPreview::EncodeFirst(*bitmap, document) : nullptr;
     if (!png) {
         messages.Error("preview-missing", {file},
                        Text("The document has no first page that a picture could show.", "Program"));

@@ -96,6 +96,15 @@ void FillIndex(Story::Index & index, std::vector<IndexMark> const & marks)
     }
 }
 
+/// The publication's first document stands for it where somebody looks for a file. The others get a preview only where
+/// they have had one: drawing it takes longer than setting the chapter.
+void KeepPreview(DocumentController & document, bool isFirst)
+{
+    if (isFirst || document.GetDocumentCacheBitmap(0, false)) {
+        document.KeepCacheBitmap();
+    }
+}
+
 bool SaveDocument(DocumentController & document, fs::path const & path, std::string const & shownName,
                   MessageList & messages)
 {
@@ -145,6 +154,8 @@ bool Importer::WriteDocument(Job & job, ChapterText const & chapter) const
                                          chapter.m_FrontMatter.m_Language),
                              story);
     FillIndex(*document->GetDocument()->GetIndex(), chapter.m_IndexMarks);
+    bool const isFirst = !m_Plan.m_HasTitlePage && job.m_Planned == &m_Plan.m_Chapters.front();
+    KeepPreview(*document, isFirst);
     bool const isSaved = SaveDocument(*document, path, planned.m_Name, job.m_Messages);
     job.m_Known.m_DocumentStamp = FileStamp::Of(path);
     return isSaved;
@@ -182,6 +193,7 @@ bool Importer::WriteTitleDocument(std::vector<ImportedChapter> & chapters, Messa
         section.m_Format = PageNumberFormat::None;
         settings.m_Sections = {section};
         document->ReplaceContent(settings, WriteTitlePage(m_Plan.m_Title, m_Plan.m_Subtitle, m_Plan.AuthorsAsText()));
+        KeepPreview(*document, true);
         if (!SaveDocument(*document, path, "title page", messages)) {
             return false;
         }

@@ -84,6 +84,28 @@ TEST_F(BuildVerbTest, AnotherTemplateOrTitleMakesTheBookAnew)
     EXPECT_TRUE(Exists("book/book.pdf"));
 }
 
+TEST_F(BuildVerbTest, ThePreviewOfTheBookFollowsItsFirstPage)
+{
+    auto const preview = [&] {
+        EXPECT_EQ(Run({"build", "@book"}).m_Code, 0);
+        EXPECT_EQ(Run({"show", "@book/.korvane/book.kvbook", "--thumbnail", "@out.png"}).m_Code, 0);
+        return Read("out.png");
+    };
+    WriteBook(2);
+    for (char const * const titlePage : {"true", "false"}) {
+        std::string const manifest = std::string("title-page = ") + titlePage + "\nchapters = [\"1.md\", \"2.md\"]\n";
+        Write("book/book.toml", "title = \"A Title\"\n" + manifest);
+        Write("book/1.md", "# A chapter\n\nText.\n");
+        std::string const before = preview();
+        Write("book/2.md", "# Another chapter\n\nText.\n");
+        EXPECT_EQ(preview(), before) << "a later page";
+        Write("book/book.toml", "title = \"Quite Another One\"\n" + manifest);
+        Write("book/1.md", "# Quite another chapter\n\nText, and more of it.\n");
+        EXPECT_NE(preview(), before) << "title page: " << titlePage;
+        Write("book/2.md", "# Chapter 2\n\nText.\n");
+    }
+}
+
 TEST_F(BuildVerbTest, AFixedTimeGivesTheSameBytes)
 {
     WriteBook(2);

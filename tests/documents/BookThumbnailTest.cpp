@@ -11,6 +11,7 @@
 #include "framework/raster/DynamicBitmap.h"
 #include "framework/raster/Picture.h"
 #include "support/BookBuilder.h"
+#include "support/DocumentBuilder.h"
 
 #include <gtest/gtest.h>
 
@@ -205,4 +206,26 @@ TEST_F(BookThumbnailTest, FollowsTheFirstSpreadOfTheKeyChapterWhileItIsInFront)
         application.EnqueueCommandAndWait(
             Counted<VantraCommand>(MakeCounted<CloseDocumentCommand>(open, nullptr, false, false)));
     }
+}
+
+TEST_F(BookThumbnailTest, FollowsThePreviewInTheKeyChaptersFile)
+{
+    String const path = m_Builder.GetFolder() / "key.kvdoc";
+    auto const write = [&path](int paragraphs) {
+        auto const document = DocumentBuilder().Paragraphs(paragraphs).Build();
+        document->KeepCacheBitmap();
+        SaveTestDocument(*document, path);
+        document->ShutDownArchive();
+    };
+    write(1);
+    auto const book = m_Builder.NewBook({path});
+    auto const before = SavedPicture(book);
+    ASSERT_TRUE(before);
+
+    // Somebody has made the chapter's file anew; no window shows it.
+    write(6);
+    BookBuilder::Run(book, MakeCounted<UpdateChapterCommand>(book->GetChapterAtIndex(0)));
+    auto const after = SavedPicture(book);
+    ASSERT_TRUE(after);
+    EXPECT_NE(after->GetPixels(), before->GetPixels());
 }

@@ -8,6 +8,7 @@
 #include "framework/document/DocumentNotifications.h"
 #include "framework/document/DocumentStore.h"
 #include "framework/document/DOMVisitor.h"
+#include "framework/document/SpreadPreview.h"
 #include "framework/document/VantraController.h"
 #include "framework/kernel/Clock.h"
 #include "framework/kernel/DomainWriterUnlockSession.h"
@@ -108,13 +109,21 @@ void DocumentController::CollectAnchors()
 Kernel::Counted<Raster::DynamicBitmap const> DocumentController::GetDocumentCacheBitmap(int spreadIndex,
                                                                                        bool current) const
 {
-    if (spreadIndex != 0 || !m_KeepsCacheBitmap) {
+    if (spreadIndex != 0) {
         return nullptr;
     }
-    if (current && !m_CacheBitmap->IsCurrent(GetAppearanceCount())) {
-        m_CacheBitmap->Render(*this);
+    if (m_KeepsCacheBitmap) {
+        if (current && !m_CacheBitmap->IsCurrent(GetAppearanceCount())) {
+            m_CacheBitmap->Render(*this);
+        }
+        auto const picture = m_CacheBitmap->Get();
+        if (picture || current) {
+            return picture;
+        }
     }
-    return m_CacheBitmap->Get();
+    // What the file says is asked of nobody who changes the document.
+    auto const png = current ? nullptr : DocumentFile(const_cast<DocumentController &>(*this)).ReadPreview();
+    return png ? SpreadPreview::Decode(*png, GetFormat(), GetProfiles()) : nullptr;
 }
 
 void DocumentController::KeepCacheBitmap()

@@ -177,12 +177,14 @@ public:
     /// Where anchors stand, or which there are, may have changed.
     void SetAnchorsOutOfDate() { m_AnchorsCurrent = false; }
     /// A picture of the spread that is kept ready: documents in front keep one of the first spread, in the document's
-    /// format and on a transparent ground (see `DocumentCacheBitmap`). Null for any other spread and document. With
-    /// `current` a picture that is missing or behind the document is made first, on the calling thread under the reader
-    /// lock; without it the answer is what there is.
+    /// format and on a transparent ground (see `DocumentCacheBitmap`). With `current` a picture that is missing or
+    /// behind the document is made first, on the calling thread under the reader lock; without it the answer is what
+    /// there is, which for a document that keeps none is the preview in its file, however old. Null if there is
+    /// nothing, and for any other spread.
     [[nodiscard]] Kernel::Counted<Raster::DynamicBitmap const> GetDocumentCacheBitmap(int spreadIndex,
                                                                                       bool current) const;
-    /// Begins to keep the picture. For a document that comes in front; again, nothing.
+    /// Begins to keep the picture, with which each save renews the preview in the file. For a document that comes in
+    /// front, and for one that is made to be looked for; again, nothing.
     void KeepCacheBitmap();
     /// Grows with everything that may make the document look different.
     [[nodiscard]] std::uint64_t GetAppearanceCount() const { return m_ChangeCount + m_LayoutCount; }

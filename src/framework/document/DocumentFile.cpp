@@ -4,6 +4,8 @@
 #include "framework/document/DocumentRecords.h"
 #include "framework/document/DocumentSaveFailure.h"
 #include "framework/document/MasterSpreadNode.h"
+#include "framework/document/SpreadPreview.h"
+#include "framework/document/VantraController.h"
 #include "framework/kernel/FileSystem.h"
 #include "framework/kernel/Format.h"
 #include "framework/kernel/InSerialiserFile.h"
@@ -454,6 +456,34 @@ void DocumentFile::WriteItems(Content & content) const
             content.m_LostPictures.push_back(entry.m_SourcePath);
         }
     }
+    content.m_Thumbnails = MakeThumbnails();
+}
+
+Kernel::Counted<Kernel::RawData const> DocumentFile::ReadPreview() const
+{
+    using Thumbnails = Kernel::ArchiveThumbnails;
+    return m_Document.m_Store->ReadItem(Thumbnails::GetItemName(Thumbnails::FileType::Png));
+}
+
+Kernel::Counted<Kernel::ArchiveThumbnails> DocumentFile::MakeThumbnails() const
+{
+    if (!VantraController::GetInstance().ArePreviewsWanted()) {
+        return nullptr;
+    }
+    Kernel::Counted<Kernel::RawData const> png;
+    if (m_Document.m_KeepsCacheBitmap) {
+        if (auto const bitmap = m_Document.GetDocumentCacheBitmap(0, true)) {
+            png = SpreadPreview::EncodeFirst(*bitmap, Kernel::Counted<DocumentController const>(&m_Document));
+        }
+    } else {
+        png = ReadPreview();
+    }
+    if (!png) {
+        return nullptr;
+    }
+    auto thumbnails = Kernel::MakeCounted<Kernel::ArchiveThumbnails>();
+    thumbnails->AddFile(Kernel::ArchiveThumbnails::FileType::Png, png);
+    return thumbnails;
 }
 
 Kernel::Counted<Kernel::Archive> DocumentFile::WriteArchive(Content const & content, String const & path,
@@ -481,6 +511,7 @@ Kernel::Counted<Kernel::Archive> DocumentFile::WriteArchive(Content const & cont
         for (Content::Item const & item : content.m_Items) {
             session->SaveBytes(item.m_Name, item.m_Stored ? asItLies : deflated, item.m_Data);
         }
+        session->SetThumbnails(content.m_Thumbnails);
         archive->CloseSession(session, false);
         return true;
     });

@@ -2,6 +2,7 @@
 
 #include "framework/document/DocumentController.h"
 #include "framework/kernel/Archive.h"
+#include "framework/kernel/ArchiveThumbnails.h"
 #include "framework/kernel/RawData.h"
 
 #include <vector>
@@ -32,13 +33,18 @@ public:
         };
         Kernel::Counted<Kernel::RawData const> m_Document;
         std::vector<Item> m_Items;
+        /// For file managers; null for none.
+        Kernel::Counted<Kernel::ArchiveThumbnails> m_Thumbnails;
         /// The pictures that could not be read any more.
         std::vector<String> m_LostPictures;
     };
 
     /// The document's own item, with the metadata as they are. What is in `links` is named as that says.
     [[nodiscard]] Kernel::Counted<Kernel::RawData const> WriteDocument(DocumentLinks const & links) const;
-    /// The layouts and pictures beside it.
+    /// The preview in the document's file; null if it has none.
+    [[nodiscard]] Kernel::Counted<Kernel::RawData const> ReadPreview() const;
+    /// The layouts and pictures beside it, and the preview: that of a document that keeps one is as the document is now;
+    /// others take along what their file has.
     void WriteItems(Content & content) const;
     /// Writes the content to a file and opens it again for reading, shared or exclusive. Null, with `result` filled, if
     /// it can't; the target is untouched then. Needs no lock.
@@ -48,6 +54,7 @@ public:
                                                                        DocumentSaveResult & result);
 
 private:
+    [[nodiscard]] Kernel::Counted<Kernel::ArchiveThumbnails> MakeThumbnails() const;
     bool Read(Kernel::InSerialiser const & in, unsigned short version);
     void LoadLayout(TextFlow & flow, std::size_t number, std::uint64_t hash, Kernel::Archive & archive);
 

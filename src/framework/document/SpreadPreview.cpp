@@ -3,6 +3,7 @@
 #include "framework/document/DocumentControllerSession.h"
 #include "framework/document/DynamicNodeRenderingEngine.h"
 #include "framework/document/VantraController.h"
+#include "framework/raster/Picture.h"
 #include "framework/raster/PngEncoder.h"
 #include "framework/raster/Resample.h"
 
@@ -93,4 +94,37 @@ Kernel::Counted<Kernel::RawData> SpreadPreview::Encode(Raster::DynamicBitmap con
         return nullptr;
     }
     return data->RelinquishOwnership();
+}
+
+Kernel::Counted<Kernel::RawData>
+SpreadPreview::EncodeFirst(Raster::DynamicBitmap const & bitmap,
+                           Kernel::Counted<DocumentController const> const & document)
+{
+    Kernel::Rect bounds = Kernel::Rect::Empty();
+    bool transparent = false;
+    {
+        DocumentControllerSession const session(document);
+        if (Kernel::JailCounted<SpreadNode> const spread = document->GetDocument()->GetSpreadAtIndex(0)) {
+            bounds = spread->GetSpreadBounds();
+            transparent = spread->HasTransparentBackground();
+        }
+    }
+    return Encode(bitmap, bounds.Width(), bounds.Height(), transparent, document->GetProfile(),
+                  document->GetProfiles());
+}
+
+Kernel::Counted<Raster::DynamicBitmap const> SpreadPreview::Decode(Kernel::RawData const & png, Raster::Format format,
+                                                                   Raster::ICCManager::ICCProfileSet const & profiles)
+{
+    auto const bytes = std::make_shared<std::vector<unsigned char>>(png.GetData(), png.GetData() + png.GetSize());
+    Raster::PictureProblem problem;
+    auto const picture = Raster::Picture::FromBytes(bytes, "preview", problem);
+    // Asked before anything is unpacked: the file may be anybody's.
+    if (!picture || picture->GetInfo().m_Width > PngSide || picture->GetInfo().m_Height > PngSide) {
+        return nullptr;
+    }
+    Kernel::Counted<Raster::DynamicBitmap const> const bitmap = picture->Decode(problem);
+    return bitmap ? Raster::ConvertBitmap(*bitmap, nullptr, format, profiles.ForSpace(Raster::SpaceOfFormat(format)),
+                                          profiles.m_Intent, profiles.m_BlackPointCompensation)
+                  : nullptr;
 }

@@ -28,4 +28,12 @@ public:
     Encode(Raster::DynamicBitmap const & bitmap, double width, double height, bool transparent,
            Kernel::Consolidated<Raster::ICCProfile> const & profile,
            Raster::ICCManager::ICCProfileSet const & profiles);
+    /// The same in the present shape, ground and colours of the document's first spread. Takes the document's reader
+    /// lock.
+    [[nodiscard]] static Kernel::Counted<Kernel::RawData>
+    EncodeFirst(Raster::DynamicBitmap const & bitmap, Kernel::Counted<DocumentController const> const & document);
+
+    /// The picture in such a PNG as a bitmap of this format. Null for bytes that are none, or hold a larger picture.
+    [[nodiscard]] static Kernel::Counted<Raster::DynamicBitmap const>
+    Decode(Kernel::RawData const & png, Raster::Format format, Raster::ICCManager::ICCProfileSet const & profiles);
 };

@@ -5,7 +5,7 @@
 namespace Kernel
 {
 
-void ArchiveThumbnails::AddFile(FileType type, Counted<RawData> data)
+void ArchiveThumbnails::AddFile(FileType type, Counted<RawData const> data)
 {
     std::erase_if(m_Files, [type](auto const & file) { return file.first == type; });
     m_Files.emplace_back(type, std::move(data));

@@ -20,7 +20,7 @@ public:
     };
 
     /// One file of each type; a later one takes the earlier one's place.
-    void AddFile(FileType type, Counted<RawData> data);
+    void AddFile(FileType type, Counted<RawData const> data);
     /// The bytes of a type, or null.
     [[nodiscard]] Counted<RawData const> GetFile(FileType type) const;
 
@@ -28,7 +28,7 @@ public:
     [[nodiscard]] static char const * GetItemName(FileType type);
 
 private:
-    std::vector<std::pair<FileType, Counted<RawData>>> m_Files;
+    std::vector<std::pair<FileType, Counted<RawData const>>> m_Files;
 };
 
 }
