@@ -6,7 +6,9 @@
 #include <algorithm>
 #include <cmath>
 #include <csetjmp>
+#include <cstring>
 #include <png.h>
+#include <zlib.h>
 
 namespace Raster
 {
@@ -50,6 +52,8 @@ bool WriteRows(png_structp png, png_infop info, PngHeader const & header, png_by
     png_set_IHDR(png, info, header.m_Width, header.m_Height, 8, PNG_COLOR_TYPE_RGB_ALPHA, PNG_INTERLACE_NONE,
                  PNG_COMPRESSION_TYPE_BASE, PNG_FILTER_TYPE_BASE);
     png_set_compression_level(png, header.m_Compression);
+    // zlib's strategy for filtered pixels passes over short matches, of which pages of text are made.
+    png_set_compression_strategy(png, Z_DEFAULT_STRATEGY);
     if (header.m_Profile) {
         png_set_iCCP(png, info, "ICC profile", PNG_COMPRESSION_TYPE_BASE,
                      header.m_Profile->GetBytes().data(),
@@ -65,6 +69,47 @@ bool WriteRows(png_structp png, png_infop info, PngHeader const & header, png_by
     png_write_end(png, nullptr);
     return true;
 }
+
+/// Converts one pixel of each run of equal ones. Pages are mostly paper, and the engine takes long over a pixel.
+class RunConverter
+{
+public:
+    RunConverter(Format source, Format target)
+        : m_SourceSize(BytesPerPixel(source)),
+          m_TargetSize(BytesPerPixel(target))
+    {
+    }
+
+    void Convert(ColourTransform const & transform, std::uint8_t const * source, std::uint8_t * target,
+                 std::size_t pixels)
+    {
+        m_Source.clear();
+        m_Lengths.clear();
+        for (std::size_t x = 0; x < pixels; ++x, source += m_SourceSize) {
+            if (x == 0 || 0 != std::memcmp(source, source - m_SourceSize, m_SourceSize)) {
+                m_Source.insert(m_Source.end(), source, source + m_SourceSize);
+                m_Lengths.push_back(0);
+            }
+            ++m_Lengths.back();
+        }
+        m_Target.resize(m_Lengths.size() * m_TargetSize);
+        transform.Convert(m_Source.data(), m_Target.data(), m_Lengths.size());
+        std::uint8_t const * pixel = m_Target.data();
+        for (std::size_t const length : m_Lengths) {
+            for (std::size_t i = 0; i < length; ++i, target += m_TargetSize) {
+                std::memcpy(target, pixel, m_TargetSize);
+            }
+            pixel += m_TargetSize;
+        }
+    }
+
+private:
+    std::size_t const m_SourceSize;
+    std::size_t const m_TargetSize;
+    std::vector<std::uint8_t> m_Source;
+    std::vector<std::uint8_t> m_Target;
+    std::vector<std::size_t> m_Lengths;
+};
 
 }
 
@@ -111,6 +156,7 @@ Kernel::Counted<DynamicBitmap> ConvertBitmap(DynamicBase const & bitmap, Kernel:
         return converted;
     }
     std::size_t const width = static_cast<std::size_t>(bitmap.GetWidth());
+    RunConverter runs(isFloat ? Format::Rgba16 : bitmap.GetFormat(), format);
     std::vector<float> wide(isFloat || isFloatTarget ? width * 4 : 0);
     std::vector<std::uint16_t> deep(wide.size());
     for (int y = 0; y < bitmap.GetHeight(); ++y) {
@@ -125,7 +171,7 @@ Kernel::Counted<DynamicBitmap> ConvertBitmap(DynamicBase const & bitmap, Kernel:
             ToFloatPixels(Format::Rgba16, deep.data(), wide.data(), width);
             FromFloatPixels(format, wide.data(), converted->GetRow(y), width);
         } else {
-            transform->Convert(row, converted->GetRow(y), width);
+            runs.Convert(*transform, static_cast<std::uint8_t const *>(row), converted->GetRow(y), width);
         }
     }
     return converted;

@@ -112,6 +112,10 @@ void AddPixel(std::uint8_t const * source, std::size_t channels, SumOf<T> weight
     T pixel[5];
     std::memcpy(pixel, source, channels * sizeof(T));
     SumOf<T> const alpha = static_cast<SumOf<T>>(pixel[channels - 1]) * weight;
+    // Most of a page is empty paper.
+    if (alpha == 0) {
+        return;
+    }
     for (std::size_t i = 0; i + 1 < channels; ++i) {
         sums[i] += static_cast<SumOf<T>>(pixel[i]) * alpha;
     }
