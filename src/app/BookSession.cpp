@@ -2,6 +2,7 @@
 
 #include "app/Interruption.h"
 #include "app/NameChaptersCommand.h"
+#include "app/StatusNames.h"
 #include "commands/AddChapterCommand.h"
 #include "commands/CloseBookCommand.h"
 #include "commands/DeleteChaptersCommand.h"
@@ -145,9 +146,10 @@ void BookSession::ReportUnusable(Import::MessageList & messages) const
 {
     for (ChapterPtr const & chapter : GetChapters()) {
         if (!chapter->IsValid()) {
+            std::string const reason = Explain(*chapter);
             messages.Error("chapter-unusable", {chapter->GetPath().ToStd()},
-                           Text("The chapter \"%1\" is missing from the output: %2.", "Program", chapter->GetName(),
-                                chapter->GetStatusDescription()));
+                           Text("The chapter \"%1\" is missing from the output: %2", "Program", chapter->GetName(),
+                                reason.empty() ? chapter->GetStatusDescription() + "." : String(reason)));
         }
     }
 }

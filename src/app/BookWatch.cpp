@@ -61,6 +61,7 @@ void BookWatch::Begin()
     m_Files = LookAtFiles();
     Refresh();
     std::vector<State> const now = ReadStates();
+    m_Console.EndProgress();
     Tell({}, now);
     m_States = now;
 }
@@ -75,6 +76,7 @@ bool BookWatch::Look()
     m_Files = std::move(files);
     Refresh();
     std::vector<State> const now = ReadStates();
+    m_Console.EndProgress();
     Tell(m_States, now);
     m_States = now;
     return true;
@@ -104,19 +106,24 @@ void BookWatch::Refresh()
 
 void BookWatch::Tell(std::vector<State> const & before, std::vector<State> const & now)
 {
+    Import::MessageList messages;
     for (std::size_t index = 0; index < now.size(); ++index) {
         State const * const old = index < before.size() ? &before[index] : nullptr;
         if (!old || *old != now[index]) {
             TellChapter(index, old, now[index]);
+            auto const chapter = m_Session.GetChapters()[index];
+            if (std::string const reason = Explain(*chapter); !reason.empty()) {
+                messages.Warn("chapter-unusable", {chapter->GetPath().ToStd()}, reason);
+            }
         }
     }
-    TellMessages(m_Listener.TakeMessages());
+    messages.Append(m_Listener.TakeMessages());
+    TellMessages(messages);
 }
 
 void BookWatch::TellChapter(std::size_t index, State const * before, State const & now)
 {
     auto const chapter = m_Session.GetChapters()[index];
-    m_Console.EndProgress();
     if (m_Console.Settings().m_IsJson) {
         m_Console.SayResult(ToLine({{"time", TimeOfDay()},
                                     {"index", index},

@@ -1,5 +1,6 @@
 #include "app/StatusNames.h"
 
+#include "framework/document/DocumentController.h"
 #include "import/Text.h"
 
 #include <filesystem>
@@ -48,6 +49,27 @@ TableCell Describe(Book::BookChapter const & chapter)
         break;
     }
     return {Text("restricted", "Chapter state"), CellLook::Warning};
+}
+
+std::string Explain(Book::BookChapter const & chapter)
+{
+    Book::BookChapter::Status const status = chapter.GetStatus();
+    if (Book::BookChapter::Status::NotFound != status && Book::BookChapter::Status::Locked != status) {
+        return {};
+    }
+    std::error_code error;
+    if (!std::filesystem::exists(chapter.GetPath().ToStd(), error)) {
+        return Text("The chapter's file is not there; \"korvane locate\" takes it from where it is now, \"korvane "
+                    "replace\" puts another one in its place.",
+                    "Program");
+    }
+    auto const document = Kernel::MakeCounted<DocumentController>();
+    OpenDocumentFailedNotification failure(chapter.GetPath(), false);
+    if (!document->LoadDocument(chapter.GetPath(), false, false, LoadWhole, nullptr, failure, false)) {
+        return failure.GetReason().ToStd();
+    }
+    document->ShutDownArchive();
+    return Text("It could not be opened a moment ago, and can be now; try again.", "Program");
 }
 
 }

@@ -88,6 +88,9 @@ int RunStatus(VerbContext & context, StatusOptions const & options)
                     pages += chapter->GetPageCount();
                     chapters.push_back(DescribeChapter(*chapter, count));
                     table.AddRow(MakeRow(*chapter, count++));
+                    if (std::string const reason = Explain(*chapter); !reason.empty()) {
+                        messages.Warn("chapter-unusable", {chapter->GetPath().ToStd()}, reason);
+                    }
                 }
             }
         }

@@ -173,6 +173,37 @@ TEST_F(LocateTest, AShutFileIsAskedAboutOnATerminal)
     EXPECT_EQ(StatusOf(2), "ok");
 }
 
+TEST_F(ChapterVerbsTest, StatusSaysWhyAChapterIsNoGoodAndWhatHelps)
+{
+    std::string const whole = Read("book/.korvane/2.kvdoc");
+    Kernel::Counted<Kernel::FileLock> lock;
+    struct Row
+    {
+        std::function<void()> m_Deed;
+        char const * m_State;
+        char const * m_Helps;
+    };
+    for (Row const & row :
+         {Row{[&] { Write("book/.korvane/2.kvdoc", whole.substr(0, whole.size() / 2)); }, "unusable", "backup"},
+          Row{[&] { Write("book/.korvane/2.kvdoc", "no document"); }, "unusable", "not a"},
+          Row{[&] { fs::remove(Document(2)); }, "missing", "korvane locate"},
+          Row{[&] {
+                  Write("book/.korvane/2.kvdoc", whole);
+                  Kernel::FileLock::Result result{};
+                  lock = Kernel::FileLock::Acquire(String(Document(2).string()), Kernel::FileLock::Kind::Exclusive,
+                                                   result);
+              },
+              "locked", "Close it there"}}) {
+        row.m_Deed();
+        Outcome const outcome = Run({"status", std::string("@") + BookFile, "--no-locate"});
+        EXPECT_EQ(outcome.m_Code, 0);
+        EXPECT_THAT(outcome.m_Out, HasSubstr(row.m_State));
+        EXPECT_THAT(outcome.m_Err, HasSubstr(Document(2).string())) << row.m_State;
+        EXPECT_THAT(outcome.m_Err, HasSubstr(row.m_Helps)) << row.m_State;
+        EXPECT_THAT(outcome.m_Err, Not(HasSubstr("1.kvdoc")));
+    }
+}
+
 TEST_F(WatchTest, EachThingThatHappensToAFileIsTold)
 {
     std::ostringstream out;
