@@ -359,6 +359,10 @@ private:
 
     // The steps of LoadChapterDocument.
     void WaitForClose(Kernel::Counted<BookChapter const> const & chapter) const;
+    /// The document that the book holds for the chapter, if that is no longer at this path: the user has saved it under
+    /// another one meanwhile, and until its uses have ended it stays the chapter's. Counts a use.
+    Kernel::Counted<DocumentController> UseMovedDocument(Kernel::Counted<BookChapter const> const & chapter,
+                                                         String const & path) const;
     Kernel::Counted<DocumentController> AdoptForegroundDocument(Kernel::Counted<BookChapter const> const & chapter,
                                                                 Kernel::Counted<DocumentController> document,
                                                                 bool reconcile);

@@ -74,6 +74,9 @@ Kernel::Counted<DocumentController> BookController::LoadChapterDocument(Kernel::
     // A document that is closing must be gone before its file is opened again.
     WaitForClose(chapter);
 
+    if (Kernel::Counted<DocumentController> const moved = UseMovedDocument(chapter, path)) {
+        return moved;
+    }
     // The claim comes before any look at who has the document: it keeps an open one open until it is registered here.
     VantraController & application = VantraController::GetInstance();
     auto document = Kernel::MakeCounted<DocumentController>();
@@ -102,6 +105,21 @@ Kernel::Counted<DocumentController> BookController::LoadChapterDocument(Kernel::
         return AdoptForegroundDocument(chapter, document, reconcile);
     }
     return UseDocumentLoadedElsewhere(chapter, document);
+}
+
+Kernel::Counted<DocumentController>
+BookController::UseMovedDocument(Kernel::Counted<BookChapter const> const & chapter, String const & path) const
+{
+    VantraController & application = VantraController::GetInstance();
+    Kernel::ScopedLock const lock(m_ChapterDocumentsLock);
+    Kernel::Counted<DocumentController> document = GetDocumentControllerForChapter(chapter, false);
+    // In the user's hands and used, it stays open until it is counted here.
+    if (!document || document->GetPath() == path || !application.IsActiveDocumentController(document) ||
+        application.IsPurelyForegroundController(document)) {
+        return nullptr;
+    }
+    application.RegisterBackgroundController(document);
+    return document;
 }
 
 Kernel::Counted<DocumentController>

@@ -4,6 +4,7 @@
 #include "framework/commands/ModifySectionCommand.h"
 #include "framework/document/CloseDocumentCommand.h"
 #include "framework/document/DocumentNode.h"
+#include "framework/document/DocumentSaveResult.h"
 #include "framework/document/VantraController.h"
 #include "framework/kernel/FileLock.h"
 #include "framework/kernel/FileSystem.h"
@@ -221,6 +222,31 @@ TEST_F(ForegroundDocumentTest, TheBookBorrowsTheUsersDocument)
     EXPECT_TRUE(m_Application.IsPurelyForegroundController(document));
     CloseInFront(document);
     EXPECT_EQ(chapter->GetStatus(), BookChapter::Status::Ok);
+}
+
+TEST_F(ForegroundDocumentTest, WhatTheUserSavesElsewhereStaysTheChaptersWhileItIsInUse)
+{
+    auto const book = MakeBook(1);
+    Counted<BookChapter const> const chapter = book->GetChapterAtIndex(0);
+    auto const document = OpenInFront(chapter->GetPath());
+    ASSERT_EQ(book->LoadChapterDocument(chapter, false, false), document);
+    DocumentSaveResult saved;
+    document->AcquireWriterLock();
+    document->SaveDocument(saved, m_Builder.GetFolder() / "elsewhere.kvdoc");
+    document->ReleaseWriterLock();
+    ASSERT_TRUE(saved.IsSuccess()) << saved.GetText();
+
+    EXPECT_EQ(book->LoadChapterDocument(chapter, false, false), document) << "two would be at work for one chapter";
+    EXPECT_TRUE(book->ReleaseChapterDocument(chapter, false));
+    EXPECT_TRUE(book->ReleaseChapterDocument(chapter, false));
+    EXPECT_TRUE(m_Application.IsPurelyForegroundController(document));
+    EXPECT_EQ(book->GetDocumentControllerForChapter(chapter, false), nullptr);
+    auto const own = book->LoadChapterDocument(chapter, false, false);
+    ASSERT_TRUE(own);
+    EXPECT_NE(own, document) << "the next one comes from the chapter's own file";
+    EXPECT_TRUE(book->ReleaseChapterDocument(chapter, false));
+    CloseInFront(document);
+    EXPECT_TRUE(m_Application.GetDocumentControllers().empty());
 }
 
 TEST_F(ForegroundDocumentTest, AnEmptyListOfPathsMeansAllChapters)
