@@ -34,8 +34,7 @@ PromptMissingChapterFileNotification::PromptMissingChapterFileNotification(Kerne
           Kernel::LocalisedString("Some of your chapter files are missing. Would you like to locate them?",
                                   "Missing Chapter Notification"),
           static_cast<DocumentPromptChoice>(PromptYes | PromptNo), PromptIconQuestion, {},
-          [book](DocumentPromptChoice choice) { book->RespondMissingChapterPrompt(choice == PromptYes); }, book),
-      m_MutableBook(book)
+          [book](DocumentPromptChoice choice) { book->RespondMissingChapterPrompt(choice == PromptYes); }, book)
 {
 }
 
@@ -46,7 +45,7 @@ DocumentPromptChoice PromptMissingChapterFileNotification::GetDefaultChoice() co
 
 void PromptMissingChapterFileNotification::ProcessChoice(DocumentPromptChoice choice) const
 {
-    m_MutableBook->RespondMissingChapterPrompt(choice == PromptYes);
+    Answer(choice);
 }
 
 PromptFixBookPermissionsNotification::PromptFixBookPermissionsNotification(Kernel::Counted<BookController> book,

@@ -47,11 +47,9 @@ public:
 
     /// What is taken where nobody can be asked: no.
     [[nodiscard]] virtual DocumentPromptChoice GetDefaultChoice() const;
-    /// What the user's choice does; called by the base with the answer, as a turn of the book's queue.
+    /// The front end's answer, which `BookController::RespondMissingChapterPrompt` gets as a turn of the book's queue;
+    /// the first one counts.
     virtual void ProcessChoice(DocumentPromptChoice choice) const;
-
-private:
-    Kernel::Counted<BookController> m_MutableBook;
 };
 
 /// Asks the user to let the program at a chapter's file. The front end ends in `Ignore`, `IgnoreAll` or `Retry`, of

@@ -174,6 +174,21 @@ TEST_F(MissingChaptersTest, AnAnswerTwiceOrAfterTheBookHasClosedChangesNothing)
     EXPECT_THAT(Paths(), ElementsAre("new/book/a.kvdoc", "new/book/b.kvdoc", "new/book/c.kvdoc"));
 }
 
+TEST_F(MissingChaptersTest, AChoiceIsAnAnswerLikeAnyOther)
+{
+    Move("old/book/b.kvdoc", "new/b.kvdoc");
+    Open();
+    auto const prompt = Last<Prompt>();
+    ASSERT_TRUE(prompt);
+    prompt->ProcessChoice(PromptYes);
+    BookBuilder::Rest();
+    EXPECT_EQ(m_Recorder.All<Dialogue>().size(), 1u);
+    EXPECT_FALSE(prompt->Answer(PromptNo)) << "it was the answer";
+    prompt->ProcessChoice(PromptYes);
+    BookBuilder::Rest();
+    EXPECT_EQ(m_Recorder.All<Dialogue>().size(), 1u) << "nothing is asked twice";
+}
+
 TEST_F(MissingChaptersTest, NoQuestionIsAboutAChapterThatHasLeft)
 {
     Move("old/book/a.kvdoc", "new/a.kvdoc");
