@@ -80,6 +80,9 @@ bool TakeList(std::string_view text, std::vector<std::string> & values)
         text = Trimmed(text);
         if (text.starts_with(',')) {
             text.remove_prefix(1);
+        } else if (!text.starts_with(']')) {
+            // The line ends here, or the rest of it is a comment.
+            return false;
         }
     }
 }

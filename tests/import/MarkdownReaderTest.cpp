@@ -139,6 +139,34 @@ TEST(MarkdownReaderTest, FrontMatterGivesTitleAuthorsAndLanguage)
     EXPECT_EQ(ReadAndDescribe("---\nplain text\n\n---\n"), "rule\np plain text\nrule\n");
 }
 
+TEST(MarkdownReaderTest, AListOfTheFrontMatterIsReadOrRefusedWhole)
+{
+    struct Row
+    {
+        char const * m_List;
+        std::vector<std::string> m_Authors;
+        char const * m_Messages;
+    };
+    Row const rows[] = {
+        {"[X, Y]", {"X", "Y"}, ""},
+        {"[X, Y, ] # both", {"X", "Y"}, ""},
+        {"[]", {}, ""},
+        {"[X, Y", {}, "2 front-matter\n"},
+        {"[# X", {}, "2 front-matter\n"},
+        {"[X, # Y]", {}, "2 front-matter\n"},
+        {"[\"X\" Y]", {}, "2 front-matter\n"},
+        {"[\"X, Y]", {}, "2 front-matter\n"},
+    };
+    for (Row const & row : rows) {
+        SCOPED_TRACE(row.m_List);
+        MessageList messages;
+        ChapterText const chapter =
+            ReadMarkdown("---\nauthors: " + std::string(row.m_List) + "\n---\nx\n", {"a.md", "en", true}, messages);
+        EXPECT_EQ(chapter.m_FrontMatter.m_Authors, row.m_Authors);
+        EXPECT_EQ(Describe(messages), row.m_Messages);
+    }
+}
+
 TEST(MarkdownReaderTest, ExtremeInputIsReadWithoutHarm)
 {
     std::string deep;
