@@ -3,6 +3,7 @@
 
 #include "commands/AddChapterCommand.h"
 #include "commands/CloseBookCommand.h"
+#include "commands/LoadBookCommand.h"
 #include "commands/NewBookCommand.h"
 #include "commands/UpdateChaptersCommand.h"
 #include "core/BookCollection.h"
@@ -18,6 +19,7 @@
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
+#include <chrono>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -173,6 +175,75 @@ void BM_ForegroundPass(benchmark::State & state)
     LongBook::Rest();
 }
 BENCHMARK(BM_ForegroundPass)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+/// Book files of three chapters each, opened one after the other until all is at rest, and closed again. With all of
+/// them open a chapter of one is opened in front and closed, which every book hears of.
+void BM_ManyBooks(benchmark::State & state)
+{
+    constexpr int Chapters = 3;
+    auto const count = static_cast<std::size_t>(state.range(0));
+    std::string pattern = (fs::temp_directory_path() / "korvane-bench-XXXXXX").string();
+    fs::path const folder = mkdtemp(pattern.data());
+    VantraController & application = VantraController::GetInstance();
+    Book::BookCollection & collection = Book::BookCollection::GetInstance();
+    collection.SetUpdatePageNumbersAutomatically(false);
+    // One package, copied as often as wanted: it names its chapters by their place beside it.
+    fs::path const model = folder / "model";
+    fs::create_directory(model);
+    auto const book = MakeCounted<Book::BookController>();
+    Book::BookController::ChapterPaths packaged;
+    for (int chapter = 0; chapter < Chapters; ++chapter) {
+        String const path((model / (std::to_string(chapter) + ".kvdoc")).string());
+        WriteChapter(path);
+        packaged.emplace(book->AddChapter(path, -1), path);
+    }
+    DocumentSaveResult saved;
+    book->SaveBookAsPackage(saved, String((model / "book.kvbook").string()), packaged);
+    LongBook::Rest();
+    std::vector<String> paths;
+    for (std::size_t index = 0; index < count; ++index) {
+        fs::copy(model, folder / std::to_string(index));
+        paths.emplace_back((folder / std::to_string(index) / "book.kvbook").string());
+    }
+    String const lastChapter((folder / std::to_string(count - 1) / "0.kvdoc").string());
+    using Clock = std::chrono::steady_clock;
+    std::chrono::duration<double, std::milli> opening{};
+    std::chrono::duration<double, std::milli> visiting{};
+    std::chrono::duration<double, std::milli> closing{};
+    for (auto _ : state) {
+        std::vector<Counted<Book::BookController>> books;
+        Clock::time_point const begin = Clock::now();
+        for (String const & path : paths) {
+            auto const command = MakeCounted<Book::LoadBookCommand>(path);
+            application.EnqueueCommand(Counted<VantraCommand>(command));
+            books.push_back(command->GetBookController());
+        }
+        LongBook::Rest();
+        Clock::time_point const opened = Clock::now();
+        OpenDocumentFailedNotification failure(lastChapter, true);
+        auto const document = application.OpenDocument(lastChapter, failure);
+        LongBook::Rest();
+        application.EnqueueCommandAndWait(MakeCounted<CloseDocumentCommand>(document, nullptr, false, true));
+        LongBook::Rest();
+        Clock::time_point const visited = Clock::now();
+        for (Counted<Book::BookController> const & open : books) {
+            application.EnqueueCommandAndWait(MakeCounted<Book::CloseBookCommand>(open));
+            open->WaitUntilCommandQueueEmpty();
+            collection.RemoveBookController(open);
+        }
+        LongBook::Rest();
+        opening += opened - begin;
+        visiting += visited - opened;
+        closing += Clock::now() - visited;
+    }
+    auto const each = [&](auto total) { return total.count() / static_cast<double>(state.iterations() * count); };
+    state.counters["open ms each"] = each(opening);
+    state.counters["visit ms"] = visiting.count() / static_cast<double>(state.iterations());
+    state.counters["close ms each"] = each(closing);
+    std::error_code ignored;
+    fs::remove_all(folder, ignored);
+}
+BENCHMARK(BM_ManyBooks)->ArgName("books")->Arg(100)->Arg(1000)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 }
 
