@@ -41,6 +41,9 @@ void BookController::SetMasterIndex(Kernel::Counted<Story::Index const> index)
     m_MasterIndex.Set(index->CloneAddingGUIDS());
     Snapshot<ChapterList> const chapters = Chapters();
     for (Kernel::Counted<BookChapter> const & chapter : chapters) {
+        if (!chapter) {
+            continue;
+        }
         Kernel::Counted<DocumentController> const document =
             VantraController::GetInstance().GetRegisteredDocumentControllerFromPath(chapter->GetPath());
         // The document that the change came from has it already.
@@ -72,6 +75,9 @@ void BookController::ReconcileIndex(Kernel::Counted<DocumentController const> do
     }
     Snapshot<ChapterList> const chapters = Chapters();
     for (Kernel::Counted<BookChapter> const & chapter : chapters) {
+        if (!chapter) {
+            continue;
+        }
         if (Kernel::Counted<DocumentController> const open =
                 VantraController::GetInstance().GetRegisteredDocumentControllerFromPath(chapter->GetPath())) {
             ReconcileIndex(open);

@@ -47,6 +47,11 @@ Kernel::Counted<BookChapter> FindFirst(const Snapshot<BookController::ChapterLis
     return found == chapters.end() ? nullptr : *found;
 }
 
+Kernel::Counted<BookChapter> FirstOf(const Snapshot<BookController::ChapterList> & chapters)
+{
+    return FindFirst(chapters, [](BookChapter const &) { return true; });
+}
+
 }
 
 BookController::BookController() = default;
@@ -103,14 +108,19 @@ Kernel::Counted<BookChapter const> BookController::GetNextChapter(Kernel::Counte
 {
     const Snapshot<ChapterList> chapters = Chapters();
     const auto found = Find(*chapters, chapter);
-    return found == chapters.end() || found + 1 == chapters.end() ? nullptr : *(found + 1);
+    const auto next = found == chapters.end() ? found : std::find_if(found + 1, chapters.end(), IsChapter);
+    return next == chapters.end() ? nullptr : *next;
 }
 
 Kernel::Counted<BookChapter const> BookController::GetPreviousChapter(Kernel::Counted<BookChapter const> chapter) const
 {
     const Snapshot<ChapterList> chapters = Chapters();
     const auto found = Find(*chapters, chapter);
-    return found == chapters.end() || found == chapters.begin() ? nullptr : *(found - 1);
+    if (found == chapters.end()) {
+        return nullptr;
+    }
+    const auto previous = std::find_if(std::make_reverse_iterator(found), chapters->rend(), IsChapter);
+    return previous == chapters->rend() ? nullptr : *previous;
 }
 
 void BookController::GetChapters(ConstChapterList & chapters) const
@@ -209,8 +219,8 @@ void BookController::RemoveChapters(const ConstChapterList & chapters)
         MarkChanged();
         if (chapter->IsKey()) {
             m_Thumbnail.Set(nullptr);
-            if (HasChapters()) {
-                SetKeyChapter(GetChapterAtIndex(0));
+            if (const Kernel::Counted<BookChapter> first = FirstOf(Chapters())) {
+                SetKeyChapter(first);
             }
         }
     }
@@ -235,7 +245,7 @@ void BookController::MoveChapters(Kernel::Counted<BookChapter const> before, Con
 {
     ChapterList rest = *Chapters();
     ChapterList moved;
-    const Kernel::Counted<BookChapter> oldFirst = GetChapterAtIndex(0);
+    const Kernel::Counted<BookChapter> oldFirst = FirstOf(Chapters());
     for (Kernel::Counted<BookChapter const> const & chapter : chapters) {
         const auto found = Find(rest, chapter);
         if (found == rest.end()) {
@@ -247,7 +257,7 @@ void BookController::MoveChapters(Kernel::Counted<BookChapter const> before, Con
     rest.insert(Find(rest, before), moved.begin(), moved.end());
     m_Chapters.Set(Snapshot(std::move(rest)));
 
-    const Kernel::Counted<BookChapter> first = GetChapterAtIndex(0);
+    const Kernel::Counted<BookChapter> first = FirstOf(Chapters());
     if (first && oldFirst && !(first == oldFirst) && oldFirst->GetStartFromPage() == 1) {
         first->SetStartFromPage(1);
         oldFirst->SetStartFromPage(0);
@@ -257,7 +267,7 @@ void BookController::MoveChapters(Kernel::Counted<BookChapter const> before, Con
 
 void BookController::OnFirstChapterChanged()
 {
-    if (const Kernel::Counted<BookChapter> first = GetChapterAtIndex(0)) {
+    if (const Kernel::Counted<BookChapter> first = FirstOf(Chapters())) {
         first->SetStartFromPage(first->GetCachedStartPage());
     }
 }

@@ -1,6 +1,13 @@
 #include "core/BookController.h"
+
+#include "commands/ChapterOpenCommand.h"
+#include "commands/PreflightChaptersCommand.h"
+#include "content/SetMasterIndexCommand.h"
+#include "core/BookCollection.h"
+#include "framework/document/CloseDocumentCommand.h"
 #include "framework/document/DocumentSaveResult.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
+#include "framework/document/VantraController.h"
 #include "framework/kernel/Archive.h"
 #include "framework/kernel/ArchiveSession.h"
 #include "framework/kernel/FileStore.h"
@@ -18,6 +25,7 @@
 #include <functional>
 
 using Book::BookChapter;
+using Book::BookCollection;
 using Book::BookController;
 using Kernel::Counted;
 using Kernel::MakeCounted;
@@ -313,6 +321,50 @@ TEST_F(BookFileTest, KeepsThePlaceOfAnEntryThatIsNoChapter)
     book->SaveBook(saved);
     EXPECT_TRUE(saved.IsSuccess());
     EXPECT_EQ(Load(path)->GetChapterAtIndex(0), nullptr);
+}
+
+TEST_F(BookFileTest, ABookWithGapsIsWorkedOnLikeAnyOther)
+{
+    BookBuilder builder;
+    String const a = builder.WriteChapter("a.kvdoc", {.m_Anchors = {"here"}, .m_Topics = {"Birds"}});
+    String const b = builder.WriteChapter("b.kvdoc", {.m_Pages = 3, .m_Topics = {"Dogs"}});
+    String const path = m_Folder / "book.kvbook";
+    WriteArchive(path, "KvBk", "doc.dat", BookStream([&](Kernel::OutSerialiser & out) {
+                     auto const key = MakeCounted<BookChapter>(a);
+                     key->SetIsKey(true);
+                     out.SaveObjects("Chps", std::vector<Counted<Kernel::Serialisable>>{
+                                                 MakeCounted<Stranger>(), key, MakeCounted<Stranger>(),
+                                                 MakeCounted<BookChapter>(b)});
+                 }));
+    auto const book = builder.LoadBook(path);
+    ASSERT_TRUE(book);
+    Counted<BookChapter const> const first = book->GetChapterAtIndex(1);
+    Counted<BookChapter const> const last = book->GetChapterAtIndex(3);
+    EXPECT_EQ(book->GetNextChapter(first), last);
+    EXPECT_EQ(book->GetPreviousChapter(last), first);
+    EXPECT_EQ(book->GetPreviousChapter(first), nullptr);
+    EXPECT_EQ(book->GetNextChapter(last), nullptr);
+
+    // With documents in front, whose topics and anchors the book then looks after.
+    VantraController & application = VantraController::GetInstance();
+    OpenDocumentFailedNotification failure(b, true);
+    Counted<DocumentController const> const document = application.OpenDocument(b, failure);
+    BookBuilder::Rest();
+    BookBuilder::Run(book, MakeCounted<Book::SetMasterIndexCommand>(MakeCounted<Story::Index>()));
+    BookBuilder::Run(book, MakeCounted<Book::ChapterOpenCommand>(document));
+    book->UpdateChapters();
+    BookCollection::GetInstance().PreOutput(book, {first, last});
+    BookBuilder::Run(book, MakeCounted<Book::PreflightChaptersCommand>(
+                               BookController::ConstChapterList{first, last}, true));
+    application.EnqueueCommandAndWait(MakeCounted<CloseDocumentCommand>(document, nullptr, true, false));
+    BookBuilder::Rest();
+    EXPECT_EQ(last->GetCachedStartPage(), 2) << "numbered on from the chapter before the gap";
+
+    book->MoveChapters(first, {last});
+    EXPECT_EQ(BookBuilder::Names(*book), "b a");
+    book->RemoveChapters({first});
+    EXPECT_TRUE(last->IsKey()) << "the first chapter that remains";
+    EXPECT_EQ(last->GetStartFromPage(), last->GetCachedStartPage());
 }
 
 TEST_F(BookFileTest, TellsWhyAFileCannotBeOpened)
