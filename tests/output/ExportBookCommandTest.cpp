@@ -1,7 +1,10 @@
 #include "output/ExportBookCommand.h"
 
 #include "core/BookCollection.h"
+#include "framework/document/CloseDocumentCommand.h"
 #include "framework/document/DocumentController.h"
+#include "framework/document/OpenDocumentFailedNotification.h"
+#include "framework/document/VantraController.h"
 #include "framework/kernel/DiskFault.h"
 #include "framework/kernel/FileSystem.h"
 #include "framework/render/FileExportOptions.h"
@@ -119,6 +122,45 @@ TEST_F(ExportBookCommandTest, AnAbortLeavesTheTargetAlone)
     BookBuilder::Run(book, command);
     EXPECT_TRUE(recorder.All<ExportBookCompleteNotification>().empty()) << "it stopped before the writer";
     EXPECT_EQ(m_Builder.GetFolder().ReadFile("book.pdf"), "the one before");
+}
+
+TEST_F(ExportBookCommandTest, OpenChaptersHoldStillForItAndAreLetGoHoweverItEnds)
+{
+    auto const book = TwoChapters();
+    VantraController & application = VantraController::GetInstance();
+    String const path = book->GetChapterAtIndex(1)->GetPath();
+    OpenDocumentFailedNotification failure(path, true);
+    auto const document = application.OpenDocument(path, failure);
+    ASSERT_TRUE(document) << failure.GetReason();
+    BookBuilder::Rest();
+    enum class End
+    {
+        Done,
+        Failed,
+        AbandonedAtItsFirstCheck
+    };
+    for (End const end : {End::Done, End::Failed, End::AbandonedAtItsFirstCheck}) {
+        std::atomic<int> held{0};
+        std::atomic<int> free{0};
+        auto const command = Command(book, m_Builder.GetFolder() / "book.pdf", false);
+        if (end == End::AbandonedAtItsFirstCheck) {
+            command->Abort();
+        }
+        Kernel::DiskFault::SetHandler([&](Kernel::DiskOperation operation, String const &) {
+            if (operation != Kernel::DiskOperation::Write) {
+                return 0;
+            }
+            ++(document->IsBookLockEngaged() ? held : free);
+            return end == End::Failed ? ENOSPC : 0;
+        });
+        BookBuilder::Run(book, command);
+        Kernel::DiskFault::SetHandler({});
+        EXPECT_EQ(held != 0, end != End::AbandonedAtItsFirstCheck) << static_cast<int>(end);
+        EXPECT_EQ(free, 0) << static_cast<int>(end) << ": nothing is written of a document that may change";
+        EXPECT_FALSE(document->IsBookLockEngaged()) << static_cast<int>(end);
+    }
+    application.EnqueueCommandAndWait(
+        Kernel::MakeCounted<CloseDocumentCommand>(Kernel::Counted<DocumentController const>(document), nullptr, false, false));
 }
 
 /// Files of the folder, and the temporary files that were made, are told apart by a part of their path; "" stands for data
