@@ -39,7 +39,7 @@ public:
     [[nodiscard]] String GetPath() const { return GetBookController()->GetPath(); }
 };
 
-/// A book has closed: its queue is empty and refuses commands. The application now takes it out of `BookCollection`.
+/// A book has closed: its queue runs empty and takes no command more. The application takes it out of `BookCollection`.
 class BookClosedNotification final : public BookNotification
 {
 public:

@@ -342,6 +342,12 @@ TEST_F(DispatchTest, StructureChangesRenumberOnlyWhereUpdatesAreAutomatic)
                                            Counted<BookChapter const>(book->GetChapterAtIndex(0)));
     BookBuilder::Rest();
     EXPECT_EQ(book->GetChapterAtIndex(1)->DescribePages(), "5 - 5");
+    // As after a replacement of a chapter that was gone: there is no first chapter that changed.
+    NotificationRecorder recorder;
+    Post<BookStructureChangedNotification>(Counted<BookController const>(book), nullptr);
+    BookBuilder::Rest();
+    EXPECT_TRUE(recorder.All<CommandFailedNotification>().empty());
+    EXPECT_EQ(book->GetChapterAtIndex(1)->DescribePages(), "5 - 5");
 }
 
 TEST_F(DispatchTest, PageNumberOptionsAreStoredAlsoWithoutAutomaticUpdates)

@@ -316,6 +316,10 @@ TEST_F(BookFileTest, KeepsThePlaceOfAnEntryThatIsNoChapter)
     BookController::ConstChapterList chapters;
     book->GetChapters(chapters);
     EXPECT_EQ(chapters.size(), 1u) << "who walks over all chapters meets none that is not there";
+    Kernel::MemoryOutStream stream;
+    Kernel::CollectingFileStoreOut pathsOnly(false);
+    book->Save(stream, pathsOnly);
+    EXPECT_EQ(stream.GetPosition(), 0u) << "a run that collects paths writes nothing";
     book->SetPadStrays(true);
     DocumentSaveResult saved;
     book->SaveBook(saved);
