@@ -10,6 +10,11 @@ constexpr int None = -1;
 
 }
 
+int SumOfNumbers(int a, int b)
+{
+    return static_cast<int>(static_cast<unsigned int>(a) + static_cast<unsigned int>(b));
+}
+
 std::vector<SectionChange> RenumberSections(std::vector<SectionFacts> const & sections, int pageCount, bool isFirst,
                                             int startFromPage, int & pageNumber)
 {
@@ -36,14 +41,14 @@ std::vector<SectionChange> RenumberSections(std::vector<SectionFacts> const & se
             continue;
         }
         bool const leadsChapter = lastNumber == None && !isFirst;
-        if (!leadsChapter && lastNumber != number - index + lastIndex) {
+        if (!leadsChapter && lastNumber != SumOfNumbers(number, lastIndex - index)) {
             lastNumber = number;
             pageNumber = number;
             lastIndex = index;
             continue;
         }
         if (lastIndex != None) {
-            pageNumber += index - lastIndex;
+            pageNumber = SumOfNumbers(pageNumber, index - lastIndex);
         }
         if (pageNumber != number) {
             changes.push_back({index, pageNumber});
@@ -53,7 +58,7 @@ std::vector<SectionChange> RenumberSections(std::vector<SectionFacts> const & se
     }
     // With no section to number, lastIndex is still -1 and the chapter counts one page more: following chapters have
     // always been numbered so, and books in print rely on it.
-    pageNumber += pageCount - trailing - lastIndex;
+    pageNumber = SumOfNumbers(pageNumber, pageCount - trailing - lastIndex);
     return changes;
 }
 
@@ -78,7 +83,7 @@ void FollowSections(std::vector<SectionFacts> const & sections, int pageCount, i
         }
     }
     int const uncounted = firstIncluded == None ? 0 : trailing + firstIncluded;
-    pageNumber += pageCount - uncounted - lastRestart;
+    pageNumber = SumOfNumbers(pageNumber, pageCount - uncounted - lastRestart);
 }
 
 }

@@ -22,6 +22,9 @@ struct SectionChange
     friend bool operator==(SectionChange const &, SectionChange const &) = default;
 };
 
+/// The sum of a page number and a count. A damaged document may number its pages beyond all numbers: then it wraps.
+[[nodiscard]] int SumOfNumbers(int a, int b);
+
 /// The changes that make a chapter's sections run on from `pageNumber`, which moves on to the number for the page after
 /// the chapter. `sections` are in page order. `isFirst` marks the book's first chapter, and `startFromPage` is that
 /// chapter's own start page, 0 if it has none.

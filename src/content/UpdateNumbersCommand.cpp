@@ -98,7 +98,8 @@ void UpdateNumbersCommand::Do()
             pending = nullptr;
         }
         if (chapter->IsContinueFromPrevious()) {
-            pageNumber += chapter->GetPrePagePaddingCount(previous, book->IsPadStrays(), book->IsMergeStrays());
+            pageNumber = SumOfNumbers(
+                pageNumber, chapter->GetPrePagePaddingCount(previous, book->IsPadStrays(), book->IsMergeStrays()));
         } else {
             pageNumber = chapter->GetStartFromPage();
         }

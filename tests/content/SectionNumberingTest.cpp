@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <limits>
+
 namespace Book
 {
 
@@ -13,6 +15,7 @@ void PrintTo(SectionChange const & change, std::ostream * stream)
 namespace
 {
 
+constexpr int Largest = std::numeric_limits<int>::max();
 constexpr bool Restarts = true;
 constexpr bool RunsOn = false;
 constexpr bool Included = true;
@@ -124,7 +127,9 @@ INSTANTIATE_TEST_SUITE_P(
                     FollowCase{"no restart: one more than the pages", {{0, 1, RunsOn, Included}}, 12, 5, 18},
                     FollowCase{"an included section ends the tail",
                                {{0, 31, Restarts, Included}, {6, 37, RunsOn, Excluded}, {8, 39, RunsOn, Included}},
-                               12, 1, 43}));
+                               12, 1, 43},
+                    FollowCase{"numbers that no book has wrap", {{0, Largest, Restarts, Included}}, 12, 5,
+                               std::numeric_limits<int>::min() + 11}));
 
 }
 

@@ -108,6 +108,32 @@ TEST_F(UpdateNumbersCommandTest, AFixedStartIsTakenAsItStandsAndAMissingChapterD
     EXPECT_EQ(Pages(*book)[2], "5 - 7") << "a chapter known to be lost is passed by";
 }
 
+TEST_F(UpdateNumbersCommandTest, FormsAndPrefixesStayWhileTheNumbersRunOn)
+{
+    DocumentSection::Values roman;
+    roman.m_Format = PageNumberFormat::RomanLower;
+    DocumentSection::Values prefixed;
+    prefixed.m_Prefix = "A-";
+    DocumentSection::Values capital;
+    capital.m_Format = PageNumberFormat::RomanUpper;
+    capital.m_Prefix = "(";
+    DocumentSection::Values hidden;
+    hidden.m_IncludeOnExport = false;
+    auto const book = m_Builder.NewBook({m_Builder.WriteChapter("a.kvdoc", {.m_Pages = 8, .m_Section = roman}),
+                                         m_Builder.WriteChapter("b.kvdoc", {.m_Pages = 2, .m_Section = prefixed}),
+                                         m_Builder.WriteChapter("c.kvdoc", {.m_Pages = 30, .m_Section = capital}),
+                                         m_Builder.WriteChapter("d.kvdoc", {.m_Pages = 3, .m_Section = hidden}),
+                                         m_Builder.WriteChapter("e.kvdoc", {.m_Pages = 1})});
+    // A section with settings of its own fixes its chapter's start when the chapter is added.
+    EXPECT_EQ(BookBuilder::Starts(*book), "1 1 1 1 0");
+    for (int const index : {1, 2, 3}) {
+        BookBuilder::Run(book, Kernel::MakeCounted<UpdateChapterSettingsCommand>(book->GetChapterAtIndex(index), true, 0));
+    }
+    UpdateAll(book);
+    EXPECT_EQ(Pages(*book), (std::vector<std::string>{"i - viii", "A-9 - A-10", "(XI - (XL", "1 - 3", "42 - 42"}))
+        << "a chapter of which nothing goes out keeps its own numbers, and costs one";
+}
+
 TEST_F(UpdateNumbersCommandTest, StraysThatAreNotMergedCostTheirBlanks)
 {
     // Two pages end on a left-hand page; the next chapter begins on a right-hand one.

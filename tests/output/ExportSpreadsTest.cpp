@@ -82,6 +82,11 @@ protected:
     /// The book of these chapters, exported spread by spread.
     String const & Export(std::vector<Sketch> const & sketches, bool pad, bool merge)
     {
+        return Export(sketches, pad, merge, Kernel::MakeCounted<Renderer::FileExportOptionsPDF>());
+    }
+    String const & Export(std::vector<Sketch> const & sketches, bool pad, bool merge,
+                          Kernel::Counted<Renderer::FileExportOptions const> options)
+    {
         std::vector<String> paths;
         for (Sketch const & sketch : sketches) {
             paths.push_back(Write(sketch));
@@ -95,9 +100,7 @@ protected:
         BookBuilder::Run(book,
                          Kernel::MakeCounted<ExportBookCommand>(
                              chapters, m_Target,
-                             Kernel::Consolidated<Renderer::FileExportOptions>(
-                                 Kernel::Counted<Renderer::FileExportOptions const>(
-                                     Kernel::MakeCounted<Renderer::FileExportOptionsPDF>())),
+                             Kernel::Consolidated<Renderer::FileExportOptions>(std::move(options)),
                              Kernel::Size{}, false, false, false, false, nullptr));
         m_Builder.CloseBook(book);
         return m_Target;
@@ -170,6 +173,29 @@ TEST_F(ExportSpreadsTest, StackedPagesStandOneBelowTheOther)
 {
     PdfProbe const pdf(Export({{"a", 2, 0, 1, true}, {"b", 3, 0, 1, true}}, true, false));
     EXPECT_EQ(Halves(pdf, true), (Lines{"a1", "a2|", "|b1", "b2|b3"}));
+}
+
+TEST_F(ExportSpreadsTest, MarksStandOutsideOfABleedThatIsWiderThanTheirDistance)
+{
+    Renderer::FileExportOptionsPDF::Settings settings;
+    settings.m_PrintersMarks.m_CropMarks = true;
+    settings.m_PrintersMarks.m_Offset = 4;
+    settings.m_PrintersMarks.m_Length = 14;
+    for (bool const includeBleed : {true, false}) {
+        auto const options = Kernel::MakeCounted<Renderer::FileExportOptionsPDF>();
+        options->SetSettings(settings);
+        options->SetIncludeBleed(includeBleed);
+        PdfProbe const pdf(Export({{"a", 2}, {"b", 1}}, false, true, options));
+        // The shared page has its bleed of 9 and its marks all round, and no bleed between its halves.
+        EXPECT_EQ(pdf.Value("2/MediaBox"), includeBleed ? "[ 0 0 846 546 ]" : "[ 0 0 836 536 ]");
+        EXPECT_EQ(pdf.Value("2/BleedBox"), includeBleed ? "[ 14 14 832 532 ]" : "[ 18 18 818 518 ]");
+        EXPECT_EQ(pdf.Value("2/TrimBox"), includeBleed ? "[ 23 23 823 523 ]" : "[ 18 18 818 518 ]");
+        PdfProbe::Image const image = pdf.Draw(2);
+        auto const isDark = [&](int x, int y) { return (image.At(x, y) & 0xFF) < 0xC0; };
+        int const trim = includeBleed ? 23 : 18;
+        EXPECT_TRUE(isDark(7, trim) || isDark(7, trim - 1)) << "the top left mark";
+        EXPECT_FALSE(isDark(trim - 3, trim) || isDark(trim - 3, trim - 1)) << "ends clear of the page";
+    }
 }
 
 TEST_F(ExportSpreadsTest, LinksAndBookmarksLeadToTheirHalfOfASharedPage)

@@ -3,6 +3,7 @@
 #include "framework/document/DocumentControllerSession.h"
 #include "framework/render/RasterSink.h"
 
+#include <algorithm>
 #include <cmath>
 
 namespace
@@ -15,6 +16,17 @@ Renderer::BleedMargins BleedOf(ExportableInterface::ExportParams const & page)
 {
     return {page.m_Rect.left - page.m_BleedRect.left, page.m_Rect.top - page.m_BleedRect.top,
             page.m_BleedRect.right - page.m_Rect.right, page.m_BleedRect.bottom - page.m_Rect.bottom};
+}
+
+/// The options' marks, moved outwards where they would stand in a wide bleed.
+Renderer::PrintersMarksOptions MarksClearOf(Renderer::BleedMargins const & bleed,
+                                            Renderer::FileExportOptionsPDF const & options)
+{
+    Renderer::PrintersMarksOptions marks = options.GetPrintersMarks();
+    if (options.GetIncludeBleed()) {
+        marks.m_Offset = std::max({marks.m_Offset, bleed.m_Left, bleed.m_Top, bleed.m_Right, bleed.m_Bottom});
+    }
+    return marks;
 }
 
 }
@@ -71,7 +83,7 @@ enum ExportResult ExportItemCommandBase::ExportPDFPage(Renderer::RenderTree::Pdf
     }
     Kernel::Counted<Renderer::PrintersMarksHelper> const marks =
         Kernel::MakeCounted<Renderer::PrintersMarksHelper>(page.m_Rect, GetDocument()->GetUnitConverter());
-    marks->SetOptions(options->GetPrintersMarks());
+    marks->SetOptions(MarksClearOf(BleedOf(page), *options));
     marks->SetFilename(pdfExport.GetFilename());
     marks->SetIsIncludeBleed(options->GetIncludeBleed());
 

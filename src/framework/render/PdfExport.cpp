@@ -343,7 +343,7 @@ bool PdfExport::Close()
         return state.m_Closed && state.m_Error.Empty();
     }
     if (state.m_File.m_Pages.empty()) {
-        state.Fail("There is no page to write.");
+        state.Fail(Kernel::LocalisedString("There is no page to write.", "Output"));
     }
     if (state.m_Schema->IsAborted()) {
         state.Fail(Aborted().what());

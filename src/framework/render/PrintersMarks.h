@@ -14,7 +14,7 @@ struct PrintersMarksOptions
 {
     bool m_CropMarks = false;
     bool m_RegistrationMarks = false;
-    /// From the trimmed page to the marks; at least the bleed.
+    /// From the trimmed page to the marks. An export that shows a wider bleed moves them out to its edge.
     double m_Offset = 8.5;
     double m_Length = 14;
     double m_LineWidth = 0.25;
