@@ -112,6 +112,30 @@ TEST_F(ExportBookCommandTest, ATargetThatCannotBeMadeIsNamed)
     EXPECT_EQ(message, String("The file could not be created:\n") + target + "\n");
 }
 
+TEST_F(ExportBookCommandTest, AThrowAwayExportTellsOfSuccessOnlyAndEveryExportLeavesTheBookDirty)
+{
+    auto const book = TwoChapters();
+    struct Row
+    {
+        char const * name;
+        bool temp;
+        std::size_t told;
+    };
+    for (Row const & row : {Row{"none/book.pdf", true, 0}, Row{"none/book.pdf", false, 1}, Row{"book.pdf", true, 1}}) {
+        SCOPED_TRACE(row.name);
+        book->SetIsDirty(false);
+        NotificationRecorder recorder;
+        BookBuilder::Run(book, Command(book, m_Builder.GetFolder() / row.name, row.temp));
+        auto const told = recorder.All<ExportBookCompleteNotification>();
+        ASSERT_EQ(told.size(), row.told);
+        EXPECT_TRUE(book->IsDirty());
+        for (auto const & notification : told) {
+            EXPECT_EQ(notification->IsTemp(), row.temp);
+            EXPECT_EQ(notification->GetOriginalFilename(), m_Builder.GetFolder() / row.name);
+        }
+    }
+}
+
 TEST_F(ExportBookCommandTest, AnAbortLeavesTheTargetAlone)
 {
     auto const book = TwoChapters();

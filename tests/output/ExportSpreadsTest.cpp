@@ -229,6 +229,53 @@ TEST_F(ExportSpreadsTest, LinksAndBookmarksLeadToTheirHalfOfASharedPage)
                              "    b3 -> page 3 (440, 460)\n");
 }
 
+TEST_F(ExportSpreadsTest, EachKindOfLinkLeadsToItsOutputPageOrIsLeftOut)
+{
+    using Type = Story::HyperlinkData::Type;
+    struct Row
+    {
+        char const * why;
+        Type type;
+        int page;
+        int section;
+        int chapter;
+        char const * path;
+        char const * target;
+    };
+    for (Row const & row : {
+             Row{"a page of its own document", Type::Page, 1, 0, 0, "", "page 2 (0, 500)"},
+             Row{"a page that there is not", Type::Page, 2, 0, 0, "", ""},
+             Row{"a section", Type::Section, 0, 0, 0, "", "page 1 (0, 500)"},
+             Row{"a section that there is not", Type::Section, 0, 1, 0, "", ""},
+             Row{"a page of another chapter", Type::ChapterPage, 2, 0, 1, "", "page 3 (0, 500)"},
+             Row{"behind that chapter's end", Type::ChapterPage, 3, 0, 1, "", ""},
+             Row{"before its begin", Type::ChapterPage, -1, 0, 1, "", ""},
+             Row{"a chapter that there is not", Type::ChapterPage, 0, 0, 2, "", ""},
+             Row{"an anchor that there is not", Type::Anchor, 0, 0, 0, "", ""},
+             Row{"the endnotes of a book without any", Type::Anchor, 0, 0, 0, "endnotes", ""},
+             Row{"mail", Type::Mail, 0, 0, 0, "who@example.org", "mailto:who@example.org"},
+             Row{"an address without a protocol", Type::Web, 0, 0, 0, "example.org/a\\", "https://example.org/a"},
+             Row{"another PDF", Type::File, 0, 0, 0, "more/other.pdf", "file more/other.pdf"},
+             Row{"one in capitals is any file", Type::File, 0, 0, 0, "OTHER.PDF", "OTHER.PDF"},
+         }) {
+        SCOPED_TRACE(row.why);
+        Story::HyperlinkData::Fields fields;
+        fields.m_Type = row.type;
+        fields.m_PageIndex = row.page;
+        fields.m_SectionIndex = row.section;
+        fields.m_ChapterIndex = row.chapter;
+        fields.m_Path = row.path;
+        fields.m_AnchorUid = "nowhere";
+        fields.m_IsEndnotes = std::string_view(row.path) == "endnotes";
+        PdfProbe const pdf(Export({{"a", 2, 0, 1, false, Kernel::MakeCounted<Story::HyperlinkData const>(fields)}, {"b", 3}},
+                                  false, true));
+        ASSERT_EQ(pdf.PageCount(), 3);
+        std::string const links = pdf.Links(1);
+        std::size_t const at = links.find("-> ");
+        EXPECT_EQ(at == std::string::npos ? "" : links.substr(at + 3), row.target + std::string(*row.target ? "\n" : ""));
+    }
+}
+
 TEST_F(ExportSpreadsTest, BookmarksBelowOneThatStaysOutStandBesideTheChapters)
 {
     PdfProbe const pdf(Export({{"a", 3, 1}}, false, false));
