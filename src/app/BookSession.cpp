@@ -11,6 +11,7 @@
 #include "commands/NewBookCommand.h"
 #include "commands/SaveBookAsCommand.h"
 #include "commands/SaveBookCommand.h"
+#include "commands/SetKeyChapterCommand.h"
 #include "content/UpdateNumbersCommand.h"
 #include "core/BookCollection.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
@@ -212,6 +213,15 @@ void BookSession::MatchChapters(std::vector<Import::ImportedChapter> const & wan
         if (wantedStart != ordered[at]->GetStartFromPage()) {
             collection.SetPageNumberOptions(m_Book, ordered[at], !isFixed, 1);
         }
+    }
+    // A book never draws over the preview that it has, and of these documents the first alone brings its own: another
+    // key chapter that was made anew becomes key once more.
+    ChapterPtr const key = m_Book->GetKeyChapter(false);
+    if (key && std::any_of(wanted.begin(), wanted.end(), [&](Import::ImportedChapter const & chapter) {
+            return chapter.m_IsFresh && &chapter != &wanted.front() &&
+                   key->GetPath() == String(chapter.m_Document.string());
+        })) {
+        Run(Kernel::MakeCounted<Book::SetKeyChapterCommand>(key));
     }
     WaitForRest();
 }

@@ -35,7 +35,8 @@ public:
     [[nodiscard]] ChapterList GetChapters() const;
 
     /// Brings the chapter list in step: deletes what is not among `chapters`, adds what is missing, moves what stands
-    /// elsewhere, and names the chapters. `hasTitlePage` says that the first is a title page.
+    /// elsewhere, names the chapters, and renews the preview of a key chapter that was made anew. `hasTitlePage` says
+    /// that the first is a title page.
     void MatchChapters(std::vector<Import::ImportedChapter> const & chapters, bool hasTitlePage);
     /// Refreshes what the book knows of its chapters' documents.
     void RefreshChapters();

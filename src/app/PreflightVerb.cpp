@@ -61,7 +61,9 @@ void Findings::Add(Book::BookChapter const & chapter, int index)
     if (!results) {
         ++m_Unchecked;
         m_Lines.push_back(title);
-        m_Lines.push_back("  " + Text("not checked: %1", "Program", Describe(chapter).m_Text));
+        std::string const reason = Explain(chapter);
+        m_Lines.push_back("  " + Text("not checked: %1", "Program", Describe(chapter).m_Text) +
+                          (reason.empty() ? std::string() : ". " + reason));
     } else if (!results->GetResults().empty()) {
         m_Lines.push_back(title);
         for (PreflightResult const & finding : results->GetResults()) {

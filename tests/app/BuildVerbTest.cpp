@@ -104,6 +104,13 @@ TEST_F(BuildVerbTest, ThePreviewOfTheBookFollowsItsFirstPage)
         EXPECT_NE(preview(), before) << "title page: " << titlePage;
         Write("book/2.md", "# Chapter 2\n\nText.\n");
     }
+
+    // A key chapter that the user has chosen.
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    ASSERT_EQ(Run({"key", "@book/.korvane/book.kvbook", "2"}).m_Code, 0);
+    std::string const before = preview();
+    Write("book/2.md", "# Something else\n\nAltogether.\n");
+    EXPECT_NE(preview(), before);
 }
 
 TEST_F(BuildVerbTest, AFixedTimeGivesTheSameBytes)

@@ -317,5 +317,5 @@ TEST_F(PreflightVerbTest, TellsEachFindingAndEndsWithOne)
     EXPECT_EQ(lines.m_Code, 1);
     EXPECT_THAT(lines.m_Out, HasSubstr("3. Chapter 2"));
     EXPECT_THAT(lines.m_Out, HasSubstr("gone.png"));
-    EXPECT_THAT(lines.m_Out, HasSubstr("not checked: missing"));
+    EXPECT_THAT(lines.m_Out, HasSubstr("not checked: missing. "));
 }
