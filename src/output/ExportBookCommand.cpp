@@ -181,6 +181,9 @@ ExportResult ExportBookCommand::ExportPDF(Kernel::Counted<Kernel::SequenceProgre
 {
     auto const options = Kernel::CountedCast<Renderer::FileExportOptionsPDF const>(m_Options.GetCounted());
     Kernel::Counted<BookChapter> const key = GetBookController()->GetKeyChapter(true);
+    if (!key) {
+        m_Error = Kernel::LocalisedString("None of the book's chapters can be opened.", "Output");
+    }
     if (!options || !key) {
         return ExportResultFailed;
     }

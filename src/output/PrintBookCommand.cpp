@@ -21,7 +21,7 @@ ExportResult PrintBookCommand::Begin(std::map<int, PrintedPage> const &)
 {
     Kernel::Counted<BookChapter const> const key = GetBookController()->GetKeyChapter(true);
     if (!key) {
-        SetError("The book has no chapter that could be printed.");
+        SetError(Kernel::LocalisedString("None of the book's chapters can be opened.", "Output"));
         return ExportResultFailed;
     }
     Kernel::File::OpenUnmanagedResult result{};

@@ -203,7 +203,7 @@ ExportResult PrintProofCommand::Finish()
     auto const data = Kernel::MakeCounted<Raster::CompressedRasterData>();
     if (!bitmap || !Raster::PNGBase(data, width, height, Raster::ExportOptions())
                         .Write(*bitmap, profile, profile, Raster::RenderingIntent::Perceptual, false)) {
-        SetError("There is not enough memory for the proof.");
+        SetError(Kernel::LocalisedString("There is not enough memory for the proof.", "Output"));
         return ExportResultFailed;
     }
     Kernel::File::OpenUnmanagedResult result{};

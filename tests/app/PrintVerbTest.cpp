@@ -155,6 +155,22 @@ TEST_F(PrintVerbTest, InterruptingLeavesTheOldFilesOrWholeNewOnes)
     EXPECT_TRUE(IsWholePdf(m_Folder / "out.pdf"));
 }
 
+TEST_F(PrintVerbTest, InterruptingAnExportLeavesTheOldFileOrAWholeNewOne)
+{
+    for (int const patience : {1, 2, 3, 4, 6, 8, 12, 16, 24}) {
+        SCOPED_TRACE(patience);
+        Write("out.pdf", "old");
+        auto const outcome = [&] {
+            ImpatientUser const user(patience);
+            return Run({"export", m_Book, "-o", "@out.pdf"});
+        }();
+        bool const isOld = Read("out.pdf") == "old";
+        EXPECT_TRUE(isOld || IsWholePdf(m_Folder / "out.pdf"));
+        EXPECT_EQ(outcome.m_Code, isOld ? 1 : outcome.m_Code);
+        EXPECT_TRUE(outcome.m_Code == 0 || outcome.m_Err.find("nterrupted") != std::string::npos) << outcome.m_Err;
+    }
+}
+
 TEST_F(PrintVerbTest, WrongWishesGetTheirSentenceAndWriteNothing)
 {
     for (WrongUse const & row : std::vector<WrongUse>{

@@ -219,6 +219,15 @@ TEST_F(WrongInputTest, APdfThatCannotBeWrittenIsToldWithItsCauseAndRemedy)
             EXPECT_EQ(Read("out.pdf"), "old");
         }
     }
+    for (auto const & entry : std::filesystem::directory_iterator(m_Folder / "book/.korvane")) {
+        if (entry.path().extension() == ".kvdoc") {
+            std::filesystem::remove(entry.path());
+        }
+    }
+    auto const outcome = Run({"export", book, "-o", "@out.pdf", "--no-update", "--no-locate"});
+    EXPECT_EQ(outcome.m_Code, 1);
+    EXPECT_NE(outcome.m_Err.find("None of the book's chapters can be opened"), std::string::npos) << outcome.m_Err;
+    EXPECT_EQ(Read("out.pdf"), "old");
 }
 
 TEST_F(WrongInputTest, WhatNoFontHasIsToldWithItsPageWhereverItIsWritten)
