@@ -37,9 +37,8 @@ void BookCollection::AddBookController(Kernel::Counted<BookController> book)
         return;
     }
     books.push_back(book);
-    // In both lists at once: who finds it among the open books may put it in front.
-    Kernel::ScopedLock const recentLock(m_RecentBooksLock);
     m_Books.Set(Snapshot(std::move(books)));
+    Kernel::ScopedLock const recentLock(m_RecentBooksLock);
     m_RecentBooks.Append(std::move(book));
 }
 
@@ -51,9 +50,8 @@ void BookCollection::RemoveBookController(Kernel::Counted<BookController const> 
     std::erase_if(books, [&](const auto & entry) { return entry == book; });
     m_Books.Set(Snapshot(std::move(books)));
     m_RecentBooks.Remove(book);
-    if (m_UIActiveBook.Get() == book) {
-        m_UIActiveBook.Set(nullptr);
-    }
+    // In one step: the front end may put another book in front at this moment.
+    m_UIActiveBook.Replace(book, nullptr);
 }
 
 BookCollection::BookList BookCollection::Books() const
@@ -82,11 +80,7 @@ BookCollection::GetMutableBookController(Kernel::Counted<BookController const> b
 
 void BookCollection::SetUIActiveBookController(Kernel::Counted<BookController const> book)
 {
-    // Against a removal at the same moment: it would clear what is put in front here, or leave the book that goes.
-    Kernel::ScopedLock const lock(m_RecentBooksLock);
-    if (!book || m_RecentBooks.Holds(book)) {
-        m_UIActiveBook.Set(std::move(book));
-    }
+    m_UIActiveBook.Set(std::move(book));
 }
 
 void BookCollection::SetActiveBookController(String path)

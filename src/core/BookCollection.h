@@ -49,8 +49,8 @@ public:
     /// through this.
     [[nodiscard]] Kernel::Counted<BookController>
     GetMutableBookController(Kernel::Counted<BookController const> book) const;
-    /// The user interface has this book in front; null for none. Nothing for a book that is not registered: what was in
-    /// front stays there.
+    /// The user interface has this book in front; null for none. Takes effect at once, also for a book that is not
+    /// registered yet.
     void SetUIActiveBookController(Kernel::Counted<BookController const> book);
     /// Tells everybody that the book at `path` is the current one, by a `CurrentBookChangedNotification`. Nothing if
     /// there is no such book; nothing is stored.
@@ -161,7 +161,6 @@ private:
     Published<Snapshot<BookList>> m_Books;
     /// The same books, the one that last received a command at the back. Under its lock only.
     RecentBooks m_RecentBooks;
-    /// Always one of these, or null. Changed under their lock, read without it.
     Published<Kernel::Counted<BookController const>> m_UIActiveBook;
     Kernel::CriticalSection m_BooksLock;
     Kernel::CriticalSection m_RecentBooksLock;

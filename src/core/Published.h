@@ -45,6 +45,15 @@ public:
         return value;
     }
 
+    /// Puts `value` in the place of `expected`; if something else is there by now, that stays.
+    void Replace(T const & expected, T value)
+    {
+        Kernel::ScopedLock const lock(m_Lock);
+        if (m_Value == expected) {
+            std::swap(m_Value, value);
+        }
+    }
+
 private:
     Kernel::CriticalSectionSpin m_Lock;
     T m_Value{};

@@ -24,9 +24,4 @@ void RecentBooks::MarkUsed(Kernel::Counted<BookController const> const & book)
     }
 }
 
-bool RecentBooks::Holds(Kernel::Counted<BookController const> const & book) const
-{
-    return m_Places.contains(book.Get());
-}
-
 }

@@ -23,8 +23,6 @@ public:
     /// To the back, if the book is here.
     void MarkUsed(Kernel::Counted<BookController const> const & book);
 
-    [[nodiscard]] bool Holds(Kernel::Counted<BookController const> const & book) const;
-
     /// The first book from the back of which `matches` says so; null if there is none.
     template <typename TMatches>
     [[nodiscard]] Kernel::Counted<BookController const> FindLatest(TMatches const & matches) const

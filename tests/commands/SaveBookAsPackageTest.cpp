@@ -281,6 +281,7 @@ TEST_F(SaveBookAsPackageTest, AnOpenChapterGoesAsItIsOnTheScreenAndStaysOpenAndU
     OpenDocumentFailedNotification failure(path, true);
     Counted<DocumentController const> const document = application.OpenDocument(path, failure);
     ASSERT_TRUE(document) << failure.GetReason();
+    BookBuilder::Rest(); // The book gives a document that opens its numbers.
     auto const edit = MakeCounted<ModifySectionCommand>(0U);
     edit->SetStartNumberingAt(31);
     ASSERT_TRUE(application.EnqueueCommandAndWait(edit, document, true));
