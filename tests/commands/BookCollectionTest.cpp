@@ -98,8 +98,9 @@ TEST_F(BookCollectionTest, ABookStaysInFrontWhoeverElseCloses)
     DocumentSaveResult saved;
     document->SaveDocument(saved, m_Builder.GetFolder() / "a.kvdoc");
     document->ShutDownArchive();
-    Counted<BookController> const books[] = {m_Builder.NewBook(), m_Builder.NewBook(), m_Builder.NewBook()};
-    auto const & [stays, rival, goes] = books;
+    auto const stays = m_Builder.NewBook();
+    auto const rival = m_Builder.NewBook();
+    auto const goes = m_Builder.NewBook();
     stays->AddChapter(document->GetPath(), -1);
     rival->AddChapter(document->GetPath(), -1);
 
