@@ -11,6 +11,39 @@
 namespace Book
 {
 
+class ChapterMarshall::MarshalledChapter final : public virtual Kernel::Countable
+{
+public:
+    MarshalledChapter(Kernel::Counted<BookController> book, Kernel::Counted<BookChapter const> chapter,
+                      Kernel::Counted<DocumentController const> document, bool converted)
+        : m_Chapter(std::move(chapter)),
+          m_Document(std::move(document)),
+          m_Converted(converted),
+          m_Book(std::move(book))
+    {
+    }
+    ~MarshalledChapter() override
+    {
+        if (m_Converted) {
+            VantraController::GetInstance().EnqueueCommand(Kernel::MakeCounted<UndoCommand>(), m_Document, false);
+        }
+        m_Document = nullptr;
+        m_Book->ReleaseChapterDocument(m_Chapter, false);
+    }
+
+    Kernel::Counted<BookChapter const> const m_Chapter;
+    Kernel::Counted<DocumentController const> m_Document;
+    /// Brought to the key chapter's colour format here, which has to be taken back.
+    bool const m_Converted;
+
+private:
+    Kernel::Counted<BookController> const m_Book;
+};
+
+ChapterMarshall::ChapterMarshall() = default;
+ChapterMarshall::ChapterMarshall(ChapterMarshall const & other) = default;
+ChapterMarshall & ChapterMarshall::operator=(ChapterMarshall const & other) = default;
+
 ChapterMarshall::ChapterMarshall(Kernel::Counted<BookController> book) : m_Book(std::move(book)) {}
 
 ChapterMarshall::~ChapterMarshall()
@@ -21,22 +54,20 @@ ChapterMarshall::~ChapterMarshall()
 Kernel::Counted<DocumentController const> ChapterMarshall::GetChapter(Kernel::Counted<BookChapter const> chapter,
                                                                       bool prepare)
 {
-    for (MarshalledChapter const & entry : m_Entries) {
-        if (entry.m_Chapter == chapter) {
-            return entry.m_Document;
+    for (Kernel::Counted<MarshalledChapter const> const & entry : m_Entries) {
+        if (entry->m_Chapter == chapter) {
+            return entry->m_Document;
         }
     }
     if (m_Entries.size() == Capacity) {
-        MarshalledChapter oldest = std::move(m_Entries.front());
         m_Entries.pop_front();
-        ReleaseEntry(oldest);
     }
     Kernel::Counted<DocumentController const> const document = m_Book->LoadChapterDocument(chapter, true, false);
     if (!document) {
         return nullptr;
     }
     bool const converted = prepare && Prepare(document);
-    m_Entries.push_back({std::move(chapter), document, converted});
+    m_Entries.push_back(Kernel::MakeCounted<MarshalledChapter>(m_Book, std::move(chapter), document, converted));
     return document;
 }
 
@@ -61,19 +92,9 @@ bool ChapterMarshall::Prepare(Kernel::Counted<DocumentController const> const & 
 
 void ChapterMarshall::Release()
 {
-    for (MarshalledChapter & entry : m_Entries) {
-        ReleaseEntry(entry);
+    while (!m_Entries.empty()) {
+        m_Entries.pop_front();
     }
-    m_Entries.clear();
-}
-
-void ChapterMarshall::ReleaseEntry(MarshalledChapter & entry) const
-{
-    if (entry.m_Converted) {
-        VantraController::GetInstance().EnqueueCommand(Kernel::MakeCounted<UndoCommand>(), entry.m_Document, false);
-    }
-    entry.m_Document = nullptr;
-    m_Book->ReleaseChapterDocument(entry.m_Chapter, false);
 }
 
 }

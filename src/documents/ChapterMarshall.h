@@ -16,36 +16,30 @@ class ChapterMarshall final : public virtual Kernel::Countable
 {
 public:
     /// Opens nothing.
-    ChapterMarshall() = default;
+    ChapterMarshall();
     explicit ChapterMarshall(Kernel::Counted<BookController> book);
     ~ChapterMarshall() override;
-    /// A copy would end uses that it never began.
-    ChapterMarshall(ChapterMarshall const &) = delete;
-    ChapterMarshall & operator=(ChapterMarshall const &) = delete;
+    /// A copy holds the same documents open: they are let go, and conversions taken back, with the last that has them.
+    ChapterMarshall(ChapterMarshall const & other);
+    ChapterMarshall & operator=(ChapterMarshall const & other);
 
     /// The chapter's document, open; null if it cannot be opened. With `prepare` it is made ready for output: time
     /// stamp, composed text, running heads, and the colour format of the key chapter for as long as it is held here.
     Kernel::Counted<DocumentController const> GetChapter(Kernel::Counted<BookChapter const> chapter, bool prepare);
 
-    /// Ends all uses, oldest first.
+    /// Lets all documents go, oldest first.
     void Release();
 
 private:
-    struct MarshalledChapter
-    {
-        Kernel::Counted<BookChapter const> m_Chapter;
-        Kernel::Counted<DocumentController const> m_Document;
-        /// Brought to the key chapter's colour format here, which has to be taken back.
-        bool m_Converted = false;
-    };
+    /// One use of a chapter's document, which ends with it.
+    class MarshalledChapter;
 
     static constexpr std::size_t Capacity = 3;
 
     [[nodiscard]] bool Prepare(Kernel::Counted<DocumentController const> const & document) const;
-    void ReleaseEntry(MarshalledChapter & entry) const;
 
     Kernel::Counted<BookController> m_Book;
-    std::deque<MarshalledChapter> m_Entries;
+    std::deque<Kernel::Counted<MarshalledChapter const>> m_Entries;
 };
 
 }

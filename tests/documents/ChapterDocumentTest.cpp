@@ -358,6 +358,32 @@ TEST_F(ChapterMarshallTest, TwoOutputsOfOneChapterTakeBackTheirOwnConversionsAnd
     one->ReleaseChapterDocument(chapter, false);
 }
 
+TEST_F(ChapterMarshallTest, ACopyHoldsTheSameDocumentsAndTheLastLetsThemGo)
+{
+    ChapterSketch cmyk;
+    cmyk.m_Format = Raster::Format::Cmyka8;
+    auto const book = m_Builder.NewBook({m_Builder.WriteChapter("key.kvdoc", cmyk), m_Builder.WriteChapter("b.kvdoc")});
+    BookBuilder::Rest();
+    Counted<BookChapter const> const chapter = book->GetChapterAtIndex(1);
+    ChapterMarshall copy;
+    {
+        ChapterMarshall first(book);
+        ASSERT_TRUE(first.GetChapter(chapter, true));
+        copy = first;
+        ChapterMarshall const another(first);
+    }
+    BookBuilder::Rest();
+    auto const document = copy.GetChapter(chapter, true);
+    ASSERT_TRUE(document);
+    EXPECT_EQ(document, book->GetDocumentControllerForChapter(chapter, false));
+    EXPECT_TRUE(document->IsAbleToRunCommands());
+    EXPECT_EQ(document->GetFormat(), Raster::Format::Cmyka8) << "nothing is taken back while somebody draws from it";
+    copy = ChapterMarshall();
+    BookBuilder::Rest();
+    EXPECT_TRUE(m_Application.GetDocumentControllers().empty());
+    EXPECT_EQ(document->GetFormat(), Raster::Format::Rgba8);
+}
+
 TEST_F(ChapterMarshallTest, GivesNothingForAChapterThatCannotBeOpened)
 {
     auto const book = MakeBook(1);
