@@ -5,6 +5,7 @@
 #include "framework/document/CloseDocumentNotification.h"
 #include "framework/document/DocumentNotifications.h"
 #include "framework/document/DocumentPromptNotification.h"
+#include "framework/document/DocumentRegistry.h"
 #include "framework/kernel/CommandNotifications.h"
 #include "framework/kernel/Semaphore.h"
 #include "support/DocumentBuilder.h"
@@ -278,6 +279,20 @@ TEST_F(Documents, AUseCountedInTooLateIsForgottenWithoutASave)
     Close(document);
     EXPECT_FALSE(Application().EnqueueCommandAndWait(OnDocument([](DocumentController &) { FAIL(); }),
                                                      Counted<DocumentController const>(document), false));
+}
+
+TEST(DocumentRegistryTest, ALateUseSaysNothingOfADocumentThatComesAfterwards)
+{
+    // The same object stands for two that get the same address one after the other.
+    DocumentRegistry registry;
+    Counted<DocumentController> const document = MakeCounted<DocumentController>();
+    registry.AddUse(*document);
+    ASSERT_TRUE(registry.AddInFront(document));
+    registry.AddUse(*document);
+    bool keepUnsaved = false;
+    EXPECT_FALSE(registry.EndUse(*document, keepUnsaved)) << "the user has it";
+    EXPECT_FALSE(keepUnsaved);
+    EXPECT_TRUE(registry.IsInFrontOnly(*document));
 }
 
 TEST_F(Documents, OnlyTheUsersCommandsAreRefusedUnderTheBookLock)

@@ -32,6 +32,8 @@ DocumentRegistry::RecordPointer DocumentRegistry::Find(std::string const & path)
 void DocumentRegistry::Enter(RecordPointer const & record)
 {
     record->m_Order = ++m_LastOrder;
+    // A use that was counted too late of a document long gone, at the same address, says nothing of this one.
+    m_LateUses.erase(record->m_Controller.Get());
     m_ByController[record->m_Controller.Get()] = record;
     if (!record->m_Path.empty()) {
         m_ByPath[record->m_Path] = record;
