@@ -11,6 +11,8 @@
 
 #include <gtest/gtest.h>
 
+#include <optional>
+
 namespace Book
 {
 namespace
@@ -33,6 +35,8 @@ struct Sketch
     bool vertical = false;
     /// A link on each page.
     Kernel::Counted<Story::HyperlinkData const> link = nullptr;
+    /// Under all of each page, its bleed included.
+    std::optional<Raster::Colour> fill = std::nullopt;
 };
 
 class ExportSpreadsTest : public testing::Test
@@ -52,6 +56,12 @@ protected:
             for (MasterPageSettings * const page : {&master.m_Left, &master.m_Right}) {
                 page->m_TextRect = {40, 40, Width - 40, Height - 40};
                 page->m_RunningTexts.clear();
+                if (sketch.fill) {
+                    ShapeSettings shape;
+                    shape.m_Rect = {-9, -9, Width + 9, Height + 9};
+                    shape.m_Fill = sketch.fill;
+                    page->m_Shapes.push_back(shape);
+                }
             }
         }
         DocumentSection::Values section;
@@ -173,6 +183,39 @@ TEST_F(ExportSpreadsTest, StackedPagesStandOneBelowTheOther)
 {
     PdfProbe const pdf(Export({{"a", 2, 0, 1, true}, {"b", 3, 0, 1, true}}, true, false));
     EXPECT_EQ(Halves(pdf, true), (Lines{"a1", "a2|", "|b1", "b2|b3"}));
+}
+
+TEST_F(ExportSpreadsTest, TheBleedOfAPageEndsWhereAnotherBegins)
+{
+    unsigned const red = 0xFF0000;
+    unsigned const blue = 0x0000FF;
+    unsigned const white = 0xFFFFFF;
+    struct Row
+    {
+        bool pad;
+        bool merge;
+        bool vertical;
+        int page;
+        unsigned first;
+        unsigned second;
+    };
+    for (Row const & row : {Row{false, true, false, 2, red, blue}, Row{true, false, false, 2, red, white},
+                            Row{true, false, false, 3, white, blue}, Row{true, false, true, 2, red, white},
+                            Row{true, false, true, 3, white, blue}}) {
+        SCOPED_TRACE(testing::Message() << row.pad << row.merge << row.vertical << ", page " << row.page);
+        auto const options = Kernel::MakeCounted<Renderer::FileExportOptionsPDF>();
+        options->SetIncludeBleed(true);
+        PdfProbe const pdf(Export({{"a", 2, 0, 1, row.vertical, nullptr, Raster::Colour::Rgb(1, 0, 0)},
+                                   {"b", 1, 0, 1, row.vertical, nullptr, Raster::Colour::Rgb(0, 0, 1)}},
+                                  row.pad, row.merge, options));
+        PdfProbe::Image const image = pdf.Draw(row.page);
+        auto const at = [&](int along) { return row.vertical ? image.At(200, 9 + along) : image.At(9 + along, 250); };
+        int const fold = static_cast<int>(row.vertical ? Height : Width);
+        EXPECT_EQ(at(-5), row.first) << "the bleed outside";
+        EXPECT_EQ(at(fold - 5), row.first);
+        EXPECT_EQ(at(fold + 5), row.second);
+        EXPECT_EQ(at(2 * fold + 5), row.second) << "the bleed outside";
+    }
 }
 
 TEST_F(ExportSpreadsTest, MarksStandOutsideOfABleedThatIsWiderThanTheirDistance)

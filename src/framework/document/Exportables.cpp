@@ -8,11 +8,20 @@ using Transform = Raster::AffineTransform::Params;
 namespace
 {
 
+/// Parts that are no further apart than this touch, in points.
+constexpr double Touching = 0.005;
+
+/// From the coordinates of a part's spread to those of the output page.
+Transform PlaceOf(Kernel::Rect const & rect, Transform const & transform)
+{
+    return Transform::Translation(-rect.left, -rect.top).Then(transform);
+}
+
 /// One page of a spread as a part: its own top left at the origin.
 void AddPartTo(ExportableInterface::ExportParams & params, Kernel::JailCounted<Node> const & node,
                Kernel::Rect const & rect, Kernel::Rect const & bleedRect, Transform const & transform)
 {
-    Transform const placed = Transform::Translation(-rect.left, -rect.top).Then(transform);
+    Transform const placed = PlaceOf(rect, transform);
     params.m_Rect = params.m_Rect.United(placed.MapBounds(rect));
     params.m_BleedRect = params.m_BleedRect.United(placed.MapBounds(bleedRect));
     if (node) {
@@ -92,6 +101,31 @@ void ExportablePages::AddPaddingRect(Kernel::RectT<double> const & rect, Kernel:
     m_Parts.push_back({nullptr, -1, rect, bleedRect, transform});
 }
 
+Kernel::Rect ExportablePages::ShownOf(Part const & part) const
+{
+    Kernel::Rect const place = PlaceOf(part.m_Rect, part.m_Transform).MapBounds(part.m_Rect);
+    Kernel::Rect shown = part.m_BleedRect;
+    for (Part const & other : m_Parts) {
+        if (&other == &part || other.m_Rect.IsEmpty()) {
+            continue;
+        }
+        Kernel::Rect const otherPlace = PlaceOf(other.m_Rect, other.m_Transform).MapBounds(other.m_Rect);
+        if (otherPlace.left > place.right - Touching) {
+            shown.right = part.m_Rect.right;
+        }
+        if (otherPlace.right < place.left + Touching) {
+            shown.left = part.m_Rect.left;
+        }
+        if (otherPlace.top > place.bottom - Touching) {
+            shown.bottom = part.m_Rect.bottom;
+        }
+        if (otherPlace.bottom < place.top + Touching) {
+            shown.top = part.m_Rect.top;
+        }
+    }
+    return shown;
+}
+
 void ExportablePages::GetMultiPageExportParams(DocumentController const & document, std::vector<ExportParams> & params,
                                                bool) const
 {
@@ -102,6 +136,9 @@ void ExportablePages::GetMultiPageExportParams(DocumentController const & docume
         }
         AddPartTo(output, part.m_Spread ? Mutable(part.m_Spread) : nullptr, part.m_Rect, part.m_BleedRect,
                   part.m_Transform);
+        if (part.m_Spread) {
+            output.m_Clips.back() = ShownOf(part);
+        }
         if (part.m_Spread && output.m_Label.Empty()) {
             // A page of the next chapter has its number from its own document.
             output.m_Label = LabelOf(document, *part.m_Spread, part.m_Page);

@@ -49,6 +49,9 @@ protected:
     void AddPart(Part part) { m_Parts.push_back(std::move(part)); }
 
 private:
+    /// What is drawn of a part, in coordinates of its spread: its bleed ends where another part begins.
+    [[nodiscard]] Kernel::Rect ShownOf(Part const & part) const;
+
     std::vector<Part> m_Parts;
 };
 
