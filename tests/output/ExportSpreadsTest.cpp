@@ -183,6 +183,14 @@ TEST_F(ExportSpreadsTest, StackedPagesStandOneBelowTheOther)
 {
     PdfProbe const pdf(Export({{"a", 2, 0, 1, true}, {"b", 3, 0, 1, true}}, true, false));
     EXPECT_EQ(Halves(pdf, true), (Lines{"a1", "a2|", "|b1", "b2|b3"}));
+
+    // Shared pages go by the chapter before the one that they begin in: with none before it, side by side.
+    PdfProbe const shared(Export({{"a", 2, 0, 1, true}, {"b", 4, 0, 1, true}, {"c", 1, 0, 1, true}}, false, true));
+    ASSERT_EQ(shared.PageCount(), 4);
+    EXPECT_EQ(shared.Value("2/MediaBox"), "[ 0 0 800 500 ]");
+    EXPECT_EQ(Halves(shared, false)[1], "a2|b1");
+    EXPECT_EQ(shared.Value("4/MediaBox"), "[ 0 0 400 1000 ]");
+    EXPECT_EQ(Halves(shared, true)[3], "b4|c1");
 }
 
 TEST_F(ExportSpreadsTest, TheBleedOfAPageEndsWhereAnotherBegins)
