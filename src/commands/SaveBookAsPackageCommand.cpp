@@ -60,12 +60,9 @@ Kernel::LocalisedString SaveBookAsPackageCommand::GetDescription() const
     return Kernel::LocalisedString("Save Book As Package", "Book Command");
 }
 
-bool SaveBookAsPackageCommand::IsTaken(String const & path, std::vector<String> const & used) const
+bool SaveBookAsPackageCommand::IsTaken(String const & path, std::set<String> const & used) const
 {
-    auto const isSame = [folded = PackageFolder::Fold(path)](String const & other) {
-        return PackageFolder::Fold(other) == folded;
-    };
-    if (std::any_of(used.begin(), used.end(), isSame) || Kernel::FileSystem::IsFolder(path)) {
+    if (used.contains(PackageFolder::Fold(path)) || Kernel::FileSystem::IsFolder(path)) {
         return true;
     }
     // Never over a chapter of the book itself, whichever way its path is written.
@@ -82,7 +79,7 @@ bool SaveBookAsPackageCommand::IsTaken(String const & path, std::vector<String> 
 }
 
 String SaveBookAsPackageCommand::ChooseTarget(String const & folder, String const & chapterPath,
-                                              std::vector<String> const & used) const
+                                              std::set<String> const & used) const
 {
     String name = Kernel::Path::GetFileNameWithoutExtension(chapterPath);
     if (name.Empty()) {
@@ -105,8 +102,12 @@ void SaveBookAsPackageCommand::Do()
     SetDirection(Forward);
     Kernel::Counted<BookController> const book = GetBookController();
     String const folder = FolderOf(m_Path);
-    std::vector<String> used{m_Path, Kernel::PathTraitsDos::Append(folder, PackageResourcesCommand::PictureFolder),
-                             Kernel::PathTraitsDos::Append(folder, PackageResourcesCommand::FontFolder)};
+    std::set<String> used;
+    for (String const & path :
+         {m_Path, Kernel::PathTraitsDos::Append(folder, PackageResourcesCommand::PictureFolder),
+          Kernel::PathTraitsDos::Append(folder, PackageResourcesCommand::FontFolder)}) {
+        used.insert(PackageFolder::Fold(path));
+    }
     BookController::ChapterPaths packaged;
     for (Kernel::Counted<BookChapter const> const & chapter : m_Chapters) {
         if (!book->GetMutableChapter(chapter) || packaged.contains(chapter)) {
@@ -140,7 +141,7 @@ void SaveBookAsPackageCommand::Do()
             m_Problems.push_back({path, problem});
         }
         if (save->GetResult().IsSuccess()) {
-            used.push_back(target);
+            used.insert(PackageFolder::Fold(target));
             packaged[chapter] = target;
         } else {
             m_Problems.push_back({path, failure});

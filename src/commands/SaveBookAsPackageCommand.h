@@ -3,6 +3,8 @@
 #include "commands/BookCommand.h"
 #include "framework/document/DocumentSaveResult.h"
 
+#include <set>
+
 class PackageManagerInfo;
 
 namespace Book
@@ -58,9 +60,10 @@ protected:
     SaveBookAsPackageCommand();
 
 private:
-    [[nodiscard]] bool IsTaken(String const & path, std::vector<String> const & used) const;
+    /// `used`: paths of the package that are given away, folded.
+    [[nodiscard]] bool IsTaken(String const & path, std::set<String> const & used) const;
     [[nodiscard]] String ChooseTarget(String const & folder, String const & chapterPath,
-                                      std::vector<String> const & used) const;
+                                      std::set<String> const & used) const;
 
     String m_Path;
     std::vector<Kernel::Counted<BookChapter const>> m_Chapters;

@@ -169,3 +169,41 @@ TEST(PasswordBookTest, PasswordsInArgumentsAreOverwritten)
     EXPECT_EQ(arguments[4], "--password=************");
     EXPECT_EQ(arguments[5], "folder");
 }
+
+TEST_F(PlacedPicturesTest, APackageOnAnotherMachineGivesTheSamePdfToTheByte)
+{
+    // Two chapters of one file name, from folders whose names are no plain words, with pictures of one name.
+    std::vector<std::string> book{"new", "@book.kvbook"};
+    int shade = 0;
+    for (std::string const folder : {"sources/\u00E4 \u00F6", "sources/two\nlines"}) {
+        std::string const fill = "<rect width='" + std::to_string(++shade * 20) + "' height='40'/>";
+        WriteBytes(folder + "/inner.svg", SvgWith(fill));
+        WriteBytes(folder + "/drawing.svg", SvgWith("<image href='inner.svg' x='5' y='5' width='50' height='25'/>"));
+        PdfSketch figure;
+        figure.m_Pages = {std::to_string(shade) + " w 0 0 m 50 50 l S"};
+        WriteBytes(folder + "/figure.pdf", figure.Make());
+        Write(folder + "/text.md", "# Text\n\n![](drawing.svg)\n\n![](figure.pdf)\n");
+        auto const imported = Run({"import", "@" + folder + "/text.md", "-o", "@" + folder + "/docs"});
+        ASSERT_EQ(imported.m_Code, 0) << imported.m_Err;
+        book.push_back("@" + folder + "/docs/text.kvdoc");
+    }
+    ASSERT_EQ(Run(book).m_Code, 0);
+    auto const exported = [this](std::string const & from, std::string const & target) {
+        auto const outcome = Run({"export", "@" + from, "-o", "@" + target, "--fixed-time", "1"});
+        EXPECT_EQ(outcome.m_Code, 0) << outcome.m_Err;
+        return Read(target);
+    };
+    std::string const here = exported("book.kvbook", "here.pdf");
+    auto const packaged = Run({"package", "@book.kvbook", "@package"});
+    ASSERT_EQ(packaged.m_Code, 0) << packaged.m_Err;
+    EXPECT_EQ(packaged.m_Err, "");
+    std::filesystem::remove_all(m_Folder / "sources");
+    std::filesystem::create_directories(m_Folder / "there");
+    std::filesystem::rename(m_Folder / "package", m_Folder / "there/package");
+    EXPECT_TRUE(exported("there/package/book.kvbook", "there.pdf") == here);
+    // The drawings hold all that they show: where an inner one is missing, the page is another one.
+    for (std::string const folder : {"drawing", "drawing-2"}) {
+        EXPECT_TRUE(std::filesystem::remove(m_Folder / "there/package/Pictures" / folder / "inner.svg"));
+    }
+    EXPECT_FALSE(exported("there/package/book.kvbook", "less.pdf") == here);
+}

@@ -220,7 +220,8 @@ std::vector<PackageFolder::File> PackageResourcesCommand::GatherDrawing(PackageF
     std::string const within = Kernel::FileSystem::GetCanonicalPath(folder).ToStd() + "/";
     std::vector<PackageFolder::File> files{first};
     std::set<String> names{first.m_Name, Kernel::Path::GetFileName(path)};
-    for (std::size_t i = 0; i < files.size(); ++i) {
+    // One that came from no file has no neighbours.
+    for (std::size_t i = 0; i < files.size() && !path.Empty(); ++i) {
         if (PlacedDrawing::KindOf(*files[i].m_Bytes) != PlacedDrawing::Kind::Svg) {
             continue;
         }
