@@ -2,6 +2,7 @@
 
 #include "framework/kernel/ArchiveFormat.h"
 #include "framework/kernel/FileIOException.h"
+#include "framework/kernel/LocalisedString.h"
 
 #include <algorithm>
 #include <cstring>
@@ -143,7 +144,7 @@ Archive::Reader::Item const * Archive::Reader::Find(String const & name) const
     return found == m_Items.end() ? nullptr : &found->second;
 }
 
-void Archive::Reader::Fail(String const & name, char const * fault) const
+void Archive::Reader::Fail(String const & name, String const & fault) const
 {
     throw ArchiveCorruptionException(m_File->GetPath(), name, fault);
 }
@@ -155,20 +156,20 @@ void Archive::Reader::ReadRaw(String const & name, Item const & item, std::uint8
     zip_file_t * const file = zip_fopen_index(m_Zip, item.m_Index, ZIP_FL_COMPRESSED);
     if (!file) {
         m_Source.ThrowFailure();
-        Fail(name, "the item cannot be found where the directory says");
+        Fail(name, LocalisedString("the item cannot be found where the directory says", "Damage"));
     }
     zip_int64_t const got = zip_fread(file, target, item.m_CompressedSize);
     zip_fclose(file);
     m_Source.ThrowFailure();
     if (got < 0 || static_cast<std::uint64_t>(got) != item.m_CompressedSize) {
-        Fail(name, "the item is cut off");
+        Fail(name, LocalisedString("the item is cut off", "Damage"));
     }
 }
 
 Counted<RawData const> Archive::Reader::Read(String const & name, Item const & item) const
 {
     if (MaximumItemSize < item.m_Size) {
-        Fail(name, "the item is larger than any that we write");
+        Fail(name, LocalisedString("the item is larger than any that we write", "Damage"));
     }
     auto data = MakeCounted<RawData>(item.m_Size);
     if (!item.m_Deflated) {
@@ -182,11 +183,11 @@ Counted<RawData const> Archive::Reader::Read(String const & name, Item const & i
         libdeflate_result const result = libdeflate_deflate_decompress(
             decompressor.get(), compressed.data(), compressed.size(), data->GetMutableData(), data->GetSize(), nullptr);
         if (result != LIBDEFLATE_SUCCESS) {
-            Fail(name, "the item's compressed bytes do not hold together");
+            Fail(name, LocalisedString("the item's compressed bytes do not hold together", "Damage"));
         }
     }
     if (libdeflate_crc32(0, data->GetData(), data->GetSize()) != item.m_Checksum) {
-        Fail(name, "the item's checksum does not match its content");
+        Fail(name, LocalisedString("the item's checksum does not match its content", "Damage"));
     }
     return data;
 }

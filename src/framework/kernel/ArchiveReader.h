@@ -40,7 +40,7 @@ private:
     explicit Reader(std::shared_ptr<File> file) : m_File(std::move(file)), m_Source(m_File) {}
     bool ReadDirectory();
     void ReadRaw(String const & name, Item const & item, std::uint8_t * target) const;
-    [[noreturn]] void Fail(String const & name, char const * fault) const;
+    [[noreturn]] void Fail(String const & name, String const & fault) const;
 
     std::shared_ptr<File> const m_File;
     mutable ZipFileSource m_Source;

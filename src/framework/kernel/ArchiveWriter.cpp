@@ -146,7 +146,9 @@ void Archive::Writer::Verify(IDTag type) const
     OpenResult result{};
     auto const reader = Reader::Open(std::shared_ptr<File>(&m_File->GetFile(), [](File *) {}), type, result);
     if (!reader) {
-        throw ArchiveCorruptionException(m_File->GetTarget(), "directory", "what was written cannot be read back");
+        throw ArchiveCorruptionException(
+            m_File->GetTarget(), LocalisedString("directory", "Damage"),
+            LocalisedString("what was written cannot be read back", "Damage"));
     }
     for (Entry const & entry : m_Entries) {
         if (entry.m_Name == ArchiveFormat::TypeEntry) {
@@ -156,7 +158,7 @@ void Archive::Writer::Verify(IDTag type) const
         if (!item || item->m_Checksum != entry.m_Checksum ||
             reader->Read(entry.m_Name, *item)->GetSize() != entry.m_Size) {
             throw ArchiveCorruptionException(m_File->GetTarget(), entry.m_Name,
-                                             "what was read back is not what was written");
+                                             LocalisedString("what was read back is not what was written", "Damage"));
         }
     }
 }

@@ -37,6 +37,16 @@ int FlagsOf(std::string_view mode)
     }
 }
 
+/// Opening a pipe that has nobody at its other end would wait for somebody for ever: this fails instead, or finds it empty.
+int OpenAtOnce(char const * path, int flags)
+{
+    int const descriptor = ::open(path, flags | O_NONBLOCK | O_CLOEXEC, 0666);
+    if (descriptor >= 0) {
+        ::fcntl(descriptor, F_SETFL, ::fcntl(descriptor, F_GETFL) & ~O_NONBLOCK);
+    }
+    return descriptor;
+}
+
 bool IsLockedByOthers(int descriptor)
 {
     struct flock probe = {};
@@ -74,10 +84,10 @@ File::OpenUnmanagedResult File::OpenEx(char const * path, char const * mode, Sha
     }
     OpenUnmanagedResult result = OpenUnmanagedResult::Success;
     // Truncation waits until the locks have been looked at.
-    m_Descriptor = ::open(path, (flags & ~O_TRUNC) | O_CLOEXEC, 0666);
+    m_Descriptor = OpenAtOnce(path, flags & ~O_TRUNC);
     if (m_Descriptor < 0 && (flags & O_ACCMODE) == O_RDWR && (flags & O_CREAT) == 0 &&
         (errno == EACCES || errno == EROFS || errno == EPERM || errno == ETXTBSY)) {
-        m_Descriptor = ::open(path, O_RDONLY | O_CLOEXEC);
+        m_Descriptor = OpenAtOnce(path, O_RDONLY);
         result = OpenUnmanagedResult::SuccessReadOnly;
     }
     if (m_Descriptor < 0) {

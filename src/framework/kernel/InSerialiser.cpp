@@ -15,13 +15,15 @@ using namespace TaggedStream;
 
 String InSerialiser::Context::PlaceOf(std::uint8_t const * at) const
 {
-    return Format("byte %1", at - m_Buffer->GetData());
+    return Format(LocalisedString("byte %1", "Damage"), at - m_Buffer->GetData());
 }
 
 void InSerialiser::Context::CheckDepth(int levels, std::uint8_t const * at) const
 {
     if (MaximumDepth <= levels) {
-        throw ArchiveCorruptionException(m_SourceName, PlaceOf(at), "values refer to each other in too long a chain");
+        throw ArchiveCorruptionException(
+            m_SourceName, PlaceOf(at),
+            LocalisedString("values refer to each other in too long a chain", "Damage"));
     }
 }
 
@@ -231,7 +233,7 @@ bool InSerialiser::LoadSharedObjectI(IDTag tag, Consolidated<SharedSerialisable>
     if (!shared.m_Object && !shared.m_Payload.empty()) {
         if (shared.m_Loading) {
             throw ArchiveCorruptionException(m_Context->m_SourceName, m_Context->PlaceOf(payload.data()),
-                                             "a shared value that holds itself");
+                                             LocalisedString("a shared value that holds itself", "Damage"));
         }
         shared.m_Loading = true;
         int const outerHeight = std::exchange(m_Context->m_Height, 0);

@@ -1,6 +1,7 @@
 #include "framework/kernel/InSerialiserFile.h"
 
 #include "framework/kernel/ArchiveExceptions.h"
+#include "framework/kernel/Format.h"
 #include "framework/kernel/InSerialiserContext.h"
 #include "framework/kernel/TaggedStreamFormat.h"
 #include "framework/kernel/TaggedStreamParser.h"
@@ -35,7 +36,8 @@ Counted<InSerialiserFile> InSerialiserFile::ParseWithChecks(InStream & stream, F
     }
     String const source = stream.GetSourceName();
     if (whole.size() < StreamHeaderSize) {
-        throw ArchiveCorruptionException(source, "byte 0", "the stream's header is cut off");
+        throw ArchiveCorruptionException(source, Format(LocalisedString("byte %1", "Damage"), 0),
+                                         LocalisedString("the stream's header is cut off", "Damage"));
     }
     IDTag const rootTag(GetTag(whole.data() + 8));
     auto const format = GetNumber<std::uint16_t>(whole.data() + 4);
@@ -44,7 +46,8 @@ Counted<InSerialiserFile> InSerialiserFile::ParseWithChecks(InStream & stream, F
     }
     std::span<std::uint8_t const> const fields = whole.subspan(StreamHeaderSize);
     if (GetNumber<std::uint64_t>(whole.data() + 16) != fields.size()) {
-        throw ArchiveCorruptionException(source, "byte 16", "the stream is not as long as it says");
+        throw ArchiveCorruptionException(source, Format(LocalisedString("byte %1", "Damage"), 16),
+                                         LocalisedString("the stream is not as long as it says", "Damage"));
     }
     TaggedStreamParser parser(whole, source, delayLoads == DelayLoadsBehaviour::CheckAll, progress, unknownClass);
     if (!parser.ParseFields(fields)) {

@@ -19,9 +19,9 @@ TaggedStreamParser::TaggedStreamParser(Bytes whole, String sourceName, bool chec
 {
 }
 
-void TaggedStreamParser::Fail(std::uint8_t const * at, char const * fault) const
+void TaggedStreamParser::Fail(std::uint8_t const * at, String const & fault) const
 {
-    throw ArchiveCorruptionException(m_SourceName, Format("byte %1", at - m_Whole.data()), fault);
+    throw ArchiveCorruptionException(m_SourceName, Format(LocalisedString("byte %1", "Damage"), at - m_Whole.data()), fault);
 }
 
 bool TaggedStreamParser::ParseFields(Bytes fields)
@@ -42,14 +42,14 @@ bool TaggedStreamParser::ParseFields(Bytes fields)
 TaggedStreamParser::Bytes TaggedStreamParser::TakeField(Bytes & fields, PropType & type) const
 {
     if (fields.size() < FieldHeaderSize) {
-        Fail(fields.data(), "a field's header is cut off");
+        Fail(fields.data(), LocalisedString("a field's header is cut off", "Damage"));
     }
     std::uint8_t const * const header = fields.data();
     auto const length = GetNumber<std::uint64_t>(header + 8);
     std::size_t const rest = fields.size() - FieldHeaderSize;
     // Compared before it is padded: padding a length near the top would wrap round.
     if (rest < length || rest < Padded(length)) {
-        Fail(header, "a field is longer than what holds it");
+        Fail(header, LocalisedString("a field is longer than what holds it", "Damage"));
     }
     type = static_cast<PropType>(header[4]);
     Bytes const payload = fields.subspan(FieldHeaderSize, length);
@@ -69,13 +69,13 @@ void TaggedStreamParser::ParseFieldsWithin(Bytes fields, int depth)
 void TaggedStreamParser::ParsePayload(PropType type, Bytes payload, int depth)
 {
     if (std::size_t const fixed = FixedSize(type); fixed != 0 && fixed != payload.size()) {
-        Fail(payload.data(), "a value has the wrong size for its type");
+        Fail(payload.data(), LocalisedString("a value has the wrong size for its type", "Damage"));
     }
     switch (type) {
     case PropType::Array: {
         std::uint64_t const size = payload.size() < 8 ? 0 : GetNumber<std::uint64_t>(payload.data());
         if (size == 0 || (payload.size() - 8) % size != 0) {
-            Fail(payload.data(), "an array does not hold whole elements");
+            Fail(payload.data(), LocalisedString("an array does not hold whole elements", "Damage"));
         }
         break;
     }
@@ -100,7 +100,7 @@ void TaggedStreamParser::ParsePayload(PropType type, Bytes payload, int depth)
 void TaggedStreamParser::ParseStringArray(Bytes payload) const
 {
     if (payload.size() < sizeof(std::uint64_t)) {
-        Fail(payload.data(), "a list of texts has no count");
+        Fail(payload.data(), LocalisedString("a list of texts has no count", "Damage"));
     }
     auto const count = GetNumber<std::uint64_t>(payload.data());
     std::uint64_t found = 0;
@@ -109,13 +109,13 @@ void TaggedStreamParser::ParseStringArray(Bytes payload) const
         std::size_t const rest = payload.size() - at;
         if (rest < sizeof(std::uint32_t) ||
             rest - sizeof(std::uint32_t) < GetNumber<std::uint32_t>(payload.data() + at)) {
-            Fail(payload.data() + at, "a text is longer than the list that holds it");
+            Fail(payload.data() + at, LocalisedString("a text is longer than the list that holds it", "Damage"));
         }
         at += sizeof(std::uint32_t) + GetNumber<std::uint32_t>(payload.data() + at);
         ++found;
     }
     if (found != count) {
-        Fail(payload.data(), "a list of texts does not hold as many as it says");
+        Fail(payload.data(), LocalisedString("a list of texts does not hold as many as it says", "Damage"));
     }
 }
 
@@ -125,10 +125,10 @@ void TaggedStreamParser::ParseObject(Bytes payload, int depth)
         return;
     }
     if (payload.size() < ObjectHeaderSize) {
-        Fail(payload.data(), "an object's header is cut off");
+        Fail(payload.data(), LocalisedString("an object's header is cut off", "Damage"));
     }
     if (MaximumDepth <= depth) {
-        Fail(payload.data(), "objects lie too deep in each other");
+        Fail(payload.data(), LocalisedString("objects lie too deep in each other", "Damage"));
     }
     if (m_CheckVersions || m_UnknownClass) {
         ClassUID const uid(GetTag(payload.data()));
@@ -148,7 +148,7 @@ void TaggedStreamParser::ParseObject(Bytes payload, int depth)
 void TaggedStreamParser::ParseObjectArray(Bytes payload, int depth)
 {
     if (payload.size() < sizeof(std::uint64_t)) {
-        Fail(payload.data(), "a list of objects has no count");
+        Fail(payload.data(), LocalisedString("a list of objects has no count", "Damage"));
     }
     auto const count = GetNumber<std::uint64_t>(payload.data());
     Bytes elements = payload.subspan(sizeof(std::uint64_t));
@@ -158,13 +158,13 @@ void TaggedStreamParser::ParseObjectArray(Bytes payload, int depth)
         PropType type{};
         Bytes const element = TakeField(elements, type);
         if (type != PropType::Object) {
-            Fail(at, "a list of objects holds something else");
+            Fail(at, LocalisedString("a list of objects holds something else", "Damage"));
         }
         ParseObject(element, depth);
         ++found;
     }
     if (found != count) {
-        Fail(payload.data(), "a list of objects does not hold as many as it says");
+        Fail(payload.data(), LocalisedString("a list of objects does not hold as many as it says", "Damage"));
     }
 }
 
@@ -174,18 +174,18 @@ void TaggedStreamParser::ParseSharedObject(Bytes payload, int depth)
         return;
     }
     if (payload.size() < sizeof(std::uint64_t)) {
-        Fail(payload.data(), "a shared value has no number");
+        Fail(payload.data(), LocalisedString("a shared value has no number", "Damage"));
     }
     auto const number = GetNumber<std::uint64_t>(payload.data());
     Bytes const object = payload.subspan(sizeof(std::uint64_t));
     if (object.empty()) {
         if (m_Shared.size() <= number) {
-            Fail(payload.data(), "a shared value is referred to before it is there");
+            Fail(payload.data(), LocalisedString("a shared value is referred to before it is there", "Damage"));
         }
         return;
     }
     if (number != m_Shared.size()) {
-        Fail(payload.data(), "shared values are not numbered in their order");
+        Fail(payload.data(), LocalisedString("shared values are not numbered in their order", "Damage"));
     }
     m_Shared.push_back(object);
     ParseObject(object, depth);

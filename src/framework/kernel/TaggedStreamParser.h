@@ -30,7 +30,7 @@ public:
 private:
     using Bytes = std::span<std::uint8_t const>;
 
-    [[noreturn]] void Fail(std::uint8_t const * at, char const * fault) const;
+    [[noreturn]] void Fail(std::uint8_t const * at, String const & fault) const;
     void ParseFieldsWithin(Bytes fields, int depth);
     void ParsePayload(PropType type, Bytes payload, int depth);
     void ParseObject(Bytes payload, int depth);
