@@ -319,6 +319,38 @@ TEST(FlowComposerTest, ATableNeverLeavesItsMeasure)
     }
 }
 
+TEST(FlowComposerTest, WordsThatAreTooLongForATableCostItsColumnOfFiguresNothing)
+{
+    TableGlyph::Fields fields;
+    fields.m_Rows = 1;
+    for (char const * const text : {"incomprehensibilities-incomprehensibilities", "1000",
+                                    "counterrevolutionary-counterrevolutionary-counterrevolutionary"}) {
+        fields.m_Cells.push_back(OneParagraph(text, "Body"));
+        ++fields.m_Columns;
+    }
+    StoryBuilder builder;
+    AddObject(builder, MakeCounted<TableGlyph>(fields), "Body");
+    auto const layout = Compose(*builder.Finish(), Frames(100, 400), {});
+    std::string const lines = Describe(*layout);
+    EXPECT_NE((" " + lines + " ").find(" 1000 "), std::string::npos) << lines;
+}
+
+TEST(FlowComposerTest, ATableInHebrewBeginsAtTheRight)
+{
+    TableGlyph::Fields fields;
+    fields.m_Rows = 1;
+    fields.m_Columns = 2;
+    fields.m_Cells = {OneParagraph("\u05D0", "Body"), OneParagraph("12", "Body")};
+    StoryBuilder builder;
+    AddObject(builder, MakeCounted<TableGlyph>(fields), "Body");
+    auto const layout = Compose(*builder.Finish(), Frames(200, 400), {});
+    auto const lines = layout->GetLines(layout->GetFrames()[0]);
+    ASSERT_EQ(lines.size(), 2u);
+    EXPECT_GT(lines[0].m_Left, lines[1].m_Left);
+    EXPECT_GT(lines[0].m_Right, 180) << "the table ends at the right edge";
+    EXPECT_GT(lines[1].m_Left, 100);
+}
+
 TEST(FlowComposerTest, ListsHangTheirMarkers)
 {
     auto const item = [](int kind, int level, bool restart, int start) {

@@ -156,6 +156,19 @@ TEST(FontFaceTest, OutlinesAreClosedAndReachTheirHeight)
     }
 }
 
+TEST(FontFaceTest, ALetterThatNobodyHasDrawnCountsAsMissing)
+{
+    // This face names letters of Greek and Cyrillic without an outline; what is blank by nature is there all the same.
+    Kernel::Counted<FontFace const> const face = Library().Find("EB Garamond", 400, true, 8).m_Face;
+    ASSERT_EQ(face->GetPostScriptName(), "EBGaramond08-Italic");
+    for (char32_t const blank : U"\u0435\u043E\u03B1") {
+        EXPECT_EQ(0u, blank ? face->GetGlyph(blank) : 0u) << static_cast<unsigned>(blank);
+    }
+    for (char32_t const drawn : {U'a', U' ', U'\u00A0', U'\u200B'}) {
+        EXPECT_NE(0u, face->GetGlyph(drawn)) << static_cast<unsigned>(drawn);
+    }
+}
+
 TEST(ContentHashTest, MatchesThePublishedFunction)
 {
     // Reference values of MurmurHash3_x64_128 with seed 0.

@@ -2,6 +2,9 @@
 
 #include "framework/kernel/Utf.h"
 
+#include <algorithm>
+#include <vector>
+
 Raster::Colour ToRasterColour(Story::Colour const & colour)
 {
     auto const & c = colour.m_Components;
@@ -65,6 +68,34 @@ double RunningTextSetter::Set(std::u16string const & text, Style const & style)
     return m_Arena.m_Lines.empty() ? 0 : m_Arena.m_Lines.front().m_SetWidth;
 }
 
+double RunningTextSetter::SetWithin(double room, std::u16string & text, Style const & style)
+{
+    // No line holds more than this, in whatever letters: what is behind need not be measured anew on each page.
+    constexpr double mostPerEm = 16;
+    auto const most = static_cast<std::size_t>(mostPerEm * std::max(room / style.m_Style->m_Size, 4.0));
+    bool const isTooLong = most < text.size();
+    text.resize(std::min(most, text.size()));
+    if (double const width = isTooLong ? 0 : Set(text, style); !isTooLong && width <= room) {
+        return width;
+    }
+    std::vector<std::size_t> ends;
+    for (std::size_t at = text.find(u' ', 1); at < text.size(); at = text.find(u' ', at + 1)) {
+        ends.push_back(at);
+    }
+    auto const fits = [&](std::size_t end) { return Set(text.substr(0, end) + u'\u2026', style) <= room; };
+    auto const tooLong = std::partition_point(ends.begin(), ends.end(), fits);
+    if (ends.begin() != tooLong) {
+        text.resize(*std::prev(tooLong));
+    } else {
+        // A word that is too long by itself is halved until it fits.
+        text.resize(ends.empty() ? text.size() / 2 : ends.front());
+        while (!text.empty() && !fits(text.size())) {
+            text.resize(text.size() / 2);
+        }
+    }
+    return Set(text + u'\u2026', style);
+}
+
 void RunningTextSetter::Draw(RunningTextNode const & node, Fields const & fields, Kernel::PointT<double> offset,
                              Renderer::RenderTree::DisplayList & list)
 {
@@ -88,13 +119,7 @@ void RunningTextSetter::Draw(RunningTextNode const & node, Fields const & fields
     Kernel::Rect const rect = node.GetSpreadBaseBox(false);
     std::u16string text = Kernel::Utf8ToUtf16(joined);
     std::replace(text.begin(), text.end(), u'\n', u' ');
-    double width = Set(text, style);
-    while (rect.Width() < width && !text.empty()) {
-        // Shorter by a word at a time, or by half where there is only one.
-        std::size_t const space = text.find_last_of(u' ', text.size() - 2);
-        text.resize(std::u16string::npos == space || 0 == space ? text.size() / 2 : space);
-        width = Set(text + u'\u2026', style);
-    }
+    double const width = SetWithin(rect.Width(), text, style);
     if (m_Arena.m_Lines.empty()) {
         return;
     }

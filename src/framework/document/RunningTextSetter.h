@@ -38,6 +38,8 @@ private:
     [[nodiscard]] Style const & GetStyle(String const & name);
     /// The line and its width.
     double Set(std::u16string const & text, Style const & style);
+    /// The line and its width; where it is wider than `room`, `text` loses words at its end, and the line has an ellipsis.
+    double SetWithin(double room, std::u16string & text, Style const & style);
 
     Kernel::Counted<Story::StyleSheet const> m_Styles;
     std::map<String, Style> m_TextStyles;

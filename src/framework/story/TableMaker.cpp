@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <numeric>
+#include <unicode/ubidi.h>
 
 namespace Story::Flow
 {
@@ -21,17 +22,16 @@ float Sum(std::vector<float> const & values)
 }
 
 /// Brings the wanted widths down to `available` in all: narrow columns keep what they want, and the wide ones share
-/// the rest equally, none below its least. If not even the least widths fit, all shrink alike.
-void ShareOut(std::vector<float> & wanted, std::vector<float> const & least, float available)
+/// the rest equally, none below its least. If not even the least widths fit, the same goes for these: a column of figures
+/// keeps what it needs, and the widest words are cut.
+void ShareOut(std::vector<float> & wanted, std::vector<float> least, float available)
 {
     if (Sum(wanted) <= available) {
         return;
     }
-    if (float const leastSum = Sum(least); leastSum >= available) {
-        for (std::size_t i = 0; i < wanted.size(); ++i) {
-            wanted[i] = least[i] * available / leastSum;
-        }
-        return;
+    if (Sum(least) >= available) {
+        wanted = std::move(least);
+        least.assign(wanted.size(), 0.0F);
     }
     std::vector<bool> isSettled(wanted.size(), false);
     std::size_t open = wanted.size();
@@ -58,6 +58,41 @@ void ShareOut(std::vector<float> & wanted, std::vector<float> const & least, flo
             wanted[i] = rest / static_cast<float>(open);
         }
     }
+}
+
+}
+
+namespace
+{
+
+/// A table is read from the side from which its first words are.
+bool IsReadFromTheRight(TableGlyph const & table)
+{
+    for (std::uint32_t column = 0; column < table.GetColumnCount(); ++column) {
+        if (auto const & story = table.GetCell(0, column)) {
+            std::u16string_view const text = story->GetText();
+            UBiDiDirection const direction = ubidi_getBaseDirection(text.data(), static_cast<int32_t>(text.size()));
+            if (UBIDI_NEUTRAL != direction) {
+                return UBIDI_RTL == direction;
+            }
+        }
+    }
+    return false;
+}
+
+/// Moves a table that begins at the left of the room that it has to its place there.
+void PlaceColumns(Table & table, float available, bool isCentred, bool isFromTheRight)
+{
+    float const spare = std::max(available - (table.m_Right - table.m_Left), 0.0F);
+    float const shift = isCentred ? spare / 2 : isFromTheRight ? spare : 0;
+    for (Table::Column & column : table.m_Columns) {
+        if (isFromTheRight) {
+            column.m_Left = table.m_Left + table.m_Right - column.m_Left - column.m_Width;
+        }
+        column.m_Left += shift;
+    }
+    table.m_Left += shift;
+    table.m_Right += shift;
 }
 
 }
@@ -138,7 +173,7 @@ void PieceMaker::FitColumns(Table & table, TableGlyph const & source, Context co
             widths = MeasureColumns(table, source, cell, UnlimitedWidth);
             least = MeasureColumns(table, source, cell, 0);
         }
-        ShareOut(widths, least, available);
+        ShareOut(widths, std::move(least), available);
     }
     float left = table.m_Left;
     for (float const width : widths) {
@@ -172,14 +207,7 @@ void PieceMaker::MakeTable(Segment segment, TableGlyph const & source, Paragraph
     cell.m_FallbackStyle = StyleSheet::TableTextStyle;
     cell.m_Role = LayoutItem::Role::TableCell;
     FitColumns(table, source, cell, available);
-    if (style.m_Format.m_Alignment == ParagraphAtt::Centre && table.m_Right - table.m_Left < available) {
-        float const shift = (available - (table.m_Right - table.m_Left)) / 2;
-        for (Table::Column & column : table.m_Columns) {
-            column.m_Left += shift;
-        }
-        table.m_Left += shift;
-        table.m_Right += shift;
-    }
+    PlaceColumns(table, available, style.m_Format.m_Alignment == ParagraphAtt::Centre, IsReadFromTheRight(source));
 
     std::uint32_t const begin = segment.m_MainBegin;
     std::uint32_t const end = begin + (segment.m_IsMain ? 1 : 0);

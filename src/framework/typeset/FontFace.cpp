@@ -2,6 +2,7 @@
 
 #include <hb-ot.h>
 #include <hb.h>
+#include <unicode/uchar.h>
 
 #include <array>
 #include <vector>
@@ -226,7 +227,16 @@ bool FontFace::MaySubset() const noexcept { return (m_EmbeddingFlags & 0x0100) =
 std::uint32_t FontFace::GetGlyph(char32_t character) const noexcept
 {
     hb_codepoint_t glyph = 0;
-    return hb_font_get_nominal_glyph(m_HbFont, character, &glyph) ? glyph : 0;
+    if (!hb_font_get_nominal_glyph(m_HbFont, character, &glyph)) {
+        return 0;
+    }
+    // Unfinished fonts name letters that nobody has drawn yet: another font has to set these, or they are gaps in the text.
+    hb_glyph_extents_t box{};
+    bool const mayBeBlank = !u_isalpha(static_cast<UChar32>(character)) ||
+                            u_hasBinaryProperty(static_cast<UChar32>(character), UCHAR_DEFAULT_IGNORABLE_CODE_POINT);
+    bool const isBlank = !mayBeBlank && hb_font_get_glyph_extents(m_HbFont, glyph, &box) && 0 == box.width &&
+                         0 == box.height;
+    return isBlank ? 0 : glyph;
 }
 
 int FontFace::GlyphAdvance(std::uint32_t glyph) const noexcept { return hb_font_get_glyph_h_advance(m_HbFont, glyph); }

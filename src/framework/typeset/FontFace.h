@@ -101,7 +101,7 @@ public:
     /// False for "no subsetting": such a font may only be embedded whole.
     [[nodiscard]] bool MaySubset() const noexcept;
 
-    /// Glyph of a code point; 0 when the face has none.
+    /// Glyph of a code point; 0 when the face has none, or has one for a letter that is empty.
     [[nodiscard]] std::uint32_t GetGlyph(char32_t character) const noexcept;
     [[nodiscard]] bool HasGlyph(char32_t character) const noexcept { return GetGlyph(character) != 0; }
     /// Horizontal advance in font units.

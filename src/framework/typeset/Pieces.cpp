@@ -74,6 +74,8 @@ void PieceMaker::MakeWords(std::uint32_t index, std::vector<Piece> & pieces)
     ShapingContext & context = *item.m_Context;
     std::size_t const firstPiece = pieces.size();
     m_Keys.clear();
+    // End of the word at hand: found once, however many stretches a long one comes in.
+    std::uint32_t wordEnd = item.m_Start;
     for (std::uint32_t at = item.m_Start; at < item.m_End;) {
         Piece & piece = pieces.emplace_back();
         piece.m_Start = at;
@@ -87,9 +89,11 @@ void PieceMaker::MakeWords(std::uint32_t index, std::vector<Piece> & pieces)
             piece.m_Kind = Piece::Kind::Space;
             m_Keys.push_back(0);
         } else {
-            while (at < item.m_End && !IsWordSpace(m_Text[at])) {
-                ++at;
+            wordEnd = std::max(wordEnd, at);
+            while (wordEnd < item.m_End && !IsWordSpace(m_Text[wordEnd])) {
+                ++wordEnd;
             }
+            at = wordEnd;
             if (at - piece.m_Start <= longestWord) {
                 bool const spaceBefore = piece.m_Start > item.m_Start && IsWordSpace(m_Text[piece.m_Start - 1]);
                 m_Keys.push_back(context.GetKey(m_Text.substr(piece.m_Start, at - piece.m_Start), spaceBefore,
