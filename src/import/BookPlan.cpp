@@ -28,7 +28,9 @@ void AddFilesOfFolder(BookPlan & plan, MessageList & messages)
     std::error_code error;
     for (fs::directory_iterator it(plan.m_Folder, error), end; !error && it != end; it.increment(error)) {
         std::string const name = it->path().filename().string();
-        if (!name.starts_with('.') && IsMarkdownName(it->path()) && !it->is_directory()) {
+        // A link that leads nowhere is told as a chapter that cannot be read.
+        std::error_code linkError;
+        if (!name.starts_with('.') && IsMarkdownName(it->path()) && !fs::is_directory(it->path(), linkError)) {
             names.push_back(name);
         }
     }
@@ -94,10 +96,13 @@ std::optional<BookPlan> ReadBookPlan(fs::path const & folder, MessageList & mess
     BookPlan plan;
     std::error_code error;
     plan.m_Folder = fs::absolute(folder, error).lexically_normal();
-    if (!fs::is_directory(plan.m_Folder, error)) {
+    fs::file_status const status = fs::status(plan.m_Folder, error);
+    if (!fs::is_directory(status)) {
         messages.Error("no-folder", {folder.string()},
-                       fs::exists(plan.m_Folder, error)
+                       fs::exists(status)
                            ? Text("This is not a folder; give the folder that holds the chapters.", "Source")
+                       : fs::file_type::none == status.type()
+                           ? Text("The folder cannot be read: %1.", "Source", error.message())
                            : Text("There is no such folder.", "Source"));
         return std::nullopt;
     }

@@ -3,6 +3,7 @@
 #include "import/AttributeReader.h"
 #include "import/FrontMatterReader.h"
 #include "import/SourceText.h"
+#include "import/TableSize.h"
 #include "import/Text.h"
 
 #include <algorithm>
@@ -64,9 +65,19 @@ void ChapterReader::Warn(std::string_view kind, int line, std::string text)
     m_Messages.Warn(kind, PlaceAt(line), std::move(text));
 }
 
+MarkdownTree ChapterReader::ParseTamed()
+{
+    std::vector<int> const tables = FindEndlessTables(m_Source);
+    for (int const line : tables) {
+        Warn("table-size", line,
+             Text("The table has more than %1 cells and is set as plain text; divide it.", "Source", g_MostTableCells));
+    }
+    return tables.empty() ? ParseMarkdown(m_Source) : ParseMarkdown(WithoutTables(m_Source, tables));
+}
+
 ChapterText ChapterReader::Read()
 {
-    MarkdownTree const tree = ParseMarkdown(m_Source);
+    MarkdownTree const tree = ParseTamed();
     cmark_iter * iterator = cmark_iter_new(tree.get());
     for (cmark_event_type event; CMARK_EVENT_DONE != (event = cmark_iter_next(iterator));) {
         Visit(cmark_iter_get_node(iterator), CMARK_EVENT_ENTER == event);

@@ -23,6 +23,9 @@ public:
     ChapterText Read();
 
 private:
+    /// The tree of the source, without tables that no book can hold.
+    [[nodiscard]] MarkdownTree ParseTamed();
+
     /// A list that is open at this point of the walk.
     struct OpenList
     {

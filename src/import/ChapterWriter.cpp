@@ -13,6 +13,8 @@
 #include "import/StoryWriter.h"
 #include "import/Text.h"
 
+#include <map>
+
 namespace Import
 {
 
@@ -47,6 +49,20 @@ Kernel::Counted<DocumentController> OpenOrMake(fs::path const & path, std::strin
     return Kernel::MakeCounted<DocumentController>();
 }
 
+/// What the notes of a chapter are headed with in its language; English where we do not know better.
+String NotesHeadingIn(std::string const & language)
+{
+    static std::map<std::string_view, char const *, std::less<>> const headings{
+        {"ar", "ملاحظات"},   {"cs", "Poznámky"}, {"da", "Noter"},      {"de", "Anmerkungen"}, {"el", "Σημειώσεις"},
+        {"es", "Notas"},     {"fi", "Viitteet"}, {"fr", "Notes"},      {"he", "הערות"},       {"hi", "टिप्पणियाँ"},
+        {"hu", "Jegyzetek"}, {"it", "Note"},     {"ja", "注"},         {"nb", "Noter"},       {"nl", "Noten"},
+        {"no", "Noter"},     {"pl", "Przypisy"}, {"pt", "Notas"},      {"ru", "Примечания"},  {"sv", "Noter"},
+        {"tr", "Notlar"},    {"uk", "Примітки"}, {"vi", "Chú thích"},  {"zh", "注释"},
+    };
+    auto const known = headings.find(std::string_view(language).substr(0, language.find_first_of("-_")));
+    return headings.end() == known ? String("Notes") : String(known->second);
+}
+
 DocumentSettings SettingsFor(BookPlan const & plan, Template const & look, std::string const & title,
                              std::string const & author, std::string const & language)
 {
@@ -55,6 +71,7 @@ DocumentSettings SettingsFor(BookPlan const & plan, Template const & look, std::
     settings.m_Metadata.m_Title = String(title);
     settings.m_Metadata.m_Author = String(author);
     settings.m_Metadata.m_Language = String(language);
+    settings.m_PageSetup.m_NotesHeading = NotesHeadingIn(language);
     Kernel::Counted<Story::StyleSheet> const styles = settings.m_Styles->Clone();
     Story::AttSet glyphAtts = styles->GetDefaultGlyphAtts();
     glyphAtts.SetString(Story::GlyphAtt::Language, String(language));

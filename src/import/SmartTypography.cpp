@@ -1,5 +1,6 @@
 #include "import/SmartTypography.h"
 
+#include <algorithm>
 #include <array>
 #include <unicode/uchar.h>
 
@@ -106,8 +107,9 @@ std::size_t RunLength(std::u16string_view text, std::size_t at)
 }
 
 /// Whether the number that starts at `start` is a label after its noun, such as "Listing 1-2" or "Figure 3-4": a
-/// capitalised word in the singular.
-bool IsLabel(std::u16string_view text, std::size_t start)
+/// capitalised word in the singular. Where all nouns are capitalised, only those that captions have: pages and years have
+/// ranges.
+bool IsLabel(std::u16string_view text, std::size_t start, bool capitalisesNouns)
 {
     if (start < 2 || !(u' ' == text[start - 1] || u'\u00A0' == text[start - 1] || u'\n' == text[start - 1])) {
         return false;
@@ -117,12 +119,18 @@ bool IsLabel(std::u16string_view text, std::size_t start)
     while (0 < first && u_isalpha(text[first - 1])) {
         --first;
     }
-    return 4 <= end - first && u_isupper(text[first]) && u's' != text[end - 1];
+    std::u16string_view const word = text.substr(first, end - first);
+    if (capitalisesNouns) {
+        constexpr std::array<std::u16string_view, 7> labels{u"Abbildung", u"Beispiel", u"Bild",   u"Formel",
+                                                            u"Gleichung", u"Listing",  u"Tabelle"};
+        return labels.end() != std::find(labels.begin(), labels.end(), word);
+    }
+    return 4 <= word.size() && u_isupper(word.front()) && u's' != word.back();
 }
 
 /// Whether the hyphen at `at` stands between two numbers that make a range: "12-34", "1939-45", but neither part of a
 /// date or number with more hyphens, nor a falling pair.
-bool IsRangeHyphen(std::u16string_view text, std::size_t at)
+bool IsRangeHyphen(std::u16string_view text, std::size_t at, bool capitalisesNouns)
 {
     std::size_t start = at;
     while (0 < start && IsDigit(text[start - 1])) {
@@ -143,7 +151,7 @@ bool IsRangeHyphen(std::u16string_view text, std::size_t at)
     bool const isBound = 0 < start && joins(text[start - 1]);
     bool const runsOn =
         end < text.size() && (IsWord(text[end]) || u'-' == text[end] || u'/' == text[end] || u'_' == text[end]);
-    if (isBound || runsOn || IsLabel(text, start)) {
+    if (isBound || runsOn || IsLabel(text, start, capitalisesNouns)) {
         return false;
     }
     // A shorter second number stands for its last digits, as in "1939-45".
@@ -171,6 +179,7 @@ SmartTypography::SmartTypography(std::string_view language)
     m_InnerOpen = custom->m_InnerOpen;
     m_InnerClose = custom->m_InnerClose;
     m_IsFrench = "fr" == custom->m_Language;
+    m_CapitalisesNouns = "de" == tag || tag.starts_with("de-") || "lb" == tag;
 }
 
 std::u16string_view SmartTypography::QuoteFor(std::u16string_view text, std::size_t at) const
@@ -217,7 +226,7 @@ std::vector<TextEdit> SmartTypography::FindEdits(std::u16string_view text, std::
             bool const isAfterSpace = 0 == at || IsBeforeOpening(text[at - 1]);
             // "--quiet" is the name of a command's option, not a dash.
             bool const isOption = 2 == run && isAfterSpace && at + 2 < text.size() && u_isalpha(text[at + 2]);
-            if (1 == run && IsRangeHyphen(text, at)) {
+            if (1 == run && IsRangeHyphen(text, at, m_CapitalisesNouns)) {
                 replace(at, 1, u"\u2013");
             } else if (2 == run && !isOption) {
                 replace(at, 2, u"\u2013");

@@ -37,6 +37,7 @@ private:
     std::u16string_view m_Close;
     std::u16string_view m_InnerOpen;
     std::u16string_view m_InnerClose;
+    bool m_CapitalisesNouns = false;
     bool m_IsFrench = false;
 };
 

@@ -122,6 +122,12 @@ std::optional<std::string> ReadSourceText(std::filesystem::path const & path, st
         messages.Error("unreadable", {shownName}, Text("This is a folder, not a text file.", "Source"));
         return std::nullopt;
     }
+    bool const isThere = std::filesystem::exists(path, error);
+    if (isThere && !std::filesystem::is_regular_file(path, error)) {
+        messages.Error("unreadable", {shownName},
+                       Text("This is a device or a pipe, not a text file; it may have no end.", "Source"));
+        return std::nullopt;
+    }
     auto const size = std::filesystem::file_size(path, error);
     if (!error && g_LargestSource < size) {
         messages.Error("unreadable", {shownName},

@@ -183,6 +183,23 @@ TEST(MarkdownReaderTest, ExtremeInputIsReadWithoutHarm)
     ChapterText const brackets =
         ReadMarkdown(std::string(60000, '[') + "]{.x}" + std::string(60000, '*'), {"a.md", "en", true}, messages);
     EXPECT_EQ(brackets.m_Blocks.size(), 1u);
+    // A table of a few kilobytes that would have nine million cells.
+    std::string endless = "\n";
+    for (char const * part : {"x|", "-|"}) {
+        for (int column = 0; column < 3000; ++column) {
+            endless += part;
+        }
+        endless += "\n";
+    }
+    for (int row = 0; row < 3000; ++row) {
+        endless += "a\n";
+    }
+    MessageList told;
+    ChapterText const table = ReadMarkdown(endless + "\n|a|b|\n|-|-|\n|c|d|\n", {"a.md", "en", true}, told);
+    EXPECT_EQ(Describe(told), "3 table-size\n");
+    ASSERT_EQ(table.m_Blocks.size(), 2u);
+    EXPECT_EQ(table.m_Blocks[1].m_Kind, BlockKind::Table);
+
     ChapterText const line = ReadMarkdown(std::string(3000000, 'a') + " \"b\"", {"a.md", "en", true}, messages);
     ASSERT_EQ(line.m_Blocks.size(), 1u);
     EXPECT_EQ(line.m_Blocks[0].m_Text.m_Text.size(), 3000004u);

@@ -35,6 +35,7 @@ TEST(SmartTypographyTest, EachLanguageGetsItsOwnMarks)
              Case{"en", "pp. 12-34, 1939-45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1-2",
                   "pp. 12–34, 1939–45, 1875-05-03, UTF-8, ch04-01, 34-12, 555-1234-5, Listing 1-2, Chapters 1–2"},
              Case{"de-DE", "\"Das ist 'so'\"", "„Das ist ‚so‘“"},
+             Case{"de", "Seite 12-34, im Jahr 1914-18, Abbildung 1-2, Tabelle 3-4", "Seite 12–34, im Jahr 1914–18, Abbildung 1-2, Tabelle 3-4"},
              Case{"de-CH", "\"So\"", "«So»"},
              Case{"fr", "\"Oui\" : non ! l'eau", "«\u202FOui\u202F»\u00A0: non\u202F! l’eau"},
              Case{"ru", "\"Да\"", "«Да»"},
