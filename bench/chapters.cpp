@@ -1,6 +1,8 @@
 // What a book's chapters cost while it looks at them: one chapter's load, status and release; a pass over a long book;
 // a pass over what the user has open.
 
+#include "BenchChapter.h"
+
 #include "commands/AddChapterCommand.h"
 #include "commands/CloseBookCommand.h"
 #include "commands/LoadBookCommand.h"
@@ -9,12 +11,9 @@
 #include "core/BookCollection.h"
 #include "framework/document/CloseDocumentCommand.h"
 #include "framework/document/DocumentController.h"
-#include "framework/document/DocumentSettings.h"
 #include "framework/document/OpenDocumentFailedNotification.h"
 #include "framework/document/VantraController.h"
 #include "framework/kernel/Trace.h"
-#include "framework/story/SpecialGlyphs.h"
-#include "framework/story/StoryBuilder.h"
 
 #include <benchmark/benchmark.h>
 
@@ -31,41 +30,6 @@ namespace
 {
 
 namespace fs = std::filesystem;
-
-/// Thirty A5 pages with sixty headings.
-void WriteChapter(String const & path)
-{
-    DocumentSettings settings;
-    settings.m_PageSetup.m_FirstMaster = "Body";
-    settings.m_PageSetup.m_BodyMaster = "Body";
-    MasterPageSettings page;
-    page.m_TextRect = {50, 60, 370, 530};
-    settings.m_Masters.push_back({"Body", page, page});
-    settings.m_Metadata.m_Title = "Chapter";
-    Story::StoryBuilder builder;
-    std::string text = "The quick brown fox jumps over the lazy dog";
-    for (int word = 0; word < 14; ++word) {
-        text += " and the quick brown fox jumps over";
-    }
-    for (int section = 0; section < 60; ++section) {
-        builder.AppendObject(MakeCounted<Story::AnchorGlyph>(MakeCounted<Story::AnchorData>(
-                                 "Section", true, true, "uid-" + std::to_string(section), 1)),
-                             nullptr);
-        builder.AppendText("Section", nullptr);
-        builder.EndParagraph(nullptr);
-        for (int paragraph = 0; paragraph < 3; ++paragraph) {
-            builder.AppendText(text + ".", nullptr);
-            builder.EndParagraph(nullptr);
-        }
-    }
-    Counted<DocumentController> const document = DocumentController::CreateDocument(settings, builder.Finish());
-    DocumentSaveResult result;
-    document->SaveDocument(result, path);
-    if (!result.IsSuccess()) {
-        std::abort();
-    }
-    document->ShutDownArchive();
-}
 
 double PeakMegabytes()
 {
@@ -92,7 +56,7 @@ public:
         VantraController::GetInstance().EnqueueCommand(Counted<VantraCommand>(command));
         m_Book = command->GetBookController();
         String const first((m_Folder / "0.kvdoc").string());
-        WriteChapter(first);
+        WriteBenchChapter(first, BenchLinks::None);
         std::vector<String> paths{first};
         for (int chapter = 1; chapter < chapters; ++chapter) {
             paths.emplace_back((m_Folder / (std::to_string(chapter) + ".kvdoc")).string());
@@ -194,7 +158,7 @@ void BM_ManyBooks(benchmark::State & state)
     Book::BookController::ChapterPaths packaged;
     for (int chapter = 0; chapter < Chapters; ++chapter) {
         String const path((model / (std::to_string(chapter) + ".kvdoc")).string());
-        WriteChapter(path);
+        WriteBenchChapter(path, BenchLinks::None);
         packaged.emplace(book->AddChapter(path, -1), path);
     }
     DocumentSaveResult saved;
