@@ -2,6 +2,7 @@
 
 #include "app/BookFileLock.h"
 #include "app/ChapterNames.h"
+#include "app/FileCheck.h"
 #include "app/FileKind.h"
 #include "app/Interruption.h"
 #include "import/Text.h"
@@ -18,12 +19,6 @@ namespace
 {
 
 constexpr char const * g_BookExtension = ".kvbook";
-
-fs::path FullPath(std::string const & file)
-{
-    std::error_code error;
-    return fs::absolute(file, error).lexically_normal();
-}
 
 Json ListChapters(BookSession const & session)
 {
@@ -188,6 +183,9 @@ std::string BookEdit::CheckDocument(std::string const & file)
     case FileKind::Missing:
         m_Messages.Error("file-missing", {file}, Text("There is no such file.", "Program"));
         return {};
+    case FileKind::Shut:
+        m_Messages.Error("document-unreadable", {file}, Text("You have no permission to read this file.", "Program"));
+        return {};
     case FileKind::Book:
         m_Messages.Error(
             "file-foreign", {file},
@@ -223,12 +221,8 @@ std::string BookEdit::Describe(ChapterPtr const & chapter) const
 int EditBook(VerbContext & context, std::string const & file, EditPlan plan,
              std::function<void(BookEdit &)> const & change)
 {
-    fs::path const path = FullPath(file);
-    EditRun run(context, path, plan);
-    if (FileKind::Missing == KindOf(path)) {
-        run.m_Messages.Error("book-missing", {file},
-                             Text("There is no such book file; \"korvane new\" makes one.", "Program"));
-    } else {
+    EditRun run(context, FullPath(file), plan);
+    if (FindBook(file, run.m_Messages)) {
         run.Change(false, change);
     }
     return run.Report();

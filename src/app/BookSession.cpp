@@ -123,6 +123,16 @@ bool BookSession::Open(std::string const & path, Import::MessageList & messages)
     return true;
 }
 
+bool BookSession::OpenUsable(std::string const & path, Import::MessageList & messages)
+{
+    if (!Open(path, messages)) {
+        return false;
+    }
+    RefreshChapters();
+    ReportUnusable(messages);
+    return true;
+}
+
 void BookSession::Create()
 {
     auto const command = Kernel::MakeCounted<Book::NewBookCommand>();

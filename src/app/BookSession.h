@@ -28,6 +28,9 @@ public:
 
     /// Opens a book file and looks at all its chapters. False if it can't be opened; the messages tell why.
     bool Open(std::string const & path, Import::MessageList & messages);
+    /// The same for a verb that puts the book out: refreshes what it knows of its chapters, with an error for each one that
+    /// can't take part.
+    bool OpenUsable(std::string const & path, Import::MessageList & messages);
     /// An empty book without a file.
     void Create();
     [[nodiscard]] bool IsOpen() const { return static_cast<bool>(m_Book); }

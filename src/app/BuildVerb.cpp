@@ -1,5 +1,5 @@
 #include "app/BookExport.h"
-#include "app/BookFileLock.h"
+#include "app/FileCheck.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
 #include "app/VerbList.h"
@@ -55,31 +55,21 @@ private:
         }
         std::string const wanted = !m_Options.m_Template.empty() ? m_Options.m_Template : m_Plan->m_Template;
         // A path on the command line starts from here, one in the manifest from its folder.
-        fs::path const base = m_Options.m_Template.empty() ? m_Plan->m_Folder : fs::current_path();
+        std::error_code error;
+        fs::path const base = m_Options.m_Template.empty() ? m_Plan->m_Folder : fs::current_path(error);
         auto const path = Import::FindTemplate(wanted.empty() ? g_DefaultTemplate : wanted, base, m_Messages);
         m_Look = path ? Import::ReadTemplate(*path, m_Messages) : std::nullopt;
         if (!m_Look) {
             return false;
         }
         m_Target = FindTarget();
-        std::error_code error;
-        if (fs::is_directory(m_Target, error)) {
-            m_Messages.Error("output", {m_Target.string()}, Text("The output is a folder; name a file.", "Program"));
-            return false;
-        }
-        if (fs::path const parent = m_Target.parent_path(); !fs::is_directory(parent, error)) {
-            m_Messages.Error("output", {m_Target.string()},
-                             Text("The folder %1 for the output does not exist.", "Program", parent.string()));
-            return false;
-        }
-        return true;
+        return CheckOutput(m_Target, OutputKind::Pdf, m_Messages);
     }
 
     fs::path FindTarget() const
     {
-        std::error_code error;
         if (!m_Options.m_Output.empty()) {
-            return fs::absolute(m_Options.m_Output, error).lexically_normal();
+            return FullPath(m_Options.m_Output);
         }
         if (!m_Plan->m_OutputFile.empty()) {
             return (m_Plan->m_Folder / m_Plan->m_OutputFile).lexically_normal();
@@ -148,7 +138,25 @@ private:
                          [](auto const & chapter) { return !chapter.m_Name.empty(); })) {
             return false;
         }
-        return SetBook(importer);
+        return IsTargetFree(importer.State()) && SetBook(importer);
+    }
+
+    /// False, with an error, if a chapter places the very file that the PDF would replace.
+    bool IsTargetFree(Import::WorkState const & state)
+    {
+        std::error_code error;
+        for (auto const & [name, chapter] : state.m_Chapters) {
+            for (auto const & [picture, known] : chapter.m_Pictures) {
+                if (fs::equivalent((m_Plan->m_Folder / name).parent_path() / picture, m_Target, error)) {
+                    m_Messages.Error("target-same", {m_Target.string()},
+                                     Text("The chapter %1 places this file, so the book cannot be written over it; name "
+                                          "another output.",
+                                          "Program", name));
+                    return false;
+                }
+            }
+        }
+        return true;
     }
 
     bool IsOutputCurrent(Import::WorkState const & state) const

@@ -1,4 +1,6 @@
 #include "app/Interruption.h"
+#include "app/ParserMessage.h"
+#include "app/TextTable.h"
 #include "app/VerbList.h"
 #include "import/Text.h"
 
@@ -57,10 +59,31 @@ void TranslateHelp(CLI::App & program)
     formatter->label("INT", Text("NUMBER", "Help"));
     program.option_defaults()->group(Text("Options", "Help"));
     program.set_help_flag("-h,--help", Text("Print this help and end", "Help"));
-    program.failure_message([](CLI::App const *, CLI::Error const & error) {
-        return std::string(error.what()) + "\n" + Text("Run with --help for more information.", "Help") + "\n";
-    });
     program.set_version_flag("--version", g_Version, Text("Print the version and end", "Help"));
+}
+
+/// Runs the verb that the command line names; what went wrong unexpectedly becomes a message.
+int RunVerb(VerbList const & verbs, Console & console, AskUser ask)
+{
+    if (ask) {
+        ask = [&console, ask = std::move(ask)](std::string const & question, std::string & answer) {
+            Console::Pause const pause(console);
+            return ask(Harmless(question), answer);
+        };
+        verbs.Answers().m_Passwords->SetAsk([ask](std::string const & question, std::string & answer) {
+            EchoOff const noEcho;
+            return ask(question, answer);
+        });
+    }
+    VerbContext context{console, std::move(ask), verbs.Answers()};
+    try {
+        return verbs.RunParsed(context);
+    } catch (std::bad_alloc const &) {
+        console.Error(Text("There is not enough memory for this.", "Program"));
+    } catch (std::exception const & error) {
+        console.Error(Text("Unexpected failure: %1", "Program", error.what()));
+    }
+    return ExitFailed;
 }
 
 }
@@ -96,41 +119,29 @@ int RunProgram(std::vector<std::string> const & arguments, std::ostream & out, s
     AddLocateVerb(verbs);
     AddWatchVerb(verbs);
     AddShowVerb(verbs);
-
-    try {
-        std::vector<std::string> reversed(arguments.rbegin(), arguments.rend());
-        app.parse(std::move(reversed));
-    } catch (CLI::ParseError const & error) {
-        bool const isHelp = 0 == error.get_exit_code();
-        app.exit(error, out, err);
-        return isHelp ? ExitFine : ExitWrongUse;
-    }
+    verbs.RefuseEmptyValues();
 
     Interruption const interruption;
-    Console console(out, err, verbs.Settings(), terminal);
-    if (ask) {
-        ask = [&console, ask = std::move(ask)](std::string const & question, std::string & answer) {
-            Console::Pause const pause(console);
-            return ask(question, answer);
-        };
-        verbs.Answers().m_Passwords->SetAsk([ask](std::string const & question, std::string & answer) {
-            EchoOff const noEcho;
-            return ask(question, answer);
-        });
-    }
-    VerbContext context{console, std::move(ask), verbs.Answers()};
+    bool isRead = false;
     int code = ExitFine;
     try {
-        code = verbs.RunParsed(context);
-    } catch (std::bad_alloc const &) {
-        console.Error(Text("There is not enough memory for this.", "Program"));
-        code = ExitFailed;
-    } catch (std::exception const & error) {
-        console.Error(Text("Unexpected failure: %1", "Program", error.what()));
-        code = ExitFailed;
+        app.parse(std::vector<std::string>(arguments.rbegin(), arguments.rend()));
+        isRead = true;
+    } catch (CLI::Success const & wish) {
+        // Help or the version.
+        app.exit(wish, out, err);
+    } catch (CLI::ParseError const & error) {
+        err << Harmless(DescribeWrongUse(app, error)) << '\n'
+            << Text("Run with --help for more information.", "Help") << '\n';
+        code = ExitWrongUse;
+    }
+    Console console(out, err, verbs.Settings(), terminal);
+    if (isRead) {
+        code = RunVerb(verbs, console, std::move(ask));
     }
     out.flush();
-    if (!out) {
+    // A reader that has seen enough is no failure.
+    if (!out && !console.HasReaderGone()) {
         console.Error(Text("The output could not be written.", "Program"));
         code = ExitFailed;
     }

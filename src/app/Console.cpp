@@ -1,5 +1,6 @@
 #include "app/Console.h"
 
+#include "app/TextTable.h"
 #include "import/Text.h"
 
 #include <algorithm>
@@ -14,6 +15,22 @@ namespace
 
 constexpr int g_MessagesOfOneKind = 5;
 constexpr int g_BarWidth = 30;
+constexpr int g_LeastBarWidth = 5;
+
+/// A bar that leaves the last column free: a line that goes on below could not be taken away again.
+std::string DrawBar(std::string const & step, int percent, int columns)
+{
+    std::string const number = std::to_string(percent) + "%";
+    // Two brackets and two spaces; and what the number may grow to.
+    int const room = columns - 1 - DisplayWidth(step) - 4 - 4;
+    if (room < g_LeastBarWidth) {
+        return CutToWidth(step, std::max(columns - 6, 1)) + " " + number;
+    }
+    int const width = std::min(room, g_BarWidth);
+    auto const filled = static_cast<std::size_t>(percent * width / 100);
+    return step + " [" + std::string(filled, '#') + std::string(static_cast<std::size_t>(width) - filled, ' ') + "] " +
+           number;
+}
 
 }
 
@@ -53,6 +70,11 @@ void Console::EraseBar()
 
 void Console::Say(std::string const & line)
 {
+    SayStyled(Harmless(line));
+}
+
+void Console::SayStyled(std::string const & line)
+{
     std::lock_guard const lock(m_Lock);
     if (!m_Settings.m_IsQuiet && !m_Settings.m_IsJson) {
         EraseBar();
@@ -77,7 +99,7 @@ void Console::Tell(Import::Message const & message)
     bool const isError = Import::Severity::Error == message.m_Severity;
     if (isError || !m_Settings.m_IsQuiet) {
         EraseBar();
-        m_Err << Import::ToText(message) << '\n' << std::flush;
+        m_Err << Harmless(Import::ToText(message)) << '\n' << std::flush;
     }
 }
 
@@ -125,7 +147,7 @@ void Console::Progress(std::string const & step, double fraction)
         // Lines for logs: each step once.
         if (step != m_Step) {
             m_Step = step;
-            m_Err << step << "...\n" << std::flush;
+            m_Err << Harmless(step) << "...\n" << std::flush;
         }
         return;
     }
@@ -135,9 +157,13 @@ void Console::Progress(std::string const & step, double fraction)
     m_Step = step;
     m_Percent = percent;
     m_HasBar = true;
-    int const filled = percent * g_BarWidth / 100;
-    m_Err << "\r\x1b[K" << step << " [" << std::string(static_cast<std::size_t>(filled), '#')
-          << std::string(static_cast<std::size_t>(g_BarWidth - filled), ' ') << "] " << percent << '%' << std::flush;
+    m_Err << "\r\x1b[K" << DrawBar(Harmless(step), percent, m_Terminal.m_ProgressColumns) << std::flush;
+}
+
+bool Console::HasReaderGone()
+{
+    std::lock_guard const lock(m_Lock);
+    return m_Terminal.m_HasReader && !m_Terminal.m_HasReader();
 }
 
 void Console::EndProgress()

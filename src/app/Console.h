@@ -23,10 +23,14 @@ struct TerminalFacts
 {
     /// The error stream is a terminal: progress is a bar that redraws itself.
     bool m_HasProgress = false;
+    /// Columns of that terminal.
+    int m_ProgressColumns = 80;
     /// The output is a terminal that shows colours.
     bool m_HasColour = false;
     /// Columns of the output; 0 if it is no terminal, and lines may be as long as they like.
     int m_Columns = 0;
+    /// Whether somebody still reads what goes to the output; null where that is always so.
+    bool (*m_HasReader)() = nullptr;
 };
 
 /// What the program says to its user. Results go to the output, messages and progress to the error stream. Safe on any
@@ -53,8 +57,11 @@ public:
     [[nodiscard]] ConsoleSettings const & Settings() const { return m_Settings; }
     [[nodiscard]] TerminalFacts const & Terminal() const { return m_Terminal; }
 
-    /// A line of the result; nothing when the result is JSON or quiet.
+    /// A line of the result; nothing when the result is JSON or quiet. What a terminal would obey is shown as "?": names
+    /// of files and chapters may hold anything.
     void Say(std::string const & line);
+    /// The same for a line of a table, which is harmless already and may hold colours.
+    void SayStyled(std::string const & line);
     /// The result itself, whatever the settings.
     void SayResult(std::string const & text);
     /// An error or warning; warnings are left out when quiet.
@@ -67,6 +74,8 @@ public:
     void Progress(std::string const & step, double fraction);
     /// Takes the progress bar away, before other output and at the end.
     void EndProgress();
+    /// The output could not be written because its reader has closed it, as `head` does when it has seen enough.
+    [[nodiscard]] bool HasReaderGone();
 
 private:
     void EraseBar();

@@ -1,5 +1,5 @@
 #include "app/BookExport.h"
-#include "app/BookFileLock.h"
+#include "app/FileCheck.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
 #include "app/VerbList.h"
@@ -41,33 +41,19 @@ std::string LanguageOf(BookSession const & session)
 int RunExport(VerbContext & context, ExportOptions const & options)
 {
     Import::MessageList messages;
-    std::error_code error;
-    fs::path const book = fs::absolute(options.m_Book, error).lexically_normal();
-    fs::path const target = fs::absolute(options.m_Output, error).lexically_normal();
+    fs::path const book = FullPath(options.m_Book);
+    fs::path const target = FullPath(options.m_Output);
     BookFileLock lock;
-    std::string problem;
     int pages = 0;
     bool isGood = false;
-    if (!fs::is_regular_file(book, error)) {
-        messages.Error("book-missing", {options.m_Book},
-                       Text("There is no such book file; \"korvane new\" makes one.", "Program"));
-    } else if (!fs::is_directory(target.parent_path(), error)) {
-        messages.Error("output", {target.string()},
-                       Text("The folder %1 for the output does not exist.", "Program", target.parent_path().string()));
-    } else if (!lock.Take(book, problem)) {
-        messages.Error("book-locked", {options.m_Book}, problem);
-    } else {
+    if (CheckOutput(target, OutputKind::Pdf, messages) && ClaimBook(options.m_Book, options.m_SkipsUpdates, lock, messages)) {
         Listener listener(context.m_Console, context.m_Ask, context.m_Answers);
         BookSession session(context.m_Console, listener);
-        isGood = session.Open(book.string(), messages);
-        if (isGood) {
-            session.RefreshChapters();
-            session.ReportUnusable(messages);
-            if (session.GetChapters().empty()) {
-                messages.Error("book-empty", {options.m_Book},
-                               Text("The book has no chapters, so there is nothing to write.", "Program"));
-                isGood = false;
-            }
+        isGood = session.OpenUsable(book.string(), messages);
+        if (isGood && session.GetChapters().empty()) {
+            messages.Error("book-empty", {options.m_Book},
+                           Text("The book has no chapters, so there is nothing to write.", "Program"));
+            isGood = false;
         }
         if (isGood && !options.m_SkipsUpdates) {
             session.Update(messages);

@@ -15,10 +15,14 @@ FileKind KindOf(fs::path const & path)
         return FileKind::Folder;
     }
     if (!fs::is_regular_file(path, error)) {
-        return FileKind::Missing;
+        return std::errc::permission_denied == error ? FileKind::Shut : FileKind::Missing;
     }
     char head[128] = {};
-    std::ifstream(path, std::ios::binary).read(head, sizeof head);
+    std::ifstream stream(path, std::ios::binary);
+    if (!stream) {
+        return FileKind::Shut;
+    }
+    stream.read(head, sizeof head);
     std::string_view const view(head, sizeof head);
     return std::string_view::npos != view.find("KvBk")   ? FileKind::Book
            : std::string_view::npos != view.find("KvDc") ? FileKind::Document

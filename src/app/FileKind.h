@@ -9,6 +9,8 @@ enum class FileKind
 {
     Missing,
     Folder,
+    /// The system keeps its content, or the folder that it lies in, from the user.
+    Shut,
     Book,
     Document,
     Other

@@ -56,7 +56,7 @@ int RunImport(VerbContext & context, ImportOptions const & options)
                                  : plan->m_Template.empty()  ? "novel"
                                                              : plan->m_Template;
         auto const path =
-            Import::FindTemplate(name, options.m_Template.empty() ? plan->m_Folder : fs::current_path(), messages);
+            Import::FindTemplate(name, options.m_Template.empty() ? plan->m_Folder : fs::current_path(error), messages);
         look = path ? Import::ReadTemplate(*path, messages) : std::nullopt;
     }
 

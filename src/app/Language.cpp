@@ -41,6 +41,8 @@ fs::path FindTranslations(fs::path const & program)
 
 void ChooseLanguage()
 {
+    // The system's own sentences come in these characters, or with question marks in their place.
+    std::setlocale(LC_CTYPE, "C.UTF-8");
     if (!std::setlocale(LC_MESSAGES, "")) {
         // The system lacks this locale. Its texts are ours, so only the name is needed; but gettext translates nothing
         // in the plain C locale, and everything in any other one, by the languages that LANGUAGE lists.

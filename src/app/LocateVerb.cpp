@@ -1,5 +1,5 @@
-#include "app/BookFileLock.h"
 #include "app/BookSession.h"
+#include "app/FileCheck.h"
 #include "app/Json.h"
 #include "app/LocateChaptersCommand.h"
 #include "app/VerbList.h"
@@ -165,14 +165,10 @@ void Search::Locate(BookSession & session, Listener & listener)
 
 int Search::Run()
 {
-    std::error_code error;
-    m_Book = fs::absolute(m_Options.m_Book, error).lexically_normal();
+    m_Book = FullPath(m_Options.m_Book);
     BookFileLock lock;
-    std::string problem;
     bool isGood = false;
-    if (!fs::is_regular_file(m_Book, error)) {
-        m_Messages.Error("book-missing", {m_Options.m_Book}, Text("There is no such book file.", "Program"));
-    } else if (m_Options.m_Old.empty() != m_Options.m_New.empty()) {
+    if (m_Options.m_Old.empty() != m_Options.m_New.empty()) {
         m_Messages.Error("locate-half", {m_Options.m_Old},
                          Text("Say both where the file was and where it is now.", "Program"));
     } else if (m_Options.m_Old.empty() && !m_Context.m_Ask) {
@@ -180,9 +176,7 @@ int Search::Run()
                          Text("Nobody can be asked here: name the old and the new path, as in \"korvane locate BOOK OLD "
                               "NEW\".",
                               "Program"));
-    } else if (!lock.Take(m_Book, problem)) {
-        m_Messages.Error("book-locked", {m_Options.m_Book}, problem);
-    } else {
+    } else if (LockBook(m_Options.m_Book, lock, m_Messages)) {
         // Not asked on opening: the verb itself begins the search once it knows what was there before.
         StandingAnswers quiet = m_Context.m_Answers;
         quiet.m_Locate = StandingAnswers::Choice::No;

@@ -5,6 +5,7 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <sstream>
 #include <string_view>
 
 namespace App
@@ -37,13 +38,24 @@ bool PasswordBook::AddLine(std::string const & line)
 
 bool PasswordBook::ReadFile(std::string const & path, std::string & problem)
 {
+    // A pipe will do, but not one without an end.
+    constexpr std::size_t largest = std::size_t(1) << 20;
+    std::error_code error;
     std::ifstream stream(path);
-    if (!stream) {
+    std::string text(largest + 1, '\0');
+    stream.read(text.data(), static_cast<std::streamsize>(text.size()));
+    if (!stream.is_open() || stream.bad() || std::filesystem::is_directory(path, error)) {
         problem = Text("The password file %1 can't be read.", "Program", path);
         return false;
     }
+    text.resize(static_cast<std::size_t>(stream.gcount()));
+    if (largest < text.size()) {
+        problem = Text("The password file %1 is larger than any list of passwords.", "Program", path);
+        return false;
+    }
     int number = 0;
-    for (std::string line; std::getline(stream, line);) {
+    std::istringstream lines(text);
+    for (std::string line; std::getline(lines, line);) {
         ++number;
         line.resize(line.ends_with('\r') ? line.size() - 1 : line.size());
         if (!line.empty() && '#' != line[0] && !AddLine(line)) {

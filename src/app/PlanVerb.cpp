@@ -1,3 +1,4 @@
+#include "app/FileCheck.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
 #include "app/PrintLayout.h"
@@ -191,21 +192,16 @@ PlanResult PlanSheets(BookSession const & session, PrintLayout const & layout, I
 int RunPlan(VerbContext & context, PlanOptions const & options)
 {
     Import::MessageList messages;
-    std::error_code error;
-    fs::path const book = fs::absolute(options.m_Book, error).lexically_normal();
+    fs::path const book = FullPath(options.m_Book);
     bool const hasLayout = options.m_LayoutOption->count() > 0;
     PlanResult result{Json::array(), TextTable({}), {}};
     bool isGood = false;
-    if (!fs::is_regular_file(book, error)) {
-        messages.Error("book-missing", {options.m_Book}, Text("There is no such book file.", "Program"));
-    } else {
+    if (FindBook(options.m_Book, messages)) {
         Listener listener(context.m_Console, context.m_Ask, context.m_Answers);
         {
             BookSession session(context.m_Console, listener);
-            isGood = session.Open(book.string(), messages);
+            isGood = session.OpenUsable(book.string(), messages);
             if (isGood) {
-                session.RefreshChapters();
-                session.ReportUnusable(messages);
                 result = hasLayout ? PlanSheets(session, options.m_Layout, messages)
                                    : PlanOutput(session, options.m_Spreads);
             }

@@ -1,5 +1,5 @@
-#include "app/BookFileLock.h"
 #include "app/BookSession.h"
+#include "app/FileCheck.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
 #include "app/StatusNames.h"
@@ -82,16 +82,9 @@ int RunPreflight(VerbContext & context, std::string const & file)
 {
     Import::MessageList messages;
     Console & console = context.m_Console;
-    std::error_code error;
-    fs::path const path = fs::absolute(file, error).lexically_normal();
-    BookFileLock lock;
-    std::string problem;
+    fs::path const path = FullPath(file);
     Findings findings;
-    if (!fs::is_regular_file(path, error)) {
-        messages.Error("book-missing", {file}, Text("There is no such book file.", "Program"));
-    } else if (!lock.Take(path, problem)) {
-        messages.Error("book-locked", {file}, problem);
-    } else {
+    if (FindBook(file, messages)) {
         Listener listener(console, context.m_Ask, context.m_Answers);
         BookSession session(console, listener);
         if (session.Open(path.string(), messages)) {

@@ -38,6 +38,7 @@ bool ChooseChapters(BookSession const & session, PrintLayout const & layout, Cha
     for (auto const & chapter : all) {
         labels.push_back({chapter->GetName().ToStd(), chapter->GetPath().ToStd()});
     }
+    std::error_code error;
     std::vector<bool> isChosen(all.size(), layout.m_Chapters.empty());
     std::istringstream parts(layout.m_Chapters);
     for (std::string part; std::getline(parts, part, ',');) {
@@ -48,7 +49,7 @@ bool ChooseChapters(BookSession const & session, PrintLayout const & layout, Cha
         if (part.find('-') != std::string::npos && CheckPrintPages(part, unread)) {
             indices = ParsePrintPages(part, static_cast<int>(all.size()), {0});
         } else {
-            FoundChapter const found = FindChapter(labels, part, std::filesystem::current_path());
+            FoundChapter const found = FindChapter(labels, part, std::filesystem::current_path(error));
             if (found.m_Index < 0) {
                 messages.Error("chapter-unknown", {}, found.m_Problem);
                 return false;

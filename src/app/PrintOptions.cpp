@@ -2,10 +2,9 @@
 
 #include "app/PaperSize.h"
 #include "app/PrintLayout.h"
+#include "app/VerbList.h"
 #include "framework/render/PrintPages.h"
 #include "import/Text.h"
-
-#include <CLI/CLI.hpp>
 
 namespace App
 {
@@ -100,7 +99,7 @@ void CheckTogether(PrintLayout const & layout, std::vector<OptionOfLayouts> cons
 
 void AddLayoutOptions(CLI::App & verb, PrintLayout & layout)
 {
-    auto const positive = [](int least) { return CLI::Range(least, 100'000); };
+    auto const positive = [](int least) { return NumberBetween(least, 100'000); };
     std::string const lengths = Text("a length such as 10mm, or two such as 10x5mm", "Program");
     AddRead(verb, "layout", layout.m_Kind, OneOf(LayoutNames),
             Text("one of single, tiled, nup, book, booklet", "Program"),

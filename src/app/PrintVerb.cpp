@@ -1,6 +1,6 @@
 #include "app/BookExport.h"
-#include "app/BookFileLock.h"
 #include "app/BookSettings.h"
+#include "app/FileCheck.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
 #include "app/PrintLayout.h"
@@ -35,12 +35,6 @@ struct PrintOutcome
     std::size_t m_Sheets = 0;
     std::size_t m_Pages = 0;
 };
-
-fs::path Absolute(std::string const & path)
-{
-    std::error_code error;
-    return path.empty() ? fs::path() : fs::absolute(path, error).lexically_normal();
-}
 
 Kernel::Counted<Renderer::FileExportOptionsPDF const> MakePdfOptions(BookSession const & session,
                                                                      PrintOptions const & options)
@@ -97,14 +91,14 @@ bool PrintSheets(BookSession & session, PrintOptions const & options, PrintOutco
     Book::PrintSettings const settings = options.m_Layout.GetSettings();
     bool isGood = true;
     if (!options.m_Output.empty()) {
-        fs::path const target = Absolute(options.m_Output);
+        fs::path const target = FullPath(options.m_Output);
         isGood = RunCommand(session,
                             Kernel::MakeCounted<Book::PrintBookCommand>(sheets, settings, String(target.string()),
                                                                         MakePdfOptions(session, options)),
                             target, messages);
     }
     if (isGood && !options.m_Preview.empty() && !Interruption::IsRaised()) {
-        fs::path const target = Absolute(options.m_Preview);
+        fs::path const target = FullPath(options.m_Preview);
         if (sheets.size() > Book::PrintProofCommand::MostSheets) {
             messages.Warn("preview", {target.string()},
                           Text("The picture shows the first %1 of %2 sides.", "Program",
@@ -121,11 +115,9 @@ bool PrintSheets(BookSession & session, PrintOptions const & options, PrintOutco
 bool PrepareBook(BookSession & session, PrintOptions const & options, fs::path const & book,
                  Import::MessageList & messages)
 {
-    if (!session.Open(book.string(), messages)) {
+    if (!session.OpenUsable(book.string(), messages)) {
         return false;
     }
-    session.RefreshChapters();
-    session.ReportUnusable(messages);
     if (options.m_SkipsUpdates) {
         return true;
     }
@@ -136,17 +128,13 @@ bool PrepareBook(BookSession & session, PrintOptions const & options, fs::path c
 int RunPrint(VerbContext & context, PrintOptions const & options)
 {
     Import::MessageList messages;
-    std::error_code error;
-    fs::path const book = Absolute(options.m_Book);
+    fs::path const book = FullPath(options.m_Book);
     BookFileLock lock;
-    std::string problem;
     PrintOutcome outcome;
     bool isGood = false;
-    if (!fs::is_regular_file(book, error)) {
-        messages.Error("book-missing", {options.m_Book}, Text("There is no such book file.", "Program"));
-    } else if (!lock.Take(book, problem)) {
-        messages.Error("book-locked", {options.m_Book}, problem);
-    } else {
+    if ((options.m_Output.empty() || CheckOutput(FullPath(options.m_Output), OutputKind::Pdf, messages)) &&
+        (options.m_Preview.empty() || CheckOutput(FullPath(options.m_Preview), OutputKind::Png, messages)) &&
+        ClaimBook(options.m_Book, options.m_SkipsUpdates, lock, messages)) {
         Listener listener(context.m_Console, context.m_Ask, context.m_Answers);
         BookSession session(context.m_Console, listener);
         isGood = PrepareBook(session, options, book, messages) && !Interruption::IsRaised() &&
@@ -162,16 +150,17 @@ int RunPrint(VerbContext & context, PrintOptions const & options)
     console.EndProgress();
     if (console.Settings().m_IsJson) {
         Json result{{"ok", isGood}, {"book", book.string()}, {"sheets", outcome.m_Sheets}, {"pages", outcome.m_Pages}};
-        result["output"] = options.m_Output.empty() ? Json() : Json(Absolute(options.m_Output).string());
-        result["preview"] = options.m_Preview.empty() ? Json() : Json(Absolute(options.m_Preview).string());
+        result["output"] = options.m_Output.empty() ? Json() : Json(FullPath(options.m_Output).string());
+        result["preview"] = options.m_Preview.empty() ? Json() : Json(FullPath(options.m_Preview).string());
         result["messages"] = ToJson(messages);
         console.SayResult(Print(result));
     }
     console.Tell(messages);
     for (std::string const & target : {options.m_Output, options.m_Preview}) {
         if (isGood && !target.empty()) {
-            console.Say(Text("Wrote %1: %2 pages on %3 sides", "Program", Absolute(target).string(), outcome.m_Pages,
-                             outcome.m_Sheets));
+            console.Say(Import::CountText("Wrote %2: %1 page", "Wrote %2: %1 pages", "Program", outcome.m_Pages,
+                                          FullPath(target).string()) +
+                        " " + Import::CountText("on %1 side", "on %1 sides", "Program", outcome.m_Sheets));
         }
     }
     return isGood ? ExitFine : ExitFailed;
@@ -195,7 +184,7 @@ void AddPrintVerb(VerbList & verbs)
     AddLayoutOptions(verb, options->m_Layout);
     verb.parse_complete_callback([output, preview] {
         if (output->count() == 0 && preview->count() == 0) {
-            throw CLI::RequiredError("-o OUT.pdf or --preview OUT.png");
+            throw CLI::RequiredError(Text("-o OUT.pdf or --preview OUT.png", "Help"));
         }
     });
     verb.add_flag("--no-update", options->m_SkipsUpdates, Text("Leave numbers and references as they are", "Help"));

@@ -1,7 +1,8 @@
 #include "app/BookSession.h"
 #include "app/DescribeDocument.h"
-#include "app/PreviewFile.h"
+#include "app/FileCheck.h"
 #include "app/FileKind.h"
+#include "app/PreviewFile.h"
 #include "app/VerbList.h"
 #include "core/BookChapter.h"
 #include "framework/document/DocumentController.h"
@@ -62,7 +63,7 @@ std::vector<std::string> Summarise(Json const & json)
     Json const & metadata = json.at("metadata");
     lines.push_back(Text("Document \"%1\", language %2", "Program", metadata.at("title").get<std::string>(),
                          metadata.at("language").get<std::string>()));
-    lines.push_back("  " + Text("%1 pages on %2 spreads, %3 sections, %4 paragraph styles", "Program",
+    lines.push_back("  " + Text("pages: %1, spreads: %2, sections: %3, paragraph styles: %4", "Program",
                                 json.at("pageCount").get<int>(), json.at("spreads").size(), json.at("sections").size(),
                                 json.at("styles").at("paragraph").size()));
     for (Json const & section : json.at("sections")) {
@@ -73,7 +74,7 @@ std::vector<std::string> Summarise(Json const & json)
                         (section.at("included").get<bool>() ? "" : Text(", left out of output", "Program")));
     }
     for (Json const & story : json.at("stories")) {
-        lines.push_back("  " + Text("story of %1 paragraphs in %2 frames, %3 notes", "Program",
+        lines.push_back("  " + Text("story: paragraphs: %1, frames: %2, notes: %3", "Program",
                                     story.at("paragraphs").size(), story.at("frameCount").get<int>(),
                                     story.at("notes").size()));
     }
@@ -92,14 +93,16 @@ int RunShow(VerbContext & context, ShowOptions const & options)
     std::string const & file = options.m_File;
     Import::MessageList messages;
     Console & console = context.m_Console;
-    std::error_code error;
-    fs::path const path = fs::absolute(file, error).lexically_normal();
-    fs::path const thumbnail =
-        options.m_Thumbnail.empty() ? fs::path() : fs::absolute(options.m_Thumbnail, error).lexically_normal();
+    fs::path const path = FullPath(file);
+    fs::path const thumbnail = options.m_Thumbnail.empty() ? fs::path() : FullPath(options.m_Thumbnail);
+    bool const canWrite = thumbnail.empty() || CheckOutput(thumbnail, OutputKind::Png, messages);
     Json json;
     switch (KindOf(path)) {
     case FileKind::Missing:
         messages.Error("file-missing", {file}, Text("There is no such file.", "Program"));
+        break;
+    case FileKind::Shut:
+        messages.Error("document-unreadable", {file}, Text("You have no permission to read this file.", "Program"));
         break;
     case FileKind::Folder:
     case FileKind::Other:
@@ -114,7 +117,7 @@ int RunShow(VerbContext & context, ShowOptions const & options)
         BookSession session(console, listener);
         if (session.Open(path.string(), messages)) {
             json = DescribeBook(session, path);
-            if (!thumbnail.empty()) {
+            if (!thumbnail.empty() && canWrite) {
                 WriteBookPreview(file, path, thumbnail, messages);
             }
         }
@@ -127,7 +130,7 @@ int RunShow(VerbContext & context, ShowOptions const & options)
         if (document->LoadDocument(String(path.string()), false, true, LoadWhole, nullptr, failure, false)) {
             json = DescribeDocument(*document);
             json["path"] = path.string();
-            if (!thumbnail.empty()) {
+            if (!thumbnail.empty() && canWrite) {
                 WriteDocumentPreview(file, document, thumbnail, messages);
             }
         } else {

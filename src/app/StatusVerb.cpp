@@ -1,5 +1,5 @@
 #include "app/BookSession.h"
-#include "app/FileKind.h"
+#include "app/FileCheck.h"
 #include "app/Json.h"
 #include "app/StatusNames.h"
 #include "app/TextTable.h"
@@ -60,8 +60,7 @@ int RunStatus(VerbContext & context, StatusOptions const & options)
 {
     Import::MessageList messages;
     Console & console = context.m_Console;
-    std::error_code error;
-    fs::path const path = fs::absolute(options.m_Book, error).lexically_normal();
+    fs::path const path = FullPath(options.m_Book);
     Json chapters = Json::array();
     TextTable table({{""},
                      {Text("No", "Table"), false, true},
@@ -74,10 +73,7 @@ int RunStatus(VerbContext & context, StatusOptions const & options)
     bool isGood = false;
     int pages = 0;
     int count = 0;
-    if (FileKind::Missing == KindOf(path)) {
-        messages.Error("book-missing", {options.m_Book},
-                       Text("There is no such book file; \"korvane new\" makes one.", "Program"));
-    } else {
+    if (FindBook(options.m_Book, messages)) {
         Listener listener(console, context.m_Ask, context.m_Answers);
         {
             BookSession session(console, listener);
@@ -110,7 +106,7 @@ int RunStatus(VerbContext & context, StatusOptions const & options)
     bool const hasColour =
         "always" == options.m_Colour || ("auto" == options.m_Colour && console.Terminal().m_HasColour);
     for (std::string const & line : table.Layout(console.Terminal().m_Columns, hasColour)) {
-        console.Say(line);
+        console.SayStyled(line);
     }
     if (isGood) {
         console.Say(Import::CountText("%1 chapter", "%1 chapters", "Program", count) + ", " +
@@ -131,7 +127,7 @@ void AddStatusVerb(VerbList & verbs)
     verb.add_option("--colour,--color", options->m_Colour,
                     Text("When to use colours; by default on a terminal", "Help"))
         ->type_name("auto|always|never")
-        ->check(CLI::IsMember({"auto", "always", "never"}));
+        ->check(OneOfWords({"auto", "always", "never"}));
     verbs.AddAnswers(verb);
 }
 

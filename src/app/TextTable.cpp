@@ -66,17 +66,20 @@ char const * CodeOf(CellLook look)
     return "";
 }
 
-/// File names may hold anything; what a terminal would obey must not reach it.
-std::string Harmless(std::string text)
-{
-    for (char & c : text) {
-        if (static_cast<unsigned char>(c) < 0x20 || 0x7F == c) {
-            c = '?';
-        }
-    }
-    return text;
 }
 
+std::string Harmless(std::string_view text)
+{
+    std::string result;
+    auto const length = static_cast<std::int32_t>(text.size());
+    for (std::int32_t at = 0; at < length;) {
+        std::int32_t const begin = at;
+        UChar32 c = 0;
+        U8_NEXT(text.data(), at, length, c);
+        bool const isControl = 0 <= c && U_CONTROL_CHAR == u_charType(c);
+        result += isControl ? "?" : text.substr(static_cast<std::size_t>(begin), static_cast<std::size_t>(at - begin));
+    }
+    return result;
 }
 
 int DisplayWidth(std::string_view text)
@@ -111,7 +114,7 @@ void TextTable::AddRow(std::vector<TableCell> cells)
 {
     KORVANE_ASSERT(cells.size() == m_Columns.size());
     for (TableCell & cell : cells) {
-        cell.m_Text = Harmless(std::move(cell.m_Text));
+        cell.m_Text = Harmless(cell.m_Text);
     }
     m_Rows.push_back(std::move(cells));
 }

@@ -11,6 +11,9 @@ namespace App
 /// for pictograms (UAX #11). The text is UTF-8; bytes that are not count one each.
 [[nodiscard]] int DisplayWidth(std::string_view text);
 
+/// The text with "?" in place of what a terminal would obey and of line ends: file names may hold anything.
+[[nodiscard]] std::string Harmless(std::string_view text);
+
 /// The text cut to `width` columns, with an ellipsis in place of what is gone. A mark stays with its letter.
 [[nodiscard]] std::string CutToWidth(std::string_view text, int width);
 

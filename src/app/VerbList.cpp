@@ -2,10 +2,44 @@
 
 #include "import/Text.h"
 
+#include <algorithm>
+#include <charconv>
+#include <limits>
+
 namespace App
 {
 
 using Import::Text;
+
+std::function<std::string(std::string const &)> NumberBetween(long long least, long long most)
+{
+    return [least, most](std::string const & text) {
+        long long number = 0;
+        auto const [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+        bool const isGood =
+            std::errc() == error && text.data() + text.size() == end && least <= number && number <= most;
+        if (isGood) {
+            return std::string();
+        }
+        return std::numeric_limits<long long>::max() == most
+                   ? Text("\"%1\" is no whole number from %2 on.", "Wrong use", text, least)
+                   : Text("\"%1\" is no whole number from %2 to %3.", "Wrong use", text, least, most);
+    };
+}
+
+std::function<std::string(std::string const &)> OneOfWords(std::vector<std::string> words)
+{
+    return [words = std::move(words)](std::string const & text) {
+        if (words.end() != std::find(words.begin(), words.end(), text)) {
+            return std::string();
+        }
+        std::string known;
+        for (std::string const & word : words) {
+            known += (known.empty() ? "" : ", ") + word;
+        }
+        return Text("\"%1\" is not one of %2.", "Wrong use", text, known);
+    };
+}
 
 VerbList::VerbList(CLI::App & program) : m_Program(program)
 {
@@ -77,7 +111,22 @@ void VerbList::AddFixedTime(CLI::App & verb, long long & time)
                     Text("Seconds since 1970 that stand for now in the output, for files that are the same to the byte",
                          "Help"))
         ->type_name(Text("SECONDS", "Help"))
-        ->check(CLI::NonNegativeNumber);
+        ->check(NumberBetween(0, std::numeric_limits<long long>::max()));
+}
+
+void VerbList::RefuseEmptyValues()
+{
+    for (CLI::App * const verb : m_Program.get_subcommands({})) {
+        for (CLI::Option * const option : verb->get_options()) {
+            // The values of settings have checks of their own: some may be empty.
+            bool const isSwitch = 0 == option->get_items_expected_max();
+            if (!isSwitch && ("set" != verb->get_name() || option->get_positional())) {
+                option->check([](std::string const & text) {
+                    return text.empty() ? Text("This needs a value that is not empty.", "Wrong use") : std::string();
+                });
+            }
+        }
+    }
 }
 
 int VerbList::RunParsed(VerbContext & context) const

@@ -8,6 +8,11 @@
 namespace App
 {
 
+/// Check for an option that takes whole numbers.
+[[nodiscard]] std::function<std::string(std::string const &)> NumberBetween(long long least, long long most);
+/// Check for an option that takes one of a few words.
+[[nodiscard]] std::function<std::string(std::string const &)> OneOfWords(std::vector<std::string> words);
+
 /// The verbs as the command line knows them. Each verb's source adds its own, with its options; what the options say
 /// lies in a value that the verb's runner holds.
 class VerbList
@@ -25,6 +30,9 @@ public:
     void AddPasswords(CLI::App & verb);
     /// Option for the moment that stands for now in the output; `time` stays as it is without it.
     void AddFixedTime(CLI::App & verb, long long & time);
+
+    /// Makes an empty value wrong use, wherever it would stand for a name: scripts give one where a variable has no value.
+    void RefuseEmptyValues();
 
     /// Runs the verb that the arguments named.
     int RunParsed(VerbContext & context) const;

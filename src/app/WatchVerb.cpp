@@ -1,18 +1,16 @@
-#include "app/BookFileLock.h"
 #include "app/BookWatch.h"
+#include "app/FileCheck.h"
 #include "app/Interruption.h"
 #include "app/Json.h"
 #include "app/VerbList.h"
 #include "import/Text.h"
 
 #include <chrono>
-#include <filesystem>
 #include <thread>
 
 namespace App
 {
 
-namespace fs = std::filesystem;
 using Import::Text;
 
 namespace
@@ -31,21 +29,14 @@ int RunWatch(VerbContext & context, WatchOptions const & options)
 {
     Import::MessageList messages;
     Console & console = context.m_Console;
-    std::error_code error;
-    fs::path const book = fs::absolute(options.m_Book, error).lexically_normal();
     BookFileLock lock;
-    std::string problem;
-    if (!fs::is_regular_file(book, error)) {
-        messages.Error("book-missing", {options.m_Book}, Text("There is no such book file.", "Program"));
-    } else if (!lock.Take(book, problem)) {
-        messages.Error("book-locked", {options.m_Book}, problem);
-    } else {
+    if (auto const book = LockBook(options.m_Book, lock, messages)) {
         Listener listener(console, context.m_Ask, context.m_Answers);
         BookSession session(console, listener);
-        if (session.Open(book.string(), messages)) {
+        if (session.Open(book->string(), messages)) {
             BookWatch watch(console, session, listener, options.m_Renumbers);
             watch.Begin();
-            while (!Interruption::IsRaised()) {
+            while (!Interruption::IsRaised() && !console.HasReaderGone()) {
                 watch.Look();
                 std::this_thread::sleep_for(g_Interval);
             }

@@ -1,5 +1,7 @@
 #include "ProgramTest.h"
 
+#include "support/PdfProbe.h"
+
 class BuildVerbTest : public ProgramTest
 {
 };
@@ -176,4 +178,28 @@ TEST_F(BuildVerbTest, InterruptingLeavesNothingHalfWritten)
         std::string const extension = entry.path().extension().string();
         EXPECT_TRUE(".kvdoc" == extension || ".kvbook" == extension || ".json" == extension) << entry.path();
     }
+}
+
+TEST_F(BuildVerbTest, ARunningHeadIsCutAtTheWordThatNoLongerFitsHoweverLongTheTitle)
+{
+    WriteBook(1);
+    auto const headOf = [&](std::string const & title) {
+        Write("book/book.toml", "title-page = false\ntitle = \"" + title + "\"\n");
+        EXPECT_EQ(Run({"build", "@book", "-o", "@out.pdf"}).m_Code, 0);
+        std::string const text = PdfProbe(String((m_Folder / "out.pdf").string())).Text(2);
+        return text.substr(0, text.find('\n'));
+    };
+    std::string words;
+    std::string few;
+    for (int word = 1; word <= 20'000; ++word) {
+        words += "w" + std::to_string(word) + " ";
+        few = 60 == word ? words : few;
+    }
+    std::string const head = headOf(few + "end");
+    EXPECT_TRUE(head.starts_with("w1 w2 w3 ")) << head;
+    EXPECT_TRUE(head.ends_with("\u2026")) << head;
+    EXPECT_EQ(headOf(words + "end"), head);
+    std::string const word = headOf(std::string(20'000, 'x'));
+    EXPECT_TRUE(word.starts_with("xx") && word.ends_with("\u2026")) << word;
+    EXPECT_EQ(headOf("A short one"), "A short one");
 }

@@ -1,4 +1,5 @@
 #include "app/Console.h"
+#include "app/TextTable.h"
 
 #include <gtest/gtest.h>
 
@@ -19,4 +20,19 @@ TEST(ConsoleTest, NoBarIsDrawnOverAQuestion)
     }
     console.Progress("Importing", 0.75);
     EXPECT_NE(err.str().find("75%"), std::string::npos) << "it goes on afterwards";
+}
+
+TEST(ConsoleTest, ABarKeepsToItsLine)
+{
+    for (int const columns : {8, 20, 30, 80}) {
+        for (std::string const step : {"Export", "Kapitel werden eingelesen"}) {
+            std::ostringstream out;
+            std::ostringstream err;
+            App::Console console(out, err, {}, {.m_HasProgress = true, .m_ProgressColumns = columns});
+            console.Progress(step, 1);
+            std::string const bar = err.str().substr(std::string_view("\r\x1b[K").size());
+            EXPECT_LT(App::DisplayWidth(bar), columns) << bar;
+            EXPECT_TRUE(bar.ends_with(" 100%") || bar.ends_with("] 100%")) << bar;
+        }
+    }
 }

@@ -3,9 +3,11 @@
 #include "app/Verbs.h"
 #include "framework/render/Qpdf.h"
 
+#include <cstdio>
 #include <cstdlib>
 #include <fstream>
 #include <sstream>
+#include <sys/wait.h>
 #include <unistd.h>
 
 namespace fs = std::filesystem;
@@ -48,6 +50,23 @@ nlohmann::json ProgramTest::RunJson(std::vector<std::string> arguments, int * co
     nlohmann::json json = nlohmann::json::parse(outcome.m_Out, nullptr, false);
     EXPECT_FALSE(json.is_discarded()) << outcome.m_Out << outcome.m_Err;
     return json;
+}
+
+ProgramTest::Outcome ProgramTest::Shell(std::string const & command)
+{
+    std::string quoted;
+    for (char const c : command) {
+        quoted += '\'' == c ? std::string("'\\''") : std::string(1, c);
+    }
+    Outcome outcome;
+    FILE * const pipe = popen(("exec bash -c '" + quoted + "' 2>&1").c_str(), "r");
+    char buffer[4096];
+    while (std::size_t const count = fread(buffer, 1, sizeof buffer, pipe)) {
+        outcome.m_Out.append(buffer, count);
+    }
+    int const status = pclose(pipe);
+    outcome.m_Code = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return outcome;
 }
 
 void ProgramTest::Write(std::string const & name, std::string const & text) const

@@ -29,6 +29,11 @@ protected:
     /// Runs it with --json, and gives what it printed; null with a failure if that is no JSON.
     nlohmann::json RunJson(std::vector<std::string> arguments, int * code = nullptr) const;
 
+    /// Runs a line of bash; both of its streams are the outcome's output.
+    static Outcome Shell(std::string const & command);
+    /// What calls the real program in such a line.
+    static constexpr char const * g_Program = KORVANE_BINARY_FOLDER "/src/app/korvane";
+
     void Write(std::string const & name, std::string const & text) const;
     [[nodiscard]] std::string Read(std::string const & name) const;
     [[nodiscard]] bool Exists(std::string const & name) const { return std::filesystem::exists(m_Folder / name); }

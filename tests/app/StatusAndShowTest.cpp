@@ -118,7 +118,7 @@ TEST_F(StatusAndShowTest, ShowWritesThePreviewOfABookAndOfADocument)
     int code = 0;
     auto const failed = RunJson({"show", "@book/.korvane/book.kvbook", "--thumbnail", "@no folder/out.png"}, &code);
     EXPECT_EQ(code, 1);
-    EXPECT_EQ(failed["messages"][0]["kind"], "preview-unwritten");
+    EXPECT_EQ(failed["messages"][0]["kind"], "folder-missing");
     ASSERT_EQ(Run({"new", "@empty.kvbook"}).m_Code, 0);
     auto const empty = RunJson({"show", "@empty.kvbook", "--thumbnail", "@out.png"}, &code);
     EXPECT_EQ(code, 1);

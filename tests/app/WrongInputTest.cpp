@@ -112,8 +112,14 @@ TEST_F(WrongInputTest, WrongUseIsToldFromFailure)
         char const * m_Text;
     };
     for (auto const & [arguments, code, text] : {
-             Use{{}, 2, "subcommand"},
-             Use{{"bind"}, 2, ""},
+             Use{{}, 2, "korvane build FOLDER"},
+             Use{{"bind"}, 2, "no verb \"bind\""},
+             Use{{"build", "@", "-o", ""}, 2, "--output"},
+             Use{{"build", "@", "--password-file", "@"}, 2, "can't be read"},
+             Use{{"build", "@", "--password-file", "/dev/zero"}, 2, "larger"},
+             Use{{"status", ""}, 2, "BOOK"},
+             Use{{"status", "@"}, 1, "This is a folder"},
+             Use{{"export", "/dev/null", "-o", "@x.pdf"}, 1, "device"},
              Use{{"build"}, 2, "FOLDER"},
              Use{{"build", "@", "--colour"}, 2, "--colour"},
              Use{{"export", "x.kvbook"}, 2, "--output"},
@@ -157,6 +163,69 @@ TEST_F(WrongInputTest, ForeignAndDamagedFilesAreRefused)
     }
 }
 
+TEST_F(WrongInputTest, NoOutputReplacesWhatIsNoOutput)
+{
+    WriteBook(1);
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    std::string const book = "@book/.korvane/book.kvbook";
+    std::vector<std::vector<std::string>> const writers{{"build", "@book", "--force", "-o"},
+                                                        {"export", book, "-o"},
+                                                        {"print", book, "-o"},
+                                                        {"print", book, "--preview"},
+                                                        {"show", book, "--thumbnail"}};
+    for (std::string const target : {"book/1.md", "book/.korvane/1.kvdoc", "book/.korvane/book.kvbook"}) {
+        std::string const before = Read(target);
+        for (std::vector<std::string> arguments : writers) {
+            arguments.push_back("@" + target);
+            auto const outcome = Run(arguments);
+            EXPECT_EQ(outcome.m_Code, 1) << arguments[0] << " " << target;
+            EXPECT_NE(outcome.m_Err.find("not replaced"), std::string::npos) << outcome.m_Err;
+            EXPECT_EQ(Read(target), before) << arguments[0] << " " << target;
+        }
+    }
+    // What a verb wrote before, it may write again; so may it what only has the name.
+    Write("old.pdf", "old");
+    EXPECT_EQ(Run({"export", book, "-o", "@old.pdf"}).m_Code, 0);
+    std::filesystem::rename(m_Folder / "old.pdf", m_Folder / "old");
+    EXPECT_EQ(Run({"export", book, "-o", "@old"}).m_Code, 0);
+
+    // The book's own PDF has the name of a drawing that it places.
+    std::filesystem::copy_file(m_Folder / "old", m_Folder / "book/book.pdf",
+                               std::filesystem::copy_options::overwrite_existing);
+    std::string const drawing = Read("book/book.pdf");
+    Write("book/1.md", "# A\n\n![The plan](book.pdf)\n");
+    auto const outcome = Run({"build", "@book"});
+    EXPECT_EQ(outcome.m_Code, 1);
+    EXPECT_NE(outcome.m_Err.find("places this file"), std::string::npos) << outcome.m_Err;
+    EXPECT_EQ(Read("book/book.pdf"), drawing);
+}
+
+TEST_F(WrongInputTest, SourcesWithoutAnEndOrAPlaceAreRefusedAtOnce)
+{
+    Write("book/a.md", "# A");
+    ASSERT_EQ(mkfifo((m_Folder / "book/b.md").c_str(), 0600), 0);
+    std::filesystem::create_symlink("/dev/zero", m_Folder / "book/c.md");
+    std::filesystem::create_symlink("d.md", m_Folder / "book/d.md");
+    auto const outcome = Run({"build", "@book"});
+    EXPECT_EQ(outcome.m_Code, 1);
+    for (char const * text :
+         {"b.md: error: This is a device or a pipe", "c.md: error: This is a device or a pipe", "d.md: error: "}) {
+        EXPECT_NE(outcome.m_Err.find(text), std::string::npos) << text << " is not in\n" << outcome.m_Err;
+    }
+    EXPECT_EQ(outcome.m_Err.find("Unexpected"), std::string::npos) << outcome.m_Err;
+}
+
+TEST_F(WrongInputTest, NoNameOfAFileCommandsTheTerminal)
+{
+    Write("book/\x1b]0;x\x07.md", "# A\n\n[x](gone\x1b[2J.md) \xC2\x9B" "31m\n");
+    auto const outcome = Run({"build", "@book", "-o", "@\x1b[8m.pdf"});
+    EXPECT_EQ(outcome.m_Code, 0) << outcome.m_Err;
+    for (std::string const & text : {outcome.m_Out, outcome.m_Err}) {
+        EXPECT_EQ(text.find_first_of("\x1b\x07"), std::string::npos) << text;
+        EXPECT_EQ(text.find("\xC2\x9B"), std::string::npos) << text;
+    }
+}
+
 TEST_F(WrongInputTest, AFolderThatMayNotBeWrittenLeavesTheTargetAlone)
 {
     if (RanAsOrdinaryUser()) {
@@ -187,7 +256,7 @@ TEST_F(WrongInputTest, APdfThatCannotBeWrittenIsToldWithItsCauseAndRemedy)
         std::vector<char const *> m_Said;
     };
     for (FailureCase const & row : std::vector<FailureCase>{
-             {"@folder", nullptr, {"is a folder, not a file"}},
+             {"@folder", nullptr, {"is a folder"}},
              {"/dev/full", nullptr, {"No space left"}},
              {"@out.pdf", ".out.pdf-", {"out.pdf", "No space left"}},
              {"@out.pdf", "/korvane-", {"out.pdf", "No space left", "TMPDIR"}},
@@ -241,6 +310,30 @@ TEST_F(WrongInputTest, WhatNoFontHasIsToldWithItsPageWhereverItIsWritten)
         std::size_t const at = outcome.m_Err.find("a character that no installed font contains. This is on page ");
         EXPECT_NE(at, std::string::npos) << arguments[0] << ": " << outcome.m_Err;
     }
+}
+
+TEST_F(WrongInputTest, ABookInAFolderThatMayNotBeWrittenCanBeReadAndPutOut)
+{
+    if (RanAsOrdinaryUser()) {
+        return;
+    }
+    WriteBook(1);
+    ASSERT_EQ(Run({"build", "@book"}).m_Code, 0);
+    std::filesystem::path const work = m_Folder / "book/.korvane";
+    chmod(work.c_str(), 0555);
+    chmod((work / "1.kvdoc").c_str(), 0);
+    auto const shut = Run({"show", "@book/.korvane/1.kvdoc"});
+    EXPECT_EQ(shut.m_Code, 1);
+    EXPECT_NE(shut.m_Err.find("permission"), std::string::npos) << shut.m_Err;
+    chmod((work / "1.kvdoc").c_str(), 0444);
+    std::string const book = "@book/.korvane/book.kvbook";
+    for (std::vector<std::string> const & arguments :
+         {std::vector<std::string>{"status", book}, {"preflight", book}, {"plan", book},
+          {"export", book, "--no-update", "-o", "@a.pdf"}, {"print", book, "--no-update", "-o", "@b.pdf"}}) {
+        auto const outcome = Run(arguments);
+        EXPECT_EQ(outcome.m_Code, 0) << arguments[0] << ": " << outcome.m_Err;
+    }
+    chmod(work.c_str(), 0755);
 }
 
 TEST_F(WrongInputTest, ASecondProgramIsToldWhoHasTheBook)
