@@ -5,6 +5,7 @@
 #include "framework/document/SpreadNode.h"
 #include "framework/document/TextFlow.h"
 #include "framework/kernel/FileSystem.h"
+#include "framework/render/SvgReader.h"
 #include "framework/typeset/FontLibrary.h"
 #include "support/DocumentBuilder.h"
 #include "support/DrawingBuilder.h"
@@ -241,6 +242,24 @@ TEST_F(PackageResourcesTest, AnSvgGoesWithTheFilesThatItShows)
     EXPECT_THAT(NamesIn(folder), ElementsAre("below", "draw.svg", "inner & co.png", "pattern.svg"));
     EXPECT_THAT(NamesIn(folder + "/below"), ElementsAre("deeper.svg", "deepest.png"));
     EXPECT_EQ(copy->GetPictures().FindEntry(id)->m_SourcePath, folder + "/draw.svg");
+}
+
+TEST_F(PackageResourcesTest, ADrawingThatIsCutOffOrAllLinksIsLookedAtInOneWalk)
+{
+    using Renderer::RenderTree::FindSvgLinks;
+    std::string const whole = "<image href = \"a&amp;b.png\"/><rect fill='url( \"c%20d.svg#e\" )'/>";
+    for (std::size_t length = 0; length < whole.size(); ++length) {
+        EXPECT_LE(FindSvgLinks(*ToBytes(whole.substr(0, length))).size(), 2U);
+    }
+    EXPECT_THAT(FindSvgLinks(*ToBytes(whole)), ElementsAre("a&b.png", "c d.svg"));
+    std::string open;
+    std::string many;
+    for (int i = 0; i < 400'000; ++i) {
+        open += "url(href=\"";
+        many += "href='" + std::to_string(i) + "'";
+    }
+    EXPECT_LE(FindSvgLinks(*ToBytes(open)).size(), 1U);
+    EXPECT_EQ(FindSvgLinks(*ToBytes(many)).size(), 1000U);
 }
 
 TEST_F(PackageResourcesTest, NamesThatAreOneOnOtherSystemsTakeNumbers)

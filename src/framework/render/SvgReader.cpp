@@ -170,11 +170,22 @@ Kernel::Counted<Raster::DynamicBitmap const> DrawSvg(std::vector<unsigned char> 
 
 std::vector<String> FindSvgLinks(std::vector<unsigned char> const & bytes)
 {
+    // What is longer is no path, and no drawing is made of more files: a hostile one costs one walk over its text.
+    constexpr std::size_t LongestAddress = 4096;
+    constexpr std::size_t MostLinks = 1000;
     constexpr std::string_view Blanks = " \t\r\n";
     std::string_view const text(reinterpret_cast<char const *>(bytes.data()), bytes.size());
     std::vector<String> links;
-    auto const add = [&links](std::string_view address) {
-        String link = FileOfAddress(address);
+    auto const addUpTo = [&](std::size_t begin, char end) {
+        std::string_view address = text.substr(begin, LongestAddress);
+        std::size_t const length = address.find(end);
+        if (length == std::string_view::npos || links.size() == MostLinks) {
+            return;
+        }
+        constexpr std::string_view Around = " \t\r\n\"'";
+        address = address.substr(0, length);
+        address.remove_prefix(std::min(address.find_first_not_of(Around), address.size()));
+        String link = FileOfAddress(address.substr(0, address.find_last_not_of(Around) + 1));
         if (!link.Empty() && std::find(links.begin(), links.end(), link) == links.end()) {
             links.push_back(std::move(link));
         }
@@ -188,21 +199,15 @@ std::vector<String> FindSvgLinks(std::vector<unsigned char> const & bytes)
             continue;
         }
         at = skipBlanks(at + 1);
-        std::size_t const end =
-            at < text.size() && ('"' == text[at] || '\'' == text[at]) ? text.find(text[at], at + 1) : text.npos;
-        if (end != text.npos) {
-            add(text.substr(at + 1, end - at - 1));
-            at = end;
+        if (at < text.size() && ('"' == text[at] || '\'' == text[at])) {
+            addUpTo(at + 1, text[at]);
         }
     }
     // `url(address)` in styles.
     constexpr std::string_view Function = "url(";
     for (std::size_t at = text.find(Function); at != std::string_view::npos; at = text.find(Function, at)) {
         at += Function.size();
-        std::string_view address = text.substr(at, text.find(')', at) - at);
-        constexpr std::string_view Around = " \t\r\n\"'";
-        address.remove_prefix(std::min(address.find_first_not_of(Around), address.size()));
-        add(address.substr(0, address.find_last_not_of(Around) + 1));
+        addUpTo(at, ')');
     }
     return links;
 }
