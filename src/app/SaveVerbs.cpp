@@ -90,9 +90,9 @@ public:
             return false;
         }
         if (fs::exists(fs::symlink_status(m_Work, error))) {
-            messages.Error("target-exists", {m_Work.string()},
-                           Text("This is in the way. If it is what an earlier run has left that was broken off, remove it.",
-                                "Program"));
+            messages.Error(
+                "target-exists", {m_Work.string()},
+                Text("This is in the way. If it is what an earlier run has left that was broken off, remove it.", "Program"));
             return false;
         }
         m_IsMade = fs::create_directory(m_Work, error);

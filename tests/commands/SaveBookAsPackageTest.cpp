@@ -241,7 +241,7 @@ TEST_F(SaveBookAsPackageTest, AChapterThatFailsKeepsItsPathAndIsToldOf)
 
 TEST_F(SaveBookAsPackageTest, AnyNameOfAChapterIsOneThere)
 {
-    // As chapters in folders of their own, one of them below the package's folder, and one that is a picture's folder's name.
+    // Chapters in folders of their own, one of them below the package's folder, and one of the name of a folder in it.
     std::vector<String> const sources{Write("a/ein kapitel \u00FC", {}), Write("b/two\nlines", {}), Write("c/v1.2", {}),
                                       Write("d/", {}), Write("e/Pictures", {}), Write("f/whole.kvbook", {})};
     FileSystem::CreateFolders(m_Target / "package/chapters");

@@ -229,7 +229,8 @@ TEST_F(SaveFailureTest, ARealDiskThatIsFullOrReadOnlyKeepsTheOldBook)
     noise->Create(100, 100, Raster::Format::Rgba8, Raster::MipmapMode::OnDemand, Raster::HardwareCachePolicy::Default);
     std::minstd_rand random(20261121);
     for (int y = 0; y < noise->GetHeight(); ++y) {
-        std::generate_n(noise->GetRow(y), noise->GetRowBytes(), [&random] { return static_cast<std::uint8_t>(random()); });
+        std::generate_n(noise->GetRow(y), noise->GetRowBytes(),
+                        [&random] { return static_cast<std::uint8_t>(random()); });
     }
     struct Row
     {

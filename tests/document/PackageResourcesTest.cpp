@@ -267,8 +267,10 @@ TEST_F(PackageResourcesTest, NamesThatAreOneOnOtherSystemsTakeNumbers)
     DocumentBuilder builder;
     int shade = 0;
     // The last two are one word, with its accent as one character and as two.
-    for (char const * const name : {"a/Dot.svg", "b/dot.SVG", "c/\u00C9t\u00E9.svg", "d/\u00E9te\u0301.svg", "e/.svg"}) {
-        builder.Picture(TakeIn(builder, name, SvgWith("<rect width='" + std::to_string(++shade) + "' height='9'/>")), 9, 9);
+    for (char const * const name :
+         {"a/Dot.svg", "b/dot.SVG", "c/\u00C9t\u00E9.svg", "d/\u00E9te\u0301.svg", "e/.svg"}) {
+        auto const drawing = SvgWith("<rect width='" + std::to_string(++shade) + "' height='9'/>");
+        builder.Picture(TakeIn(builder, name, drawing), 9, 9);
     }
     auto const copy = Package(builder.Build());
     ASSERT_TRUE(copy);

@@ -183,8 +183,8 @@ TEST_F(ExportBookCommandTest, OpenChaptersHoldStillForItAndAreLetGoHoweverItEnds
         EXPECT_EQ(free, 0) << static_cast<int>(end) << ": nothing is written of a document that may change";
         EXPECT_FALSE(document->IsBookLockEngaged()) << static_cast<int>(end);
     }
-    application.EnqueueCommandAndWait(
-        Kernel::MakeCounted<CloseDocumentCommand>(Kernel::Counted<DocumentController const>(document), nullptr, false, false));
+    Kernel::Counted<DocumentController const> const closing = document;
+    application.EnqueueCommandAndWait(Kernel::MakeCounted<CloseDocumentCommand>(closing, nullptr, false, false));
 }
 
 /// Files of the folder, and the temporary files that were made, are told apart by a part of their path; "" stands for data

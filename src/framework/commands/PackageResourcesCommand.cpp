@@ -48,7 +48,7 @@ public:
 private:
     void OnPicture(PictureNode & node)
     {
-        // One that carries the password for a picture of the text has that one's id: the document holds the file itself.
+        // One that carries the password for a picture of the text has that one's id: the document holds the file.
         if (!m_Pictures.FindEntry(node.GetGUID())) {
             m_Files.push_back(node.GetPath());
         }
@@ -191,7 +191,8 @@ void PackageResourcesCommand::CollectPicture(PackageManagerInfo::Picture const &
         TellUnreadPicture(picture.m_Path);
         return;
     }
-    std::vector<PackageFolder::File> const files = GatherDrawing({NameOf(picture.m_Path, "picture"), bytes}, picture.m_Path);
+    std::vector<PackageFolder::File> const files =
+        GatherDrawing({NameOf(picture.m_Path, "picture"), bytes}, picture.m_Path);
     String problem;
     String const name = files.size() == 1 ? m_Pictures.Put(files.front().m_Name, *bytes, problem)
                                           : m_Pictures.PutTogether(files, problem);
@@ -269,7 +270,8 @@ void PackageResourcesCommand::CollectFont(PackageManagerInfo::Font const & font)
     Raster::PictureProblem unread;
     Raster::Picture::Bytes const bytes = Raster::ReadPictureFile(font.m_Path, unread);
     String problem = Kernel::Format(
-        Kernel::LocalisedString("The font file \"%1\" can't be read, so it was not collected.", "Package"), font.m_Path);
+        Kernel::LocalisedString("The font file \"%1\" can't be read, so it was not collected.", "Package"),
+        font.m_Path);
     if (!bytes || m_Fonts.Put(NameOf(font.m_Path, "font"), *bytes, problem).Empty()) {
         m_Problems.push_back(problem);
     }

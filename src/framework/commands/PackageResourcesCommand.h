@@ -9,10 +9,12 @@
 /// Collects copies of what a document needs beside its own file in a folder: pictures in "Pictures", fonts in "Fonts".
 /// Both are made as needed; the folder itself must be there. The document stays as it is.
 ///
-/// A file of another content that has the name already keeps it, and the new one takes a number. An SVG that shows other
-/// files goes into a folder of its own in "Pictures", with these in their places beside it. A font goes along only if its
-/// embedding flag (OS/2 fsType) lets others edit with it: those for viewing and printing alone, and restricted ones, stay
-/// behind. A missing font is told of, and the one that stands in for it goes along, so that the pages stay as they are.
+/// A file of another content that has the name already keeps it, and the new one takes a number. An SVG that shows
+/// other files goes into a folder of its own in "Pictures", with these in their places beside it.
+///
+/// A font goes along only if its embedding flag (OS/2 fsType) lets others edit with it: those for viewing and printing
+/// alone, and restricted ones, stay behind. A missing font is told of, and the one that stands in for it goes along, so
+/// that the pages stay as they are.
 class PackageResourcesCommand : public PassingDocumentCommand
 {
 public:

@@ -91,7 +91,8 @@ String FileOfAddress(std::string_view address)
     }
     std::unique_ptr<char, decltype(&g_free)> const name(g_uri_unescape_string(plain.c_str(), nullptr), &g_free);
     std::string_view const way(name ? name.get() : "");
-    bool const isBeside = !way.starts_with('/') && !way.starts_with("../") && way.find("/../") == std::string_view::npos;
+    bool const isBeside =
+        !way.starts_with('/') && !way.starts_with("../") && way.find("/../") == std::string_view::npos;
     return isBeside ? String(way) : String();
 }
 

@@ -28,8 +28,8 @@ namespace Renderer::RenderTree
                                                                    String const & path, int width, int height,
                                                                    Raster::PictureProblem & problem);
 
-/// The files that an SVG may show beside what it holds itself: their ways from its own folder, each once. Only what may be
-/// read, which is in that folder or below; whether there is such a file is not asked.
+/// The files that an SVG may show beside what it holds itself: their ways from its own folder, each once. Only what may
+/// be read, which is in that folder or below; whether there is such a file is not asked.
 [[nodiscard]] std::vector<String> FindSvgLinks(std::vector<unsigned char> const & bytes);
 
 }
