@@ -113,6 +113,8 @@ protected:
                              Kernel::Consolidated<Renderer::FileExportOptions>(std::move(options)),
                              Kernel::Size{}, false, false, false, false, nullptr));
         m_Builder.CloseBook(book);
+        // A pass may still hold a file that the next book is to have at the same place.
+        BookBuilder::Rest();
         return m_Target;
     }
 
