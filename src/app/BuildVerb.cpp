@@ -122,8 +122,8 @@ private:
         importer.SetPasswords([this](std::string const & path, bool isWrong) {
             return m_Context.m_Answers.m_Passwords->Find(path, isWrong);
         });
-        if (!m_Options.m_IsForced && !m_Messages.HasErrors() && importer.IsEverythingCurrent(m_Messages) &&
-            IsOutputCurrent(importer.State())) {
+        if (!m_Options.m_IsForced && !m_Messages.HasErrors() && IsOutputCurrent(importer.State()) &&
+            importer.IsEverythingCurrent(m_Messages)) {
             m_IsUpToDate = true;
             m_Pages = importer.State().m_Pages;
             return true;

@@ -24,6 +24,15 @@ TEST_F(BuildVerbTest, AFolderBecomesABookAndASecondRunHasNothingToDo)
     EXPECT_EQ(Read("out.pdf"), pdf);
 }
 
+TEST_F(BuildVerbTest, EachBuildTellsEveryFindingOnce)
+{
+    WriteBook(1);
+    Write("book/1.md", "# One\n\n![gone](gone.png)\n");
+    for (char const * const output : {"@a.pdf", "@a.pdf", "@b.pdf"}) {
+        EXPECT_EQ(RunJson({"build", "@book", "-o", output})["messages"].size(), 1u) << output;
+    }
+}
+
 TEST_F(BuildVerbTest, OnlyWhatChangedIsMadeAnewAndNumbersFollow)
 {
     WriteBook(3);
