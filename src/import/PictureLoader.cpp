@@ -69,18 +69,20 @@ PictureLoader::Loaded PictureLoader::Read(std::string const & path, Picture cons
                 0,
                 Kernel::LocalisedString("The picture %1 is on the web; save it beside the chapter", "Source"),
                 "picture-remote",
+                {},
                 {}};
     }
     KnownFile & known = m_Known[path];
     known.m_Stamp = FileStamp::Of(path);
     if (!known.m_Stamp.Exists()) {
-        return {"", 0, 0, Kernel::LocalisedString("The picture %1 is missing", "Source"), "picture-missing", {}};
+        return {"", 0, 0, Kernel::LocalisedString("The picture %1 is missing", "Source"), "picture-missing", {}, {}};
     }
     std::ifstream stream(path, std::ios::binary);
     auto const bytes = std::make_shared<std::vector<unsigned char>>(static_cast<std::size_t>(known.m_Stamp.m_Size));
     stream.read(reinterpret_cast<char *>(bytes->data()), known.m_Stamp.m_Size);
     if (!stream || stream.gcount() != known.m_Stamp.m_Size) {
-        return {"", 0, 0, Kernel::LocalisedString("The picture %1 cannot be read", "Source"), "picture-unreadable", {}};
+        return {"", 0, 0, Kernel::LocalisedString("The picture %1 cannot be read", "Source"), "picture-unreadable",
+                {}, {}};
     }
     known.m_Hash = HashBytes({reinterpret_cast<char const *>(bytes->data()), bytes->size()});
     return PlacedDrawing::KindOf(*bytes) ? ReadDrawing(bytes, path, picture) : ReadPixels(bytes, path, picture);
@@ -121,11 +123,9 @@ PictureLoader::Loaded PictureLoader::ReadDrawing(Raster::Picture::Bytes const & 
         loaded.m_Kind = "picture-locked";
     } else {
         // The sentence names the file by its path; here the author's name for it is better.
-        std::string what = problem.m_Text.ToStd();
-        std::string const begin = "The picture " + path + " ";
-        what = what.starts_with(begin) ? what.substr(begin.size()) : what;
         loaded.m_Problem = Kernel::LocalisedString("The picture %1 cannot be placed: it %2", "Source");
-        loaded.m_Detail = what.substr(0, what.find_last_not_of('.') + 1);
+        loaded.m_What = problem.m_What;
+        loaded.m_Detail = problem.m_Detail;
         loaded.m_Kind = Code::NoSuchPage == problem.m_Code ? "picture-page" : "picture-damaged";
     }
     return loaded;
@@ -146,20 +146,22 @@ PictureLoader::Loaded PictureLoader::ReadPixels(Raster::Picture::Bytes const & b
                     Kernel::LocalisedString("The picture %1 is none of PNG, JPEG, PDF and SVG, whatever its name says",
                                             "Source"),
                     "picture-kind",
+                    {},
                     {}};
         }
         return {"",
                 0,
                 0,
-                Kernel::LocalisedString("The picture %1 cannot be used (%2)", "Source"),
+                Kernel::LocalisedString("The picture %1 cannot be placed: it %2", "Source"),
                 "picture-damaged",
-                problem.m_Text.ToStd()};
+                problem.m_What,
+                problem.m_Detail};
     }
     Raster::PictureInfo const & info = opened->GetInfo();
     if (!HasEnd(*bytes, info.m_Kind) && !opened->Decode(problem)) {
         return {
             "", 0, 0, Kernel::LocalisedString("The picture %1 is cut short or damaged", "Source"), "picture-damaged",
-            {}};
+            {}, {}};
     }
     std::string const promised = ".jpeg" == extension ? ".jpg" : extension;
     std::string const actual = Raster::PictureKind::Png == info.m_Kind ? ".png" : ".jpg";
@@ -196,11 +198,13 @@ Story::PictureGlyph::Fields PictureLoader::Load(Picture const & picture)
     if (!loaded.m_Problem.Empty()) {
         fields.m_IsMissing = true;
         // This goes into the document, which must not depend on who looks at it: the untranslated text.
-        fields.m_MissingReason =
-            Kernel::Format(String(loaded.m_Problem.SourceText()), picture.m_Path, loaded.m_Detail) + ".";
-        m_Messages.Warn(loaded.m_Kind, {m_ShownName, picture.m_Line},
-                        Text("%1; a marked box stands in its place.", "Source",
-                             Kernel::Format(loaded.m_Problem, picture.m_Path, loaded.m_Detail)));
+        fields.m_MissingReason = Kernel::Format(String(loaded.m_Problem.SourceText()), picture.m_Path,
+                                                Kernel::Format(String(loaded.m_What.SourceText()), loaded.m_Detail)) +
+                                 ".";
+        m_Messages.Warn(
+            loaded.m_Kind, {m_ShownName, picture.m_Line},
+            Text("%1; a marked box stands in its place.", "Source",
+                 Kernel::Format(loaded.m_Problem, picture.m_Path, Kernel::Format(loaded.m_What, loaded.m_Detail))));
     }
     return fields;
 }

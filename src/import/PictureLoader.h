@@ -40,10 +40,12 @@ private:
         std::string m_DataId;
         double m_Width = 0;
         double m_Height = 0;
-        /// Why the picture can't be shown, with %1 for its path and %2 for the detail; empty if it can.
+        /// Why the picture can't be shown, with %1 for its path and %2 for what the reader says; empty if it can.
         Kernel::LocalisedString m_Problem;
         std::string m_Kind;
-        std::string m_Detail;
+        /// What the reader says, with %1 for its detail.
+        Kernel::LocalisedString m_What;
+        String m_Detail;
     };
 
     [[nodiscard]] Loaded Read(std::string const & path, Picture const & picture);

@@ -302,8 +302,7 @@ private:
             auto const * node = reader.Find(kind);
             auto const * items = node ? node->as_array() : nullptr;
             if (node && !items) {
-                reader.Refuse(*node, kind,
-                              std::string("a list of tables, written [[master.") + name + "." + kind + "]]");
+                reader.Refuse(*node, kind, Text("a list of tables, written [[master.%1.%2]]", "Source", name, kind));
                 continue;
             }
             for (std::size_t at = 0; items && at < items->size(); ++at) {
@@ -311,7 +310,7 @@ private:
                     ReadItem(*item, "master." + name + "." + kind + ".", 'u' == kind[1] && 'l' == kind[2], master);
                 } else {
                     reader.Refuse(*node, kind,
-                                  std::string("a list of tables, written [[master.") + name + "." + kind + "]]");
+                                  Text("a list of tables, written [[master.%1.%2]]", "Source", name, kind));
                 }
             }
         }

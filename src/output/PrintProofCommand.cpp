@@ -1,6 +1,7 @@
 #include "output/PrintProofCommand.h"
 
 #include "framework/kernel/FileOutStream.h"
+#include "framework/kernel/LocalisedString.h"
 #include "framework/raster/PngEncoder.h"
 #include "framework/render/RasterSink.h"
 #include "framework/typeset/FontLibrary.h"
@@ -62,7 +63,7 @@ ExportResult PrintProofCommand::Begin(std::map<int, PrintedPage> const &)
 {
     Kernel::Counted<BookChapter const> const key = GetBookController()->GetKeyChapter(true);
     if (!key || GetSheets().empty()) {
-        SetError("There is no sheet to show.");
+        SetError(Kernel::LocalisedString("There is no sheet to show.", "Output"));
         return ExportResultFailed;
     }
     m_Schema = Kernel::MakeCounted<RenderTree::Schema>();
@@ -81,7 +82,7 @@ ExportResult PrintProofCommand::Begin(std::map<int, PrintedPage> const &)
     }
     double const longest = std::max(paper.width, paper.height);
     if (!(longest > 0) || !std::isfinite(longest)) {
-        SetError("The sheets have no size that could be shown.");
+        SetError(Kernel::LocalisedString("The sheets have no size that could be shown.", "Output"));
         return ExportResultFailed;
     }
     m_Scale = SideOfSheet(GetSheets().size()) / longest;

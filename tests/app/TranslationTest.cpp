@@ -86,6 +86,18 @@ TEST_F(TranslationTest, CountsValuesAndTheTextsOfTheLibrarySpeakGermanAndMachine
                                                                    << outcome.m_Out;
         }
     }
+    // What a picture's reader says is part of the sentence; the document keeps it in the language of its texts.
+    Write("pictures/p.md", "# P\n\n![](b.png)\n\n![](b.svg)\n");
+    Write("pictures/b.png", "\x89PNG\r\n\x1a\n");
+    Write("pictures/b.svg", "<svg xmlns='http://www.w3.org/2000/svg'/><");
+    auto const pictures = German("build pictures -o p.pdf").m_Out;
+    EXPECT_NE(pictures.find("Das Bild b.png kann nicht eingesetzt werden: es endet zu früh;"), std::string::npos)
+        << pictures;
+    EXPECT_NE(pictures.find("Das Bild b.svg kann nicht eingesetzt werden: es ist beschädigt ("), std::string::npos)
+        << pictures;
+    EXPECT_EQ(
+        Shell("cd '" + m_Folder.string() + "' && pdftotext p.pdf - | tr '\n' ' ' | grep -o 'it ends too early'").m_Out,
+        "it ends too early\n");
     auto const full = German("export b.kvbook --no-update -q -o /dev/full").m_Out +
                       German("print b.kvbook --no-update -q -o /dev/full").m_Out;
     EXPECT_EQ(full.find('?'), std::string::npos) << "the system's sentence has lost its umlauts: " << full;

@@ -59,7 +59,7 @@ Kernel::Counted<Raster::Picture const> DocumentPictures::Get(String const & id, 
     auto const found = m_Entries.find(id);
     if (found == m_Entries.end() || !bytes) {
         problem.m_Code = Raster::PictureProblem::Code::NotFound;
-        problem.m_Text = "The document does not hold the picture any more.";
+        problem.m_Text = Kernel::LocalisedString("The document does not hold the picture any more.", "Picture");
         return nullptr;
     }
     if (!found->second.m_Picture) {
@@ -89,7 +89,7 @@ DocumentPictures::GetDrawing(PictureReference const & reference, String const & 
     if (!source.m_Bytes) {
         problem.m_Code = Raster::PictureProblem::Code::NotFound;
         problem.m_Path = source.m_Path;
-        problem.m_Text = "The document does not hold the picture any more.";
+        problem.m_Text = Kernel::LocalisedString("The document does not hold the picture any more.", "Picture");
         return nullptr;
     }
     auto const drawing = Renderer::RenderTree::PlacedDrawing::Open(std::move(source), problem);

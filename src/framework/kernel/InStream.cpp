@@ -13,7 +13,7 @@ Counted<RawData const> InStream::ReadAll()
     std::size_t const got = Read(data->GetMutableData(), data->GetSize());
     if (got != rest) {
         throw FileIOException(FileIOException::Reason::ReadFailed, GetSourceName(),
-                              Format("%1 became shorter while it was read.", GetSourceName()));
+                              Format(LocalisedString("%1 became shorter while it was read.", "File"), GetSourceName()));
     }
     return data;
 }

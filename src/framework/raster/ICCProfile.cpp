@@ -2,6 +2,7 @@
 
 #include "framework/kernel/HashAccumulator.h"
 #include "framework/kernel/InSerialiser.h"
+#include "framework/kernel/LocalisedString.h"
 #include "framework/kernel/OutSerialiser.h"
 
 #include <lcms2.h>
@@ -45,12 +46,12 @@ bool ICCProfile::Take(std::vector<unsigned char> bytes, String & reason)
 {
     ProfileHandle const handle(cmsOpenProfileFromMem(bytes.data(), static_cast<cmsUInt32Number>(bytes.size())));
     if (!handle) {
-        reason = "The colour profile is damaged.";
+        reason = Kernel::LocalisedString("The colour profile is damaged.", "Picture");
         return false;
     }
     m_Space = SpaceOf(cmsGetColorSpace(handle.get()));
     if (m_Space == ColourSpace::None) {
-        reason = "The colour profile is not for grey, RGB, CMYK or Lab colours.";
+        reason = Kernel::LocalisedString("The colour profile is not for grey, RGB, CMYK or Lab colours.", "Picture");
         return false;
     }
     char name[256] = {};

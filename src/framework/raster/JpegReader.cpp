@@ -1,5 +1,7 @@
 #include "framework/raster/PictureReader.h"
 
+#include "framework/kernel/LocalisedString.h"
+
 #include <csetjmp>
 #include <cstdio>
 #include <cstring>
@@ -108,16 +110,16 @@ std::vector<JpegSegment> ScanJpeg(PictureBytes bytes, bool headerOnly)
     while (true) {
         std::size_t const begin = position;
         if (position + 1 >= bytes.size()) {
-            throw PictureFault{Code::Truncated, "ends too early"};
+            throw EndsTooEarly();
         }
         if (bytes[position] != 0xFF) {
-            throw PictureFault{Code::Corrupt, "is damaged: a marker is missing"};
+            throw PictureFault{Code::Corrupt, Kernel::LocalisedString("is damaged: a marker is missing", "Picture")};
         }
         while (position < bytes.size() && bytes[position] == 0xFF) {
             ++position;
         }
         if (position == bytes.size()) {
-            throw PictureFault{Code::Truncated, "ends too early"};
+            throw EndsTooEarly();
         }
         int const marker = bytes[position++];
         if (marker == EndOfImage || (marker == StartOfScan && headerOnly)) {
@@ -127,14 +129,15 @@ std::vector<JpegSegment> ScanJpeg(PictureBytes bytes, bool headerOnly)
             continue;
         }
         if (position + 2 > bytes.size()) {
-            throw PictureFault{Code::Truncated, "ends too early"};
+            throw EndsTooEarly();
         }
         std::size_t const length = ReadBig16(bytes.data() + position);
         if (length < 2) {
-            throw PictureFault{Code::Corrupt, "is damaged: a segment has no length"};
+            throw PictureFault{Code::Corrupt,
+                               Kernel::LocalisedString("is damaged: a segment has no length", "Picture")};
         }
         if (length > bytes.size() - position) {
-            throw PictureFault{Code::Truncated, "ends too early"};
+            throw EndsTooEarly();
         }
         JpegSegment segment{marker, bytes.subspan(position + 2, length - 2), begin, position + length};
         position += length;
@@ -143,11 +146,11 @@ std::vector<JpegSegment> ScanJpeg(PictureBytes bytes, bool headerOnly)
             while (true) {
                 void const * found = std::memchr(bytes.data() + position, 0xFF, bytes.size() - position);
                 if (!found) {
-                    throw PictureFault{Code::Truncated, "ends too early"};
+                    throw EndsTooEarly();
                 }
                 position = static_cast<std::size_t>(static_cast<unsigned char const *>(found) - bytes.data());
                 if (position + 1 >= bytes.size()) {
-                    throw PictureFault{Code::Truncated, "ends too early"};
+                    throw EndsTooEarly();
                 }
                 unsigned char const next = bytes[position + 1];
                 if (next != 0 && next != 0xFF && !(next >= 0xD0 && next <= 0xD7)) {
@@ -172,10 +175,12 @@ void ReadJpegInfo(std::vector<JpegSegment> const & segments, PictureInfo & info)
         // Frame headers: SOF0 to SOF15 but for DHT, JPG and DAC.
         if (marker >= 0xC0 && marker <= 0xCF && marker != 0xC4 && marker != 0xC8 && marker != 0xCC) {
             if (data.size() < 6) {
-                throw PictureFault{Code::Corrupt, "has a damaged header"};
+                throw PictureFault{Code::Corrupt, Kernel::LocalisedString("has a damaged header", "Picture")};
             }
             if (marker > 0xC2 || data[0] != 8) {
-                throw PictureFault{Code::Unsupported, "is a lossless, arithmetic or 12-bit JPEG, which is not read"};
+                throw PictureFault{
+                    Code::Unsupported,
+                    Kernel::LocalisedString("is a lossless, arithmetic or 12-bit JPEG, which is not read", "Picture")};
             }
             CheckPictureSize(ReadBig16(data.data() + 3), ReadBig16(data.data() + 1));
             info.m_Height = ReadBig16(data.data() + 1);
@@ -192,8 +197,10 @@ void ReadJpegInfo(std::vector<JpegSegment> const & segments, PictureInfo & info)
         }
     }
     if (components != 1 && components != 3 && components != 4) {
-        throw PictureFault{components == 0 ? Code::Corrupt : Code::Unsupported,
-                           components == 0 ? "has no frame header" : "has a number of colour channels that is not read"};
+        throw components == 0
+            ? PictureFault{Code::Corrupt, Kernel::LocalisedString("has no frame header", "Picture")}
+            : PictureFault{Code::Unsupported,
+                           Kernel::LocalisedString("has a number of colour channels that is not read", "Picture")};
     }
     info.m_Space = components == 1 ? ColourSpace::Grey : components == 3 ? ColourSpace::Rgb : ColourSpace::Cmyk;
     info.m_IsInverted = components == 4 && adobe;
@@ -244,7 +251,8 @@ Kernel::Counted<DynamicBitmap> DecodeJpeg(PictureBytes bytes, PictureInfo const 
     bool const read = ReadRows(jpeg, errors, bytes, info, bitmap.Get());
     jpeg_destroy_decompress(&jpeg);
     if (!read || errors.m_Damaged) {
-        throw PictureFault{Code::Corrupt, "is damaged: its pixels can't be unpacked"};
+        throw PictureFault{Code::Corrupt,
+                           Kernel::LocalisedString("is damaged: its pixels can't be unpacked", "Picture")};
     }
     return bitmap;
 }

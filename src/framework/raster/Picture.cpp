@@ -1,6 +1,8 @@
 #include "framework/raster/Picture.h"
 
 #include "framework/kernel/DiskFault.h"
+#include "framework/kernel/FileSystem.h"
+#include "framework/kernel/Format.h"
 #include "framework/raster/PictureReader.h"
 
 #include <cerrno>
@@ -25,11 +27,12 @@ constexpr std::size_t HeaderSize = std::size_t(1) << 16;
 void ReportErrno(PictureProblem & problem, String const & path, int errorNumber)
 {
     if (errorNumber == ENOENT || errorNumber == ENOTDIR) {
-        Report(problem, Code::NotFound, path, "does not exist");
+        Report(problem, Code::NotFound, path, Kernel::LocalisedString("does not exist", "Picture"));
     } else if (errorNumber == EACCES || errorNumber == EPERM) {
-        Report(problem, Code::AccessDenied, path, "may not be read");
+        Report(problem, Code::AccessDenied, path, Kernel::LocalisedString("may not be read", "Picture"));
     } else {
-        Report(problem, Code::ReadError, path, std::string("can't be read: ") + std::strerror(errorNumber));
+        Report(problem, Code::ReadError, path, Kernel::LocalisedString("can't be read: %1", "Picture"),
+               Kernel::GetSystemErrorText(errorNumber));
     }
 }
 
@@ -60,7 +63,7 @@ bool ReadFile(String const & path, std::size_t limit, std::vector<unsigned char>
         return false;
     }
     if (!S_ISREG(status.st_mode)) {
-        Report(problem, Code::UnknownKind, path, "is no file");
+        Report(problem, Code::UnknownKind, path, Kernel::LocalisedString("is no file", "Picture"));
         return false;
     }
     std::size_t const size = static_cast<std::size_t>(status.st_size);
@@ -89,7 +92,9 @@ void ReadInfo(PictureBytes bytes, PictureInfo & info)
     } else if (IsJpeg(bytes)) {
         ReadJpegInfo(ScanJpeg(bytes, true), info);
     } else {
-        throw PictureFault{Code::UnknownKind, bytes.empty() ? "is empty" : "is neither PNG nor JPEG"};
+        throw PictureFault{Code::UnknownKind, bytes.empty()
+                                                  ? Kernel::LocalisedString("is empty", "Picture")
+                                                  : Kernel::LocalisedString("is neither PNG nor JPEG", "Picture")};
     }
 }
 
@@ -134,21 +139,33 @@ Kernel::Counted<DynamicBitmap> Upright(Kernel::Counted<DynamicBitmap> const & st
 
 }
 
-void Report(PictureProblem & problem, PictureProblem::Code code, String const & path, std::string_view what)
+void Report(PictureProblem & problem, PictureProblem::Code code, String const & path,
+            Kernel::LocalisedString const & what, String const & detail)
 {
     problem.m_Code = code;
     problem.m_Path = path;
-    problem.m_Text = Kernel::ConcatString({"The picture ", path.View(), " ", what, "."});
+    problem.m_What = what;
+    problem.m_Detail = detail;
+    problem.m_Text =
+        Kernel::Format(Kernel::LocalisedString("The picture %1 %2.", "Picture"), path, Kernel::Format(what, detail));
+}
+
+void Report(PictureProblem & problem, PictureProblem::Code code, String const & path,
+            Kernel::LocalisedString const & what)
+{
+    Report(problem, code, path, what, String());
 }
 
 void CheckPictureSize(std::uint32_t width, std::uint32_t height)
 {
     if (width == 0 || height == 0) {
-        throw PictureFault{Code::Corrupt, "declares no size"};
+        throw PictureFault{Code::Corrupt, Kernel::LocalisedString("declares no size", "Picture")};
     }
     if (width > Picture::MaximumSide || height > Picture::MaximumSide ||
         static_cast<std::int64_t>(width) * height > Picture::MaximumPixels) {
-        throw PictureFault{Code::TooLarge, "is larger than 65,500 pixels on a side or 200 million in all"};
+        throw PictureFault{
+            Code::TooLarge,
+            Kernel::LocalisedString("is larger than 65,500 pixels on a side or 200 million in all", "Picture")};
     }
 }
 
@@ -221,7 +238,7 @@ Kernel::Counted<DynamicBitmap const> Picture::DecodeAsStored(PictureProblem & pr
     } catch (PictureFault const & fault) {
         Report(problem, fault.m_Code, m_Path, fault.m_What);
     } catch (std::bad_alloc const &) {
-        Report(problem, Code::TooLarge, m_Path, "needs more memory than there is");
+        Report(problem, Code::TooLarge, m_Path, Kernel::LocalisedString("needs more memory than there is", "Picture"));
     }
     return nullptr;
 }

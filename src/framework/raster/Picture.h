@@ -4,6 +4,7 @@
 #include <memory>
 #include <vector>
 
+#include "framework/kernel/LocalisedString.h"
 #include "framework/raster/DynamicBitmap.h"
 #include "framework/raster/ICCProfile.h"
 
@@ -45,10 +46,17 @@ struct PictureProblem
     String m_Path;
     /// One sentence that names the file and what is wrong with it.
     String m_Text;
+    /// The rest of that sentence behind the file's name, such as "is damaged (%1)", and its value.
+    Kernel::LocalisedString m_What;
+    String m_Detail;
 };
 
-/// Fills in a problem: `what` is the rest of a sentence that begins with the picture's name, such as "is damaged".
-void Report(PictureProblem & problem, PictureProblem::Code code, String const & path, std::string_view what);
+/// Fills in a problem: `what` is the rest of a sentence that begins with the picture's name, such as "is damaged (%1)",
+/// and `detail` what stands for %1 in it.
+void Report(PictureProblem & problem, PictureProblem::Code code, String const & path,
+            Kernel::LocalisedString const & what, String const & detail);
+void Report(PictureProblem & problem, PictureProblem::Code code, String const & path,
+            Kernel::LocalisedString const & what);
 
 /// What a picture's header says. Nothing is decoded for it.
 struct PictureInfo

@@ -14,8 +14,13 @@ struct PictureFault
 {
     PictureProblem::Code m_Code;
     /// The rest of a sentence that begins with the file's name, such as "ends too early".
-    char const * m_What;
+    Kernel::LocalisedString m_What;
 };
+
+[[nodiscard]] inline PictureFault EndsTooEarly()
+{
+    return {PictureProblem::Code::Truncated, Kernel::LocalisedString("ends too early", "Picture")};
+}
 
 using PictureBytes = std::span<unsigned char const>;
 

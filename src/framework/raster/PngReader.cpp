@@ -1,5 +1,7 @@
 #include "framework/raster/PictureReader.h"
 
+#include "framework/kernel/LocalisedString.h"
+
 #include <csetjmp>
 #include <cstring>
 #include <libdeflate.h>
@@ -80,22 +82,22 @@ std::vector<PngChunk> ScanPng(PictureBytes bytes, bool headerOnly)
     std::size_t position = sizeof(Signature);
     while (true) {
         if (bytes.size() < position + 12) {
-            throw PictureFault{Code::Truncated, "ends too early"};
+            throw EndsTooEarly();
         }
         std::uint32_t const length = ReadBig32(bytes.data() + position);
         PngChunk chunk{ReadBig32(bytes.data() + position + 4), {}};
         if (chunks.empty() && chunk.m_Type != PngType("IHDR")) {
-            throw PictureFault{Code::Corrupt, "does not begin with its header"};
+            throw PictureFault{Code::Corrupt, Kernel::LocalisedString("does not begin with its header", "Picture")};
         }
         if (headerOnly && chunk.m_Type == PngType("IDAT")) {
             return chunks;
         }
         if (length > bytes.size() - position - 12) {
-            throw PictureFault{Code::Truncated, "ends too early"};
+            throw EndsTooEarly();
         }
         std::uint32_t const sum = libdeflate_crc32(0, bytes.data() + position + 4, std::size_t(length) + 4);
         if (sum != ReadBig32(bytes.data() + position + 8 + length)) {
-            throw PictureFault{Code::Corrupt, "is damaged: a checksum is wrong"};
+            throw PictureFault{Code::Corrupt, Kernel::LocalisedString("is damaged: a checksum is wrong", "Picture")};
         }
         chunk.m_Data = bytes.subspan(position + 8, length);
         chunks.push_back(chunk);
@@ -110,7 +112,7 @@ void ReadPngInfo(std::vector<PngChunk> const & chunks, PictureInfo & info)
 {
     PictureBytes const header = chunks.front().m_Data;
     if (header.size() != 13) {
-        throw PictureFault{Code::Corrupt, "has a damaged header"};
+        throw PictureFault{Code::Corrupt, Kernel::LocalisedString("has a damaged header", "Picture")};
     }
     std::uint32_t const width = ReadBig32(header.data());
     std::uint32_t const height = ReadBig32(header.data() + 4);
@@ -124,7 +126,7 @@ void ReadPngInfo(std::vector<PngChunk> const & chunks, PictureInfo & info)
                            : type == 3 ? (header[8] & (header[8] - 1)) == 0 && header[8] >= 1 && header[8] <= 8
                                        : header[8] == 8 || header[8] == 16;
     if (type == 1 || type == 5 || type > 6 || !depthFits || header[12] > 1) {
-        throw PictureFault{Code::Corrupt, "has a damaged header"};
+        throw PictureFault{Code::Corrupt, Kernel::LocalisedString("has a damaged header", "Picture")};
     }
     info.m_BitsPerChannel = header[8] == 16 ? 16 : 8;
     info.m_Space = type == 0 || type == 4 ? ColourSpace::Grey : ColourSpace::Rgb;
@@ -182,7 +184,8 @@ Kernel::Counted<DynamicBitmap> DecodePng(PictureBytes bytes, PictureInfo const &
     }
     std::uint64_t const pixels = static_cast<std::uint64_t>(info.m_Width) * static_cast<std::uint64_t>(info.m_Height);
     if (pixels * static_cast<std::uint64_t>(info.m_StoredBits) / 8 / BestRatio > packed) {
-        throw PictureFault{Code::Truncated, "has fewer data than its size asks for"};
+        throw PictureFault{Code::Truncated,
+                           Kernel::LocalisedString("has fewer data than its size asks for", "Picture")};
     }
     bool const grey = info.m_Space == ColourSpace::Grey;
     bool const deep = info.m_BitsPerChannel == 16;
@@ -205,7 +208,8 @@ Kernel::Counted<DynamicBitmap> DecodePng(PictureBytes bytes, PictureInfo const &
     }
     png_destroy_read_struct(&png, &pngInfo, nullptr);
     if (!read) {
-        throw PictureFault{Code::Corrupt, "is damaged: its pixels can't be unpacked"};
+        throw PictureFault{Code::Corrupt,
+                           Kernel::LocalisedString("is damaged: its pixels can't be unpacked", "Picture")};
     }
     return bitmap;
 }

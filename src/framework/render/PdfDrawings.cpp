@@ -1,5 +1,6 @@
 #include "framework/render/PdfDrawings.h"
 
+#include "framework/kernel/Format.h"
 #include "framework/render/PdfForm.h"
 
 #include <algorithm>
@@ -39,7 +40,8 @@ bool PdfDrawings::FormFor(PlacedDrawing const & drawing, std::uint32_t & form)
     Known & known = place->second;
     if (isNew && !Take(drawing, known.m_Form, known.m_Problem) &&
         Raster::PictureProblem::Code::None == known.m_Problem.m_Code) {
-        Raster::Report(known.m_Problem, Raster::PictureProblem::Code::Corrupt, drawing.GetPath(), "can't be read");
+        Raster::Report(known.m_Problem, Raster::PictureProblem::Code::Corrupt, drawing.GetPath(),
+                       Kernel::LocalisedString("can't be read", "Picture"));
     }
     if (Raster::PictureProblem::Code::None != known.m_Problem.m_Code) {
         if (m_Warnings) {
@@ -98,14 +100,16 @@ bool PdfDrawings::Take(PlacedDrawing const & drawing, std::uint32_t & form, Rast
         form = static_cast<std::uint32_t>(m_Forms.size() - 1);
     } catch (std::exception const & fault) {
         Raster::Report(problem, Raster::PictureProblem::Code::Corrupt, drawing.GetPath(),
-                       std::string("is damaged (") + fault.what() + ")");
+                       Kernel::LocalisedString("is damaged (%1)", "Picture"), String(fault.what()));
         return false;
     }
     if (std::string const repaired = file->m_Source->TakeWarning(); !repaired.empty() && m_Warnings) {
-        m_Warnings->push_back({Warning::Code::PictureRepaired, m_Page, drawing.GetPath(),
-                               Kernel::ConcatString({"The picture ", drawing.GetPath().View(),
-                                                     " is damaged and was repaired (", repaired,
-                                                     "); look at it in the output."})});
+        m_Warnings->push_back(
+            {Warning::Code::PictureRepaired, m_Page, drawing.GetPath(),
+             Kernel::Format(Kernel::LocalisedString("The picture %1 is damaged and was repaired (%2); "
+                                                    "look at it in the output.",
+                                                    "Picture"),
+                            drawing.GetPath(), repaired)});
     }
     return true;
 }

@@ -1,5 +1,6 @@
 #include "framework/render/PdfFont.h"
 
+#include "framework/kernel/Format.h"
 #include "framework/kernel/HashAccumulator.h"
 #include "framework/kernel/Utf.h"
 #include "framework/render/PdfText.h"
@@ -171,7 +172,10 @@ PdfFont::Program PdfFont::MakeProgram() const
     FacePtr const source(hb_face_create(blob.get(), m_Face->GetIndex()));
     FacePtr const subset(hb_subset_or_fail(source.get(), input.get()));
     if (!subset) {
-        throw std::runtime_error("The font " + m_Face->GetPath().ToStd() + " can't be cut down to the glyphs in use.");
+        throw std::runtime_error(
+            Kernel::Format(Kernel::LocalisedString("The font %1 can't be cut down to the glyphs in use.", "Output"),
+                           m_Face->GetPath())
+                .ToStd());
     }
     program.m_IsCff = HasTable(*m_Face, HB_TAG('C', 'F', 'F', ' '));
     BlobPtr const result(program.m_IsCff ? hb_face_reference_table(subset.get(), HB_TAG('C', 'F', 'F', ' '))

@@ -1,5 +1,6 @@
 #include "framework/render/PdfPictures.h"
 
+#include "framework/kernel/Format.h"
 #include "framework/raster/ICCManager.h"
 #include "framework/raster/PictureReader.h"
 #include "framework/raster/Resample.h"
@@ -140,8 +141,8 @@ void PdfPictures::CheckResolution(Raster::Picture const & picture, Kernel::Size 
                                 info.UprightHeight() * 72 / std::max(size.height, 1e-3));
     if (least > 0 && dpi < least) {
         Warn(Warning::Code::PictureResolution, picture.GetPath(),
-             Kernel::ConcatString({"The picture ", picture.GetPath().View(), " has only ",
-                                   std::to_string(std::lround(dpi)), " pixels to the inch."}));
+             Kernel::Format(Kernel::LocalisedString("The picture %1 has only %2 pixels to the inch.", "Picture"),
+                            picture.GetPath(), std::lround(dpi)));
     }
 }
 
@@ -167,9 +168,8 @@ bool PdfPictures::FromPicture(Raster::Picture const & picture, Kernel::Size cons
     Raster::PictureInfo const & info = picture.GetInfo();
     if (info.m_WrongExtension) {
         Warn(Warning::Code::PictureWrongExtension, picture.GetPath(),
-             Kernel::ConcatString({"The picture ", picture.GetPath().View(), " is a ",
-                                   info.m_Kind == Raster::PictureKind::Png ? "PNG" : "JPEG",
-                                   " file, unlike its name."}));
+             Kernel::Format(Kernel::LocalisedString("The picture %1 is a %2 file, unlike its name.", "Picture"),
+                            picture.GetPath(), info.m_Kind == Raster::PictureKind::Png ? "PNG" : "JPEG"));
     }
     CheckResolution(picture, size);
     Raster::PictureProblem problem;
@@ -209,7 +209,8 @@ bool PdfPictures::FromBitmap(PlacedPicture const & placed, std::uint32_t & image
     bool const writable = space == Raster::ColourSpace::Grey || space == Raster::ColourSpace::Rgb ||
                           space == Raster::ColourSpace::Cmyk;
     if (!writable || bitmap.GetFormat() == Raster::Format::RgbaFloat || bitmap.GetPixels().empty()) {
-        Warn(Warning::Code::PictureMissing, String(), "A bitmap of this format can't be written to a PDF file.");
+        Warn(Warning::Code::PictureMissing, String(),
+             Kernel::LocalisedString("A bitmap of this format can't be written to a PDF file.", "Output"));
         return false;
     }
     Key const key{Kernel::HashBytes128(bitmap.GetPixels().data(), bitmap.GetPixels().size()), bitmap.GetWidth(),

@@ -1,5 +1,6 @@
 #include "framework/render/PdfPreview.h"
 
+#include "framework/kernel/LocalisedString.h"
 #include "framework/render/PdfForm.h"
 #include "framework/render/PdfSource.h"
 
@@ -177,8 +178,11 @@ Kernel::Counted<Raster::DynamicBitmap const> DrawPdfPage(PdfSource & source, int
         return nullptr;
     }
     if (program.empty()) {
-        Raster::Report(problem, Code::Unsupported, source.GetPath(),
-                       "can't be shown as pixels, as the program pdftocairo (package poppler-utils) is not installed");
+        Raster::Report(
+            problem, Code::Unsupported, source.GetPath(),
+            Kernel::LocalisedString("can't be shown as pixels, as the program pdftocairo (package poppler-utils) "
+                                    "is not installed",
+                                    "Picture"));
         return nullptr;
     }
     MemoryFile const in;
@@ -197,7 +201,7 @@ Kernel::Counted<Raster::DynamicBitmap const> DrawPdfPage(PdfSource & source, int
         drawn ? Raster::Picture::FromBytes(drawn, source.GetPath(), problem) : nullptr;
     Kernel::Counted<Raster::DynamicBitmap const> const bitmap = picture ? picture->Decode(problem) : nullptr;
     if (!bitmap) {
-        Raster::Report(problem, Code::Corrupt, source.GetPath(), "can't be drawn");
+        Raster::Report(problem, Code::Corrupt, source.GetPath(), Kernel::LocalisedString("can't be drawn", "Picture"));
     }
     return bitmap;
 }

@@ -1,5 +1,6 @@
 #include "framework/render/PdfSource.h"
 
+#include "framework/kernel/Format.h"
 #include "framework/render/PdfBombGuard.h"
 
 #include <algorithm>
@@ -103,13 +104,13 @@ void ReportDamage(Raster::PictureProblem & problem, String const & path, std::ex
 {
     auto const * const known = dynamic_cast<QPDFExc const *>(&fault);
     if (known && qpdf_e_password == known->getErrorCode()) {
-        Raster::Report(problem, Code::Locked, path, "is protected by a password");
+        Raster::Report(problem, Code::Locked, path, Kernel::LocalisedString("is protected by a password", "Picture"));
     } else if (known && qpdf_e_unsupported == known->getErrorCode()) {
-        Raster::Report(problem, Code::Unsupported, path,
-                       "can't be read (" + known->getMessageDetail() + ")");
+        Raster::Report(problem, Code::Unsupported, path, Kernel::LocalisedString("can't be read (%1)", "Picture"),
+                       String(known->getMessageDetail()));
     } else {
-        Raster::Report(problem, Code::Corrupt, path,
-                       std::string("is damaged (") + (known ? known->getMessageDetail() : fault.what()) + ")");
+        Raster::Report(problem, Code::Corrupt, path, Kernel::LocalisedString("is damaged (%1)", "Picture"),
+                       String(known ? known->getMessageDetail() : std::string(fault.what())));
     }
 }
 
@@ -146,7 +147,8 @@ std::unique_ptr<PdfSource> PdfSource::Open(Bytes bytes, String const & path, Str
                                            Raster::PictureProblem & problem)
 {
     if (UnpacksTooFar(*bytes, LargestUnpacked)) {
-        Raster::Report(problem, Code::TooLarge, path, "unpacks to more than any drawing needs");
+        Raster::Report(problem, Code::TooLarge, path,
+                       Kernel::LocalisedString("unpacks to more than any drawing needs", "Picture"));
         return nullptr;
     }
     // Before revision 6 passwords were not in UTF-8: the other ways to write it are tried too.
@@ -197,9 +199,10 @@ std::optional<PdfSource::Page> PdfSource::FindPage(int number, Raster::PicturePr
             }
         }
         Raster::Report(problem, Code::NoSuchPage, m_Path,
-                       0 == count ? "has no page"
-                                  : "has " + std::to_string(count) + (1 == count ? " page" : " pages") +
-                                        ", and no page " + std::to_string(number));
+                       0 == count
+                           ? Kernel::LocalisedString("has no page", "Picture")
+                           : Kernel::LocalisedString("has no page of that number; its last one is %1", "Picture"),
+                       Kernel::Format("%1", count));
     } catch (std::exception const & fault) {
         ReportDamage(problem, m_Path, fault);
     }

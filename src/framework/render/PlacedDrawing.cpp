@@ -1,6 +1,7 @@
 #include "framework/render/PlacedDrawing.h"
 
 #include "framework/kernel/Assert.h"
+#include "framework/kernel/LocalisedString.h"
 #include "framework/render/PdfPreview.h"
 #include "framework/render/PdfSource.h"
 #include "framework/render/SvgReader.h"
@@ -50,11 +51,13 @@ Kernel::Counted<PlacedDrawing const> PlacedDrawing::Open(Source source, Problem 
     KORVANE_ASSERT(source.m_Bytes);
     std::optional<Kind> const kind = KindOf(*source.m_Bytes);
     if (!kind) {
-        Raster::Report(problem, Code::UnknownKind, source.m_Path, "is neither PDF nor SVG");
+        Raster::Report(problem, Code::UnknownKind, source.m_Path,
+                       Kernel::LocalisedString("is neither PDF nor SVG", "Picture"));
         return nullptr;
     }
     if ((Kind::Pdf == *kind ? LargestPdf : LargestSvg) < source.m_Bytes->size()) {
-        Raster::Report(problem, Code::TooLarge, source.m_Path, "is too large a file");
+        Raster::Report(problem, Code::TooLarge, source.m_Path,
+                       Kernel::LocalisedString("is too large a file", "Picture"));
         return nullptr;
     }
     Kernel::Counted<PlacedDrawing> const drawing(new PlacedDrawing);
@@ -62,7 +65,8 @@ Kernel::Counted<PlacedDrawing const> PlacedDrawing::Open(Source source, Problem 
     drawing->m_Hash = Kernel::HashBytes128(source.m_Bytes->data(), source.m_Bytes->size());
     if (Kind::Svg == *kind) {
         if (1 != source.m_Page) {
-            Raster::Report(problem, Code::NoSuchPage, source.m_Path, "is an SVG, which has one page only");
+            Raster::Report(problem, Code::NoSuchPage, source.m_Path,
+                           Kernel::LocalisedString("is an SVG, which has one page only", "Picture"));
             return nullptr;
         }
         std::optional<Kernel::Size> const size = ReadSvgSize(*source.m_Bytes, source.m_Path, problem);
@@ -81,7 +85,8 @@ Kernel::Counted<PlacedDrawing const> PlacedDrawing::Open(Source source, Problem 
     }
     Kernel::Size const & size = drawing->m_Size;
     if (!(0.01 <= size.width && size.width <= LargestSide && 0.01 <= size.height && size.height <= LargestSide)) {
-        Raster::Report(problem, Code::TooLarge, source.m_Path, "is smaller or larger than any page can be");
+        Raster::Report(problem, Code::TooLarge, source.m_Path,
+                       Kernel::LocalisedString("is smaller or larger than any page can be", "Picture"));
         return nullptr;
     }
     drawing->m_Source = std::move(source);

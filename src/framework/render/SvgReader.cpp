@@ -48,7 +48,8 @@ HandlePtr Open(std::vector<unsigned char> const & bytes, String const & path, Ra
     HandlePtr handle(
         rsvg_handle_new_from_stream_sync(stream.get(), base.get(), RSVG_HANDLE_FLAGS_NONE, nullptr, &error));
     if (!handle) {
-        Raster::Report(problem, Code::Corrupt, path, "is damaged (" + TakeText(error) + ")");
+        Raster::Report(problem, Code::Corrupt, path, Kernel::LocalisedString("is damaged (%1)", "Picture"),
+                       TakeText(error));
         return nullptr;
     }
     rsvg_handle_set_dpi(handle.get(), 96);
@@ -61,7 +62,8 @@ bool Render(RsvgHandle * handle, cairo_t * context, double width, double height,
     RsvgRectangle const viewport{0, 0, width, height};
     GError * error = nullptr;
     if (!rsvg_handle_render_document(handle, context, &viewport, &error)) {
-        Raster::Report(problem, Code::Corrupt, path, "can't be drawn (" + TakeText(error) + ")");
+        Raster::Report(problem, Code::Corrupt, path, Kernel::LocalisedString("can't be drawn (%1)", "Picture"),
+                       TakeText(error));
         return false;
     }
     return true;
@@ -119,7 +121,8 @@ std::optional<Kernel::Size> ReadSvgSize(std::vector<unsigned char> const & bytes
         height = box.height;
     }
     if (!(0 < width && 0 < height)) {
-        Raster::Report(problem, Code::Corrupt, path, "has no size and draws nothing");
+        Raster::Report(problem, Code::Corrupt, path,
+                       Kernel::LocalisedString("has no size and draws nothing", "Picture"));
         return std::nullopt;
     }
     return Kernel::Size{width * PointsPerPixel, height * PointsPerPixel};
@@ -144,7 +147,7 @@ Raster::Picture::Bytes SvgToPdf(std::vector<unsigned char> const & bytes, String
     }
     cairo_surface_finish(surface.get());
     if (CAIRO_STATUS_SUCCESS != cairo_surface_status(surface.get())) {
-        Raster::Report(problem, Code::Corrupt, path, "can't be drawn");
+        Raster::Report(problem, Code::Corrupt, path, Kernel::LocalisedString("can't be drawn", "Picture"));
         return nullptr;
     }
     return file;
@@ -160,7 +163,8 @@ Kernel::Counted<Raster::DynamicBitmap const> DrawSvg(std::vector<unsigned char> 
     SurfacePtr const surface(cairo_image_surface_create(CAIRO_FORMAT_ARGB32, width, height));
     ContextPtr const context(cairo_create(surface.get()));
     if (CAIRO_STATUS_SUCCESS != cairo_status(context.get())) {
-        Raster::Report(problem, Code::TooLarge, path, "needs more memory than there is");
+        Raster::Report(problem, Code::TooLarge, path,
+                       Kernel::LocalisedString("needs more memory than there is", "Picture"));
         return nullptr;
     }
     if (!Render(handle.get(), context.get(), width, height, path, problem)) {

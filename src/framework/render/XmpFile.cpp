@@ -2,6 +2,7 @@
 
 #include "framework/kernel/Assert.h"
 #include "framework/kernel/FileSystem.h"
+#include "framework/kernel/Format.h"
 
 #include <exempi/xmp.h>
 #include <memory>
@@ -28,7 +29,8 @@ void StartToolkit()
 {
     static bool const started = xmp_init();
     if (!started) {
-        throw XmpException("The XMP toolkit could not be started.");
+        throw XmpException(
+            Kernel::LocalisedString("The XMP toolkit could not be started.", "Output").ToString().ToStd());
     }
 }
 
@@ -50,10 +52,10 @@ struct XmpFile::State
         }
     }
 
-    [[noreturn]] void Fail(char const * what) const
+    /// `sentence` has places for the path and the toolkit's error.
+    [[noreturn]] void Fail(Kernel::LocalisedString const & sentence) const
     {
-        throw XmpException("The metadata of " + m_Path.ToStd() + " can't be " + what + " (XMP toolkit error " +
-                           std::to_string(xmp_get_error()) + ").");
+        throw XmpException(Kernel::Format(sentence, m_Path, xmp_get_error()).ToStd());
     }
 
     String m_Path;
@@ -89,7 +91,7 @@ String XmpFile::Read() const
     }
     StringPtr const text(xmp_string_new());
     if (!xmp_serialize(xmp.get(), text.get(), XMP_SERIAL_OMITPACKETWRAPPER, 0)) {
-        m_State->Fail("read");
+        m_State->Fail(Kernel::LocalisedString("The metadata of %1 can't be read (XMP toolkit error %2).", "Output"));
     }
     return xmp_string_cstr(text.get());
 }
@@ -106,7 +108,8 @@ void XmpFile::Put(String const & packet)
     KORVANE_ASSERT(m_State);
     XmpHandle const xmp = Parse(packet);
     if (!xmp || !xmp_files_put_xmp(m_State->m_File, xmp.get())) {
-        m_State->Fail("replaced");
+        m_State->Fail(
+            Kernel::LocalisedString("The metadata of %1 can't be replaced (XMP toolkit error %2).", "Output"));
     }
 }
 
@@ -116,7 +119,7 @@ void XmpFile::Close()
     std::shared_ptr<State> const state = std::move(m_State);
     // Never by way of a temporary file of the toolkit's: it would lose the file's rights and owner.
     if (!xmp_files_close(state->m_File, XMP_CLOSE_NOOPTION)) {
-        state->Fail("written");
+        state->Fail(Kernel::LocalisedString("The metadata of %1 can't be written (XMP toolkit error %2).", "Output"));
     }
 }
 
