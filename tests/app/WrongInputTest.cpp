@@ -336,6 +336,17 @@ TEST_F(WrongInputTest, ABookInAFolderThatMayNotBeWrittenCanBeReadAndPutOut)
     chmod(work.c_str(), 0755);
 }
 
+TEST_F(WrongInputTest, AFileOfAnotherProgramIsNoBookAndTheUserLearnsWhatToDo)
+{
+    Write("notes.txt", std::string(200, 'x'));
+    for (char const * const verb : {"status", "preflight", "plan"}) {
+        auto const outcome = Run({verb, "@notes.txt"});
+        EXPECT_EQ(outcome.m_Code, 1) << verb;
+        EXPECT_NE(outcome.m_Err.find("is not a file of this program. Choose another one."), std::string::npos)
+            << verb << ": " << outcome.m_Err;
+    }
+}
+
 TEST_F(WrongInputTest, ASecondProgramIsToldWhoHasTheBook)
 {
     WriteBook(1);
